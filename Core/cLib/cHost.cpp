@@ -1,0 +1,12 @@
+// SPDX-License-Identifier: MIT
+#include "cLib/cHost.h"
+
+static HostInterface* currentHost = nullptr;
+
+HostInterface* CurrentHost() { return currentHost; }
+
+void SetCurrentHost(HostInterface* host) { currentHost = host; }
+
+void TraceTo(HostInterface* host, const char* text) {
+  if (host) host->DebugOutput("Debug: %s\n", text);
+}

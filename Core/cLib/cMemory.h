@@ -1,0 +1,28 @@
+// SPDX-License-Identifier: MIT
+// The one place through which the Core library takes memory: blocks of the C heap, which the host
+// shares, so that a block made on one side may be released on the other.
+//
+// Threading: as the C heap, any thread.
+#pragma once
+
+#include <stddef.h>
+
+#include "cLib/cTypes.h"
+
+// `bytes` uninitialised bytes, owned by the caller; null when there is no memory or `bytes` is
+// kLargestSize (a sum of sizes that did not fit).
+void* AllocateBlock(u32 bytes);
+
+// As AllocateBlock, all bytes zero.
+void* AllocateZeroedBlock(u32 bytes);
+
+// Gives a block back; null is allowed.
+void ReleaseBlock(void* block);
+
+#if CORE_MICROSOFT_ABI
+// The module has no C++ library: `new` takes its memory here too and is null on failure, which its
+// declaration says so that a failed `new` runs no constructor.
+void* __cdecl operator new(size_t bytes) noexcept;
+void __cdecl operator delete(void* block) noexcept;
+void __cdecl operator delete(void* block, size_t bytes) noexcept;
+#endif

@@ -1,0 +1,23 @@
+// SPDX-License-Identifier: MIT
+// The stop mechanism: the module's one jump buffer, armed by `execute`, and the operation that
+// unwinds to it.
+//
+// A stop always reaches the innermost armed `execute`: each one saves the stop point on entry and
+// puts it back when it ends, so a nested run never leaves the buffer pointing into its dead frame.
+//
+// Threading: the host thread inside `execute` only; the frames between are skipped, not unwound, so
+// a stop comes from within a call that the script made into the host.
+#pragma once
+
+#include <setjmp.h>
+
+struct StopPoint {
+  jmp_buf buffer;
+  bool armed;
+};
+
+StopPoint& CurrentStopPoint();
+
+// Traces "stop_macro" and jumps to the armed `execute` with the value -1. Returns only when none is
+// armed, which is reported (source "cScript").
+void StopMacro();

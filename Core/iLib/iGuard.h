@@ -1,0 +1,9 @@
+// SPDX-License-Identifier: MIT
+// The structured-exception guard: the one place where a fault of the host, the script engine or a
+// broken record is caught.
+#pragma once
+
+// Calls body(context). False when a structured exception of any kind ended it: access violation,
+// stack overflow (the stack's guard page is put back, so that the next overflow is caught as well),
+// or a language-level exception that nobody handled. No destructors run for the frames it skips.
+bool RunGuarded(void (*body)(void* context), void* context);

@@ -1,0 +1,163 @@
+// SPDX-License-Identifier: MIT
+#include "xLib/xScript.h"
+
+#include <oleauto.h>
+
+#include "iLib/iComText.h"
+#include "xLib/xArgument.h"
+
+xScript::xScript(bool fixCRLF, bool fixDelimiter)
+    : host(CurrentHost()), fixCRLF(fixCRLF), fixDelimiter(fixDelimiter) {}
+
+xScript::~xScript() { TraceTo(host, "Script object destroyed."); }
+
+void xScript::CheckLayout() {
+#if CORE_MICROSOFT_ABI
+  static_assert(offsetof(xScript, references) == 4, "fields follow the table");
+  static_assert(offsetof(xScript, host) == 8, "fields follow the table");
+  static_assert(offsetof(xScript, fixCRLF) == 12, "fields follow the table");
+  static_assert(offsetof(xScript, fixDelimiter) == 13, "fields follow the table");
+  static_assert(sizeof(xScript) == 16, "the site holds it by value");
+#endif
+}
+
+HRESULT xScript::QueryInterface(REFIID riid, void** object) {
+  if (!object) return E_POINTER;
+  if (riid != IID_IUnknown && riid != IID_IDispatch && riid != IID_IErrorInfo) {
+    *object = nullptr;
+    return E_NOINTERFACE;
+  }
+  *object = this;
+  AddRef();
+  return S_OK;
+}
+
+ULONG xScript::AddRef() { return static_cast<ULONG>(InterlockedIncrement(&references)); }
+
+ULONG xScript::Release() {
+  if (InterlockedDecrement(&references) == 0) return 0;
+  return static_cast<ULONG>(references);
+}
+
+HRESULT xScript::GetTypeInfoCount(UINT*) {
+  TraceTo(host, "GetTypeInfoCount call succeeded.");
+  return E_NOTIMPL;
+}
+
+HRESULT xScript::GetTypeInfo(UINT, LCID, ITypeInfo**) {
+  TraceTo(host, "GetTypeInfo call succeeded.");
+  return E_NOTIMPL;
+}
+
+HRESULT xScript::GetIDsOfNames(REFIID riid, LPOLESTR* names, UINT count, LCID, DISPID* ids) {
+  HostInterface* current = CurrentHost();
+  if (riid != IID_NULL || !current) return DISP_E_UNKNOWNINTERFACE;
+  TraceTo(host, "GetIDsOfNames call succeeded.");
+  if (count == 0) return S_OK;
+  if (!names || !ids) return E_POINTER;
+  for (UINT i = 0; i < count; ++i) {
+    const String name(NarrowFromWide(names[i]));
+    const u32 id = current->FunctionId(name.Text());
+    if (id == kUnknownFunction) {
+      const String text = String("Call to unknown macro scripting function:  ") + name.Text();
+      if (host) host->ReportMessage(text.Text());
+      return E_FAIL;
+    }
+    ids[i] = static_cast<DISPID>(id);
+  }
+  return S_OK;
+}
+
+// A value of any other type as text; the text stays empty when the system cannot convert it.
+static void SetConvertedText(xArgument& argument, VARIANT& value) {
+  VARIANT text = {};
+  VariantChangeType(&text, &value, 0, VT_BSTR);
+  argument.SetText(NarrowFromWide(text.bstrVal));
+  VariantClear(&text);
+}
+
+static void SetArgument(xArgument& argument, VARIANT& value) {
+  switch (value.vt) {
+    case VT_BSTR:
+      argument.SetText(NarrowFromWide(value.bstrVal));
+      break;
+    case VT_I1:
+      argument.SetInteger(static_cast<signed char>(value.cVal));
+      break;
+    case VT_I2:
+      argument.SetInteger(value.iVal);
+      break;
+    case VT_I4:
+      argument.SetInteger(value.lVal);
+      break;
+    case VT_INT:
+      argument.SetInteger(value.intVal);
+      break;
+    case VT_R8:
+      argument.SetReal(value.dblVal);
+      break;
+    default:
+      SetConvertedText(argument, value);
+  }
+}
+
+// Appends the arguments in the script's order; COM stores them last first. Empty values and objects
+// have no form that the host knows: they are skipped and later arguments move up.
+void xScript::AppendArguments(const DISPPARAMS& params, Array<xArgument>& arguments) {
+  for (UINT i = params.rgvarg ? params.cArgs : 0; i-- > 0;) {
+    VARIANT& value = params.rgvarg[i];
+    if (value.vt == VT_EMPTY || value.vt == VT_DISPATCH) continue;
+    xArgument* argument = new xArgument;
+    if (!argument) continue;
+    SetArgument(*argument, value);
+    if (arguments.SetAt(argument, arguments.Count()) < 0) delete argument;
+  }
+}
+
+// The host's result. A text result of another kind leaves `result` as the caller gave it.
+static void GetResult(HostContext& context, VARIANT& result) {
+  const Array<String>& texts = context.ResultTexts();
+  if (texts.Count() == 0) {
+    result.vt = VT_I4;
+    result.lVal = context.integerResult;
+  } else if (context.resultKind == kTextResult) {
+    const String* text = texts.At(0);
+    result.vt = VT_BSTR;
+    result.bstrVal = SysAllocString(WideFromNarrow(text ? text->Text() : ""));
+  }
+}
+
+HRESULT xScript::Invoke(DISPID id, REFIID riid, LCID, WORD, DISPPARAMS* params, VARIANT* result,
+                        EXCEPINFO*, UINT*) {
+  HostInterface* current = CurrentHost();
+  if (riid != IID_NULL || id < 0 || !current) return DISP_E_UNKNOWNINTERFACE;
+  SetErrorInfo(0, nullptr);
+  HostContext& context = *current->Context();
+  context.ArgumentList().Clear();
+  context.ResultTexts().Clear();
+  if (params) AppendArguments(*params, context.ArgumentList());
+  current->SetFixCRLF(fixCRLF);
+  current->SetFixDelimiter(fixDelimiter);
+  current->CallFunction(static_cast<u32>(id));
+  if (result) GetResult(context, *result);
+  return S_OK;
+}
+
+HRESULT xScript::SupportsErrorInfo(REFIID) { return S_OK; }
+
+HRESULT xScript::FxFakeError() {
+  TraceTo(host, "FxFakeError is faking an error.");
+  ICreateErrorInfo* creator = nullptr;
+  if (FAILED(CreateErrorInfo(&creator))) return E_FAIL;
+  // The setters only read their text; their parameters lack the const.
+  creator->SetSource(const_cast<LPOLESTR>(L"COM"));
+  creator->SetDescription(
+      const_cast<LPOLESTR>(L"This is a fake error generated by the component."));
+  IErrorInfo* error = nullptr;
+  if (SUCCEEDED(creator->QueryInterface(IID_IErrorInfo, reinterpret_cast<void**>(&error)))) {
+    SetErrorInfo(0, error);
+    error->Release();
+  }
+  creator->Release();
+  return E_FAIL;
+}

@@ -1,0 +1,223 @@
+// SPDX-License-Identifier: MIT
+#include "xLib/xScriptExecutor.h"
+
+#include <objbase.h>
+#include <stdio.h>
+#include <string.h>
+
+#include "iLib/iComText.h"
+#include "iLib/iFile.h"
+#include "xLib/xProduct.h"
+
+// The 32-bit form of the parser; import libraries do not carry its identifier.
+static constexpr IID kActiveScriptParse = {
+    0xBB1A2AE2, 0xA4F9, 0x11CF, {0x8F, 0x20, 0x00, 0x80, 0x5F, 0x2C, 0xD0, 0x64}};
+
+static constexpr char kItemName[] = "tarn";
+static constexpr char kRubyEngine[] = "RubyScript";
+
+// --- Creation and destruction --------------------------------------------------------------------
+
+xScriptExecutor::xScriptExecutor(const char* progId, bool fixCRLF, bool fixDelimiter, u8 siteFlag)
+    : dispatch(fixCRLF, fixDelimiter), host(CurrentHost()) {
+  // Whatever it answers, the destructor undoes one initialisation.
+  CoInitialize(nullptr);
+  host->Context()->siteFlag = siteFlag;
+  if (!progId || !*progId) {
+    host->ReportMessage("No scripting module provided.");
+    return;
+  }
+  const HRESULT result = CreateEngine(progId);
+  ready = SUCCEEDED(result);
+  if (!ready) ReportCreation(result, progId);
+}
+
+HRESULT xScriptExecutor::CreateEngine(const char* progId) {
+  CLSID classId;
+  HRESULT result = CLSIDFromProgID(WideFromNarrow(progId), &classId);
+  if (SUCCEEDED(result))
+    result = CoCreateInstance(classId, nullptr, CLSCTX_INPROC_SERVER, IID_IActiveScript,
+                              reinterpret_cast<void**>(&engine));
+  if (SUCCEEDED(result))
+    result = engine->QueryInterface(kActiveScriptParse, reinterpret_cast<void**>(&parser));
+  if (SUCCEEDED(result)) result = engine->SetScriptSite(this);
+  if (SUCCEEDED(result)) result = parser->InitNew();
+  // Visible, but no source of events and no global members: scripts reach the editor only through
+  // the object's own name.
+  if (SUCCEEDED(result))
+    result = engine->AddNamedItem(WideFromNarrow(kItemName), SCRIPTITEM_ISVISIBLE);
+  return result;
+}
+
+void xScriptExecutor::ReportCreation(HRESULT result, const char* progId) {
+  String advice("Unexpected error creating '");
+  advice.Append(progId);
+  advice.Append("' COM object.\n\nMake sure the ");
+  advice.Append(progId);
+  advice.Append(" Windows Scripting Host has been correctly installed.\n");
+  if (strcmp(progId, kRubyEngine) == 0)
+    advice.Append("\n               RubyScript: " SCRIPTRUBY_RUBY_ENGINE_PAGE);
+  advice.Append("\n   Windows Scripting Host: " SCRIPTRUBY_SCRIPT_HOST_PAGE "\n");
+  SendReport(result, "Error creating '%s' scripting module.", progId, advice.Text());
+}
+
+xScriptExecutor::~xScriptExecutor() {
+  if (parser) parser->Release();
+  if (engine) {
+    engine->SetScriptState(SCRIPTSTATE_CLOSED);
+    engine->Release();
+  }
+  CoUninitialize();
+}
+
+void xScriptExecutor::CheckLayout() {
+#if CORE_MICROSOFT_ABI
+  static_assert(offsetof(xScriptExecutor, ready) == 8, "fields follow two tables");
+  static_assert(offsetof(xScriptExecutor, fileName) == 12, "fields follow two tables");
+  static_assert(offsetof(xScriptExecutor, dispatch) == 36, "fields follow two tables");
+  static_assert(offsetof(xScriptExecutor, host) == 52, "fields follow two tables");
+  static_assert(offsetof(xScriptExecutor, engine) == 56, "fields follow two tables");
+  static_assert(offsetof(xScriptExecutor, parser) == 60, "fields follow two tables");
+  static_assert(sizeof(xScriptExecutor) == 64, "fields follow two tables");
+#endif
+}
+
+// --- Running -------------------------------------------------------------------------------------
+
+bool xScriptExecutor::Execute(const char* file) {
+  if (!ready || !Parse(file)) return false;
+  const HRESULT result = engine->SetScriptState(SCRIPTSTATE_CONNECTED);
+  SendReport(result, "Error executing '%s' macro script.", file, nullptr);
+  return result == S_OK;
+}
+
+bool xScriptExecutor::Parse(const char* file) {
+  fileName.Assign(file);
+  if (!ready) return false;
+  wchar_t* text = LoadFileAsWideText(file);
+  if (!text) {
+    fprintf(stderr, "Error: Could not find the '%s' script file\n", fileName.Text());
+    return false;
+  }
+  EXCEPINFO exception = {};
+  const HRESULT result = parser->ParseScriptText(text, nullptr, nullptr, nullptr, 0, 0, 0, nullptr,
+                                                 &exception);
+  SendReport(result, "Error parsing '%s' macro script.", file, nullptr);
+  CoTaskMemFree(text);
+  return result == S_OK;
+}
+
+void xScriptExecutor::Interrupt() {
+  if (engine) engine->InterruptScriptThread(SCRIPTTHREADID_ALL, nullptr, 0);
+}
+
+bool xScriptExecutor::IsRunning() {
+  SCRIPTSTATE state = SCRIPTSTATE_UNINITIALIZED;
+  return engine && SUCCEEDED(engine->GetScriptState(&state)) && state == SCRIPTSTATE_CONNECTED;
+}
+
+// `format` with `name` in place of its %s. Long names are appended, not formatted: a report never
+// shows a raw format.
+static String FormatName(const char* format, const char* name) {
+  String text(format ? format : "Unknown");
+  const char* mark = strstr(text.Text(), "%s");
+  if (!mark) return text;
+  const u32 before = static_cast<u32>(mark - text.Text());
+  String result = text.Mid(0, before);
+  result.Append(name ? name : "Unknown");
+  result.Append(mark + 2);
+  return result;
+}
+
+// Sends the system's reason for `result` with the text; any value but S_OK is reported.
+void xScriptExecutor::SendReport(HRESULT result, const char* format, const char* name,
+                                 const char* extra) {
+  if (result == S_OK) return;
+  String text = FormatName(format, name);
+  char reason[2048] = "";
+  const DWORD length =
+      FormatMessageA(FORMAT_MESSAGE_FROM_SYSTEM, nullptr, static_cast<DWORD>(result),
+                     MAKELANGID(LANG_NEUTRAL, SUBLANG_DEFAULT), reason, sizeof reason, nullptr);
+  if (length != 0 && *reason) {
+    text.Append("\nReason: ");
+    text.Append(reason);
+  }
+  text.Insert("\n", 0);
+  if (extra && *extra) {
+    text.Append(extra);
+    text.Insert("\n", 0);
+  }
+  if (host) host->ReportMessage(text.Text());
+}
+
+// --- Site methods --------------------------------------------------------------------------------
+
+HRESULT xScriptExecutor::QueryInterface(REFIID riid, void** object) {
+  if (!object) return E_POINTER;
+  if (riid == IID_IUnknown || riid == IID_IActiveScriptSite)
+    *object = static_cast<IActiveScriptSite*>(this);
+  else if (riid == IID_IActiveScriptSiteWindow)
+    *object = static_cast<IActiveScriptSiteWindow*>(this);
+  else
+    return E_NOINTERFACE;  // deliberately without touching the caller's pointer
+  AddRef();
+  return S_OK;
+}
+
+HRESULT xScriptExecutor::GetItemInfo(LPCOLESTR name, DWORD mask, IUnknown** item,
+                                     ITypeInfo** type) {
+  const bool wantsType = (mask & SCRIPTINFO_ITYPEINFO) != 0;
+  const bool wantsItem = (mask & SCRIPTINFO_IUNKNOWN) != 0;
+  if ((wantsType && !type) || (wantsItem && !item)) return E_POINTER;
+  if (wantsType) *type = nullptr;
+  if (wantsItem) *item = nullptr;
+  if (!wantsItem || strcmp(NarrowFromWide(name), kItemName) != 0) return E_NOTIMPL;
+  TraceTo(host, "The Tarn object was requested and returned.");
+  dispatch.AddRef();
+  *item = &dispatch;
+  return S_OK;
+}
+
+static void AppendNumber(String& text, long number) {
+  String digits;
+  digits.Format("%ld", number);
+  text.Append(digits.Text());
+}
+
+// What the engine gives of the error's place and reason; its results are not looked at, the defaults
+// stand where it gives nothing. The exception's own strings stay with the engine.
+HRESULT xScriptExecutor::OnScriptError(IActiveScriptError* error) {
+  if (!error) return E_POINTER;
+  BSTR lineText = nullptr;
+  error->GetSourceLineText(&lineText);
+  DWORD sourceContext = 0;
+  ULONG line = 0;
+  LONG column = -1;
+  error->GetSourcePosition(&sourceContext, &line, &column);
+
+  String text("Scripting Error :>  File: ");
+  text.Append(fileName.Text());
+  text.Append(" (");
+  AppendNumber(text, static_cast<long>(line + 1));
+  text.Append(":");
+  AppendNumber(text, column);
+  text.Append(") >> ");
+  text.Append(NarrowFromWide(lineText));
+
+  EXCEPINFO exception = {};
+  error->GetExceptionInfo(&exception);
+  const char* description = NarrowFromWide(exception.bstrDescription);
+  if (*description) {
+    text.Append("\nReason: ");
+    text.Append(description);
+    text.Append("\n");
+  }
+  if (host) host->ReportMessage(text.Text());
+  SysFreeString(lineText);
+  return S_OK;
+}
+
+HRESULT xScriptExecutor::GetWindow(HWND* window) {
+  if (window) *window = host ? static_cast<HWND>(host->WindowHandle()) : nullptr;
+  return S_OK;
+}

@@ -1,0 +1,124 @@
+#!/bin/sh
+# SPDX-License-Identifier: MIT
+# command-line.sh MACRORUN FAKE_MODULE: exit codes, messages and what becomes of the text.
+. "$(dirname "$0")/wine.sh"
+macrorun=$1
+fake=$2
+folder=$(mktemp -d)
+trap 'rm -rf "$folder"' EXIT
+cd "$folder" || exit 1
+failures=0
+source=
+
+fail() {
+  echo "FAILED: $*"
+  failures=$((failures + 1))
+}
+
+# expect CODE TEXT [ARGUMENT...]: the exit code, and a text on either stream. A run that fails leaves
+# standard output empty.
+expect() {
+  code=$1 text=$2
+  shift 2
+  wine "$macrorun" "$@" > out 2> err
+  result=$?
+  [ $result -eq "$code" ] || fail "$* ($source): exit code $result, expected $code"
+  cat out err | grep -qF -- "$text" || fail "$* ($source): no '$text' in: $(cat err)"
+  [ "$code" -eq 0 ] || [ ! -s out ] || fail "$* ($source): printed although it failed"
+}
+
+# expect_js CODE TEXT SOURCE: as above, for a macro over input.txt.
+expect_js() {
+  source=$3
+  printf '%s\n' "$source" > macro.js
+  expect "$1" "$2" macro.js input.txt
+}
+
+# The command line
+printf 'text\n' > input.txt
+echo 'tarn.line_count();' > macro.js
+touch macro.xyz
+expect 0 'set_line(line, text)' --help
+expect 0 'RubyScript' --version
+expect 0 'VBScript' --version --description "$(dirname "$macrorun")/languages/vbs.qwsh"
+expect 2 'MACRO is required'
+expect 2 '--bogus' --bogus macro.js
+expect 2 'macro missing.js' missing.js
+expect 2 'missing.txt' macro.js missing.txt
+expect 2 'missing.dll' --module missing.dll macro.js
+expect 2 'input.txt' --module input.txt macro.js
+expect 2 'missing.qwsh' --description missing.qwsh macro.js
+expect 2 'xyz.qwsh' macro.xyz
+
+# How a macro ends
+expect_js 0 'text' 'tarn.message("done");'
+expect 0 'Debug: GetIDsOfNames call succeeded.' --trace macro.js
+expect_js 1 'Syntax error' 'x = = 1;'
+expect_js 1 'macro.js (2:' "$(printf 'tarn.write("x");\nnothing.here();')"
+expect_js 1 'unknown macro scripting function:  nothing' 'tarn.nothing();'
+expect 4 'Tarn has detected' --module "$fake" macro.js
+
+# Wrong calls, which no script can catch
+while IFS='|' read -r call text; do
+  expect_js 1 "$text" "tarn.write('x'); try { tarn.$call; } catch (error) {}"
+done << 'CALLS'
+set_line(1)|set_line: expected 2 arguments (line, text), got 1
+line_count(1)|line_count: expected 0 arguments
+get_line(0)|get_line: argument 1 of (line): expected a line number from 1 to 1, got "0"
+get_line(2)|from 1 to 1
+get_line(1.5)|from 1 to 1, got "1.500000"
+get_line("1x")|got "1x"
+goto_line(3)|from 1 to 2
+set_line(1, "a\nb")|argument 2 of (line, text): expected one line
+write(new Array(513).join("x"))|may have been cut at 512
+set_line(1, new Array(600).join("x"))|may have been cut at 512
+CALLS
+for line in "$(printf '%01024d' 0)" "$(printf '\200')"; do
+  printf '%s\n' "$line" > input.txt
+  expect_js 1 'get_line: line 1 cannot be passed' 'tarn.get_line(1);'
+done
+: > input.txt
+expect_js 1 'the document has none' 'tarn.get_line(1);'
+
+# Text that no macro touches is not touched, and text at the limits passes
+expect_same() {
+  expect_js 0 '' "$1"
+  cmp input.txt out || fail "$1: the text has changed"
+  wine "$macrorun" macro.js - < input.txt 2> err | cmp - input.txt || fail "$1: standard input"
+}
+i=0
+while [ $i -lt 256 ]; do printf "\\$(printf %03o $i)"; i=$((i + 1)); done > input.txt
+printf '\r\nCR LF\r\n\n\r\nno end' >> input.txt
+expect_same 'tarn.line_count();'
+printf '%01023d\n%0511d' 1 2 > input.txt
+expect_same 'tarn.get_line(1); tarn.set_line(2, tarn.get_line(2));'
+
+# Paths outside the code page
+mkdir 'Ordner ä 日本'
+echo 'tarn.message("found");' > 'Ordner ä 日本/ä 日本.js'
+expect 0 'found' 'Ordner ä 日本/ä 日本.js' input.txt
+
+# Nothing is left in the temporary folder, and a macro is stopped with Ctrl+C
+mkdir temporary
+temporary() {
+  wine cmd /c "set TMP=Z:$(pwd | tr / '\\')\\temporary&& Z:$(echo "$macrorun" | tr / '\\') $1"
+}
+for source in 'tarn.line_count();' 'tarn.get_line(-1);' 'x = = 1;'; do
+  echo "$source" > macro.js
+  temporary macro.js > /dev/null 2>&1
+  [ -z "$(ls temporary)" ] || fail "left after $source: $(ls temporary)"
+done
+mkdir temporary/macrorun-999999-1
+temporary macro.js > /dev/null 2>&1
+[ -z "$(ls temporary)" ] || fail "the folder of a killed run is left"
+
+echo 'tarn.message("started"); while (true) tarn.line_count();' > macro.js
+wine "$macrorun" macro.js > out 2> err &
+i=0
+until grep -q started err || [ $i -eq 100 ]; do sleep 0.1; i=$((i + 1)); done
+kill -INT $!
+wait $!
+result=$?
+[ $result -eq 3 ] && [ ! -s out ] || fail "Ctrl+C: exit code $result, expected 3"
+
+[ $failures -eq 0 ]

@@ -1,0 +1,92 @@
+// SPDX-License-Identifier: MIT
+// A recording Active Scripting engine: an in-process COM class under the ProgID "FakeEngine". It
+// writes down every call of the script site, in order and with arguments, answers what the test's
+// plan says, and lets the test play the script.
+#pragma once
+
+#include <windows.h>
+// clang-format off
+#include <oleauto.h>
+#include <activscp.h>
+// clang-format on
+
+#include <functional>
+#include <map>
+#include <string>
+#include <vector>
+
+class FakeEngine;
+
+struct EnginePlan {
+  std::map<std::string, HRESULT> results;         // by step; S_OK where nothing stands
+  std::function<void(FakeEngine&)> onParse;       // inside ParseScriptText
+  std::function<void(FakeEngine&)> onConnect;     // the script: inside SetScriptState(CONNECTED)
+  std::vector<std::string> log;                   // what the site asked for
+  std::wstring source;                            // what ParseScriptText got
+  int liveEngines = 0;
+};
+extern EnginePlan plan;
+
+// Registers the class for this process; undone by the destructor. Needs an initialised apartment.
+class FakeEngineClass {
+ public:
+  FakeEngineClass();
+  ~FakeEngineClass();
+
+ private:
+  DWORD cookie = 0;
+};
+
+class FakeEngine : public IActiveScript, public IActiveScriptParse {
+ public:
+  FakeEngine();
+  virtual ~FakeEngine();
+
+  // The `tarn` object as an engine gets it from the site; null when the site refuses.
+  IDispatch* Item();
+  // One script call `tarn.name(arguments)`, by GetIDsOfNames and Invoke.
+  HRESULT Call(const wchar_t* name, std::vector<VARIANT> arguments = {}, VARIANT* result = nullptr);
+  IActiveScriptSite* Site() { return site; }
+
+  STDMETHODIMP QueryInterface(REFIID riid, void** object) override;
+  STDMETHODIMP_(ULONG) AddRef() override { return ++references; }
+  STDMETHODIMP_(ULONG) Release() override;
+
+  STDMETHODIMP SetScriptSite(IActiveScriptSite* newSite) override;
+  STDMETHODIMP GetScriptSite(REFIID, void**) override { return Note("GetScriptSite"); }
+  STDMETHODIMP SetScriptState(SCRIPTSTATE state) override;
+  STDMETHODIMP GetScriptState(SCRIPTSTATE*) override { return Note("GetScriptState"); }
+  STDMETHODIMP Close() override { return Note("Close"); }
+  STDMETHODIMP AddNamedItem(LPCOLESTR name, DWORD flags) override;
+  STDMETHODIMP AddTypeLib(REFGUID, DWORD, DWORD, DWORD) override { return Note("AddTypeLib"); }
+  STDMETHODIMP GetScriptDispatch(LPCOLESTR, IDispatch**) override {
+    return Note("GetScriptDispatch");
+  }
+  STDMETHODIMP GetCurrentScriptThreadID(SCRIPTTHREADID*) override { return Note("GetThread"); }
+  STDMETHODIMP GetScriptThreadID(DWORD, SCRIPTTHREADID*) override { return Note("GetThreadId"); }
+  STDMETHODIMP GetScriptThreadState(SCRIPTTHREADID, SCRIPTTHREADSTATE*) override {
+    return Note("GetThreadState");
+  }
+  STDMETHODIMP InterruptScriptThread(SCRIPTTHREADID thread, const EXCEPINFO* info,
+                                     DWORD flags) override;
+  STDMETHODIMP Clone(IActiveScript**) override { return Note("Clone"); }
+
+  STDMETHODIMP InitNew() override { return Note("InitNew"); }
+  STDMETHODIMP AddScriptlet(LPCOLESTR, LPCOLESTR, LPCOLESTR, LPCOLESTR, LPCOLESTR, LPCOLESTR,
+                            DWORD, ULONG, DWORD, BSTR*, EXCEPINFO*) override {
+    return Note("AddScriptlet");
+  }
+  STDMETHODIMP ParseScriptText(LPCOLESTR code, LPCOLESTR item, IUnknown* context,
+                               LPCOLESTR delimiter, DWORD cookie, ULONG line, DWORD flags,
+                               VARIANT* result, EXCEPINFO* info) override;
+
+ private:
+  static HRESULT Note(const std::string& step);
+  ULONG references = 0;
+  IActiveScriptSite* site = nullptr;
+};
+
+VARIANT Integer(long value);
+VARIANT Real(double value);
+VARIANT Text(const wchar_t* value);  // freed by Call
+VARIANT Plain(VARTYPE type, LONGLONG bits = 0);

@@ -1,0 +1,24 @@
+// SPDX-License-Identifier: MIT
+// Text between UTF-8, UTF-16 and the system's ANSI code page.
+#pragma once
+
+#include <filesystem>
+#include <optional>
+#include <string>
+#include <string_view>
+
+std::filesystem::path PathFromUtf8(std::string_view text);
+std::string ToUtf8(const std::filesystem::path& path);
+std::string WideToUtf8(std::wstring_view text);
+
+// The file by a path that the ANSI code page can hold, as the module takes it: the path itself or,
+// when it has other characters, the short name. Empty when there is none. The file must exist.
+std::optional<std::filesystem::path> AnsiNamed(const std::filesystem::path& path);
+std::string ToAnsi(const std::filesystem::path& path);
+
+// Whether a text that the module hands to a script as a result, and takes back as an argument, is
+// still the same bytes.
+bool PassesUnchanged(const std::string& text);
+
+// The system's text for an error code, without its line end.
+std::string SystemMessage(unsigned long code);

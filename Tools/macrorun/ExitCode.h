@@ -1,0 +1,18 @@
+// SPDX-License-Identifier: MIT
+// How the program ends.
+#pragma once
+
+#include <stdexcept>
+
+enum ExitCode {
+  kSuccess = 0,
+  kMacroFailed = 1,  // it did not parse, ended with an error, or called a macro function wrongly
+  kWrongUsage = 2,   // UsageError
+  kStopped = 3,      // by Ctrl+C
+  kFault = 4,        // in the module or in the script engine
+};
+
+// Something the user must put right before a macro can run; the text names the file or option.
+struct UsageError : std::runtime_error {
+  using std::runtime_error::runtime_error;
+};

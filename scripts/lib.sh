@@ -1,0 +1,101 @@
+# SPDX-License-Identifier: MIT
+# What the commands share: set-up of a Debian machine, the Wine prefix and the build. Progress goes to
+# standard error; the output of a step goes to a log that is shown when the step fails.
+
+set -euo pipefail
+
+ROOT=$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)
+BUILD=$ROOT/build
+LOGS=$BUILD/logs
+
+PACKAGES=(
+  clang-19 lld-19 llvm-19 libclang-rt-19-dev
+  g++-mingw-w64-i686-posix mingw-w64-i686-dev g++-multilib
+  cmake ninja-build googletest libcli11-dev
+  wine wine32:i386
+)
+
+export WINEARCH=win32
+export WINEPREFIX=$BUILD/wineprefix
+export WINEDEBUG=-all
+
+say() { printf '%s\n' "$*" >&2; }
+
+die() {
+  say "error: $*"
+  exit 1
+}
+
+# step NAME COMMAND...: runs the command with its output in a log, and shows the log's end when it fails.
+step() {
+  local name=$1 log
+  shift
+  mkdir -p "$LOGS"
+  log=$LOGS/${name// /-}.log
+  say "-- $name"
+  if ! "$@" >"$log" 2>&1 </dev/null 9>&-; then # no daemon keeps the lock
+    tail -n 40 "$log" >&2
+    die "$name failed (whole output: $log)"
+  fi
+}
+
+missing_packages() {
+  local package
+  for package in "${PACKAGES[@]}"; do
+    [ "$(dpkg-query -W -f='${db:Status-Status}' "$package" 2>/dev/null)" = installed ] ||
+      printf '%s\n' "$package"
+  done
+}
+
+as_root() {
+  if [ "$(id -u)" = 0 ]; then
+    "$@"
+  elif command -v sudo >/dev/null; then
+    sudo "$@"
+  else
+    say "root is needed for: $*"
+    return 1
+  fi
+}
+
+# Takes both architectures from the release itself: the security suite's i386 index can be out of
+# step with amd64, and its failed download is not fatal.
+install_packages() {
+  local codename
+  codename=$(. /etc/os-release && printf %s "${VERSION_CODENAME:-}")
+  as_root dpkg --add-architecture i386
+  as_root apt-get update || say "some package indexes could not be fetched; going on"
+  as_root env DEBIAN_FRONTEND=noninteractive apt-get install -y --no-install-recommends \
+    ${codename:+-t "$codename"} "$@"
+}
+
+# A prefix without a display: windows and message boxes work, nothing is drawn.
+make_wine_prefix() {
+  wineboot -i
+  wine reg add 'HKCU\Software\Wine\Drivers' /v Graphics /d null /f
+  wineserver -w
+  touch "$WINEPREFIX/.complete"
+}
+
+# set_up: everything a fresh machine needs before a build, each part only when it is missing.
+set_up() {
+  command -v dpkg >/dev/null || die "this is not a Debian system: install by hand ${PACKAGES[*]}"
+  local missing
+  mapfile -t missing < <(missing_packages)
+  if [ ${#missing[@]} -gt 0 ]; then
+    say "installing packages: ${missing[*]}"
+    step "installing packages" install_packages "${missing[@]}"
+  fi
+  if [ ! -e "$WINEPREFIX/.complete" ]; then
+    rm -rf "$WINEPREFIX"
+    mkdir -p "$BUILD"
+    step "making the Wine prefix" make_wine_prefix
+  fi
+}
+
+# build_release [TARGET...]: configures once and builds.
+build_release() {
+  cd "$ROOT"
+  [ -e "$BUILD/release/build.ninja" ] || step "configuring" cmake --preset release
+  step "building" cmake --build --preset release ${1:+--target "$@"}
+}

@@ -1,0 +1,22 @@
+#!/usr/bin/env bash
+# SPDX-License-Identifier: MIT
+# Runs one macro in the runner, over the text in FILE, and prints the document:
+#
+#   scripts/run.sh [OPTION...] MACRO [FILE]
+#
+# Options are macrorun's (--help lists them). Sets the machine up and builds first when needed.
+source "$(dirname "${BASH_SOURCE[0]}")/lib.sh"
+
+[ $# -gt 0 ] || die "usage: scripts/run.sh [OPTION...] MACRO [FILE]"
+
+started_in=$PWD
+# One set-up and build at a time.
+mkdir -p "$BUILD"
+exec 9>"$BUILD/.lock"
+flock 9
+set_up
+build_release macrorun scriptruby
+exec 9>&-
+
+cd "$started_in"
+exec wine "$BUILD/release/bin/macrorun.exe" "$@"
