@@ -6,13 +6,9 @@
 #include "cLib/cReport.h"
 
 static int allocationsLeft = 0;
-static std::vector<std::string> lines;
-
-int Element::live = 0;
 
 static void* TestMalloc(size_t bytes) {
-  if (allocationsLeft == 0 || --allocationsLeft > 0) return malloc(bytes);
-  return nullptr;
+  return allocationsLeft && --allocationsLeft == 0 ? nullptr : malloc(bytes);
 }
 
 // The library's own allocation, but for the place where its memory comes from.
@@ -24,24 +20,24 @@ void FailAllocation(int n) {
   allocationsLeft = n;
 }
 
-Reports::Reports() {
-  lines.clear();
-  SetDebugHook([](const char* line) { lines.push_back(line); });
+int Element::live = 0;
+std::vector<Text> CoreTest::reports;
+
+CoreTest::CoreTest() {
+  SetDebugHook([](const char* line) { reports.push_back(line); });
 }
 
-Reports::~Reports() {
+CoreTest::~CoreTest() {
   SetDebugHook(nullptr);
+  FailAllocation(0);
+  TakeReports();
+  EXPECT_EQ(Element::live, 0);
 }
 
-int Reports::Take(const std::string& part) {
+int CoreTest::TakeReports(const Text& part) {
   int count = 0;
-  for (const auto& line : lines) count += line.find(part) != std::string::npos;
-  lines.clear();
+  for (const Text& line : std::exchange(reports, {})) count += line.find(part) != Text::npos;
   return count;
-}
-
-std::vector<std::string>& Reports::Lines() {
-  return lines;
 }
 
 // Sizes that a 32-bit Windows process could not have fail natively, too.

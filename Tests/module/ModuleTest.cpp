@@ -44,6 +44,9 @@ LoadedModule::~LoadedModule() { FreeLibrary(handle); }
 static LRESULT CALLBACK OnWindow(int code, WPARAM window, LPARAM data) {
   if (code == HCBT_ACTIVATE) {
     const HWND box = reinterpret_cast<HWND>(window);
+    char name[16] = "";
+    GetClassNameA(box, name, sizeof name);
+    if (std::string(name) != "#32770") return 0;  // not a dialog
     char caption[64] = "", text[1024] = "";
     GetWindowTextA(box, caption, sizeof caption);
     GetDlgItemTextA(box, 0xFFFF, text, sizeof text);

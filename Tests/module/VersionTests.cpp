@@ -1,6 +1,10 @@
 // SPDX-License-Identifier: MIT
 // `version`: the record's checks, its content, the description file behind it, and the folders.
-#include <aclapi.h>
+// sddl.h must come after windows.h.
+#include <windows.h>
+// clang-format off
+#include <sddl.h>
+// clang-format on
 
 #include <filesystem>
 #include <random>
@@ -156,19 +160,13 @@ TEST_F(VersionTest, DuringARunTheRunningEngineAnswers) {
   EXPECT_EQ(1, Run());
 }
 
-// Denies writing to everybody, by the folder's security descriptor.
-static void DenyWriting(const std::string& folder) {
-  EXPLICIT_ACCESSA access = {};
-  access.grfAccessPermissions = GENERIC_READ | GENERIC_EXECUTE;
-  access.grfAccessMode = SET_ACCESS;
-  access.Trustee.TrusteeForm = TRUSTEE_IS_NAME;
-  access.Trustee.ptstrName = const_cast<char*>("EVERYONE");
-  PACL list = nullptr;
-  ASSERT_EQ(0u, SetEntriesInAclA(1, &access, nullptr, &list));
-  ASSERT_EQ(0u, SetNamedSecurityInfoA(const_cast<char*>(folder.c_str()), SE_FILE_OBJECT,
-                                      DACL_SECURITY_INFORMATION | PROTECTED_DACL_SECURITY_INFORMATION,
-                                      nullptr, nullptr, list, nullptr));
-  LocalFree(list);
+// Gives everybody these rights to the folder and nothing else, by its security descriptor.
+static void Permit(const std::string& folder, const std::string& rights) {
+  PSECURITY_DESCRIPTOR descriptor = nullptr;
+  ASSERT_TRUE(ConvertStringSecurityDescriptorToSecurityDescriptorA(
+      ("D:P(A;;" + rights + ";;;WD)").c_str(), SDDL_REVISION_1, &descriptor, nullptr));
+  EXPECT_TRUE(SetFileSecurityA(folder.c_str(), DACL_SECURITY_INFORMATION, descriptor));
+  LocalFree(descriptor);
 }
 
 TEST_F(VersionTest, AFolderThatMayNotBeWritten) {
@@ -181,7 +179,7 @@ TEST_F(VersionTest, AFolderThatMayNotBeWritten) {
   std::filesystem::create_directories(folder);
   std::filesystem::copy_file(SCRIPTRUBY_DLL, folder + "\\scriptruby.dll");
   WriteBytes(folder + "\\xMacroWSH.qwsh", "[Options]\r\nLanguage=Ignored\r\n");
-  DenyWriting(folder);
+  Permit(folder, "FRFX");
   {
     LoadedModule other(folder, false);
     ASSERT_NE(nullptr, other.handle);
@@ -192,6 +190,7 @@ TEST_F(VersionTest, AFolderThatMayNotBeWritten) {
     EXPECT_TRUE(other.version(record, nullptr));
     EXPECT_EQ("PerUser WSH Version 1.50", Content(record)[8]);
   }
+  Permit(folder, "FA");
   std::filesystem::remove_all(product);
 }
 
