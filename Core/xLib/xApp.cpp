@@ -26,9 +26,8 @@ bool AskBreakIntoDebugger(const char* file, int line) {
   String rest;
   rest.Format(", Line %d\nDo you wish to attempt to break into the debugger?", line);
   question.Append(rest.Text());
-  const int answer =
-      MessageBoxA(mainWindow, question.Text(), "Assertion Failed",
-                  MB_YESNO | MB_ICONWARNING | MB_TASKMODAL | MB_SETFOREGROUND);
+  const int answer = MessageBoxA(mainWindow, question.Text(), "Assertion Failed",
+                                 MB_YESNO | MB_ICONWARNING | MB_TASKMODAL | MB_SETFOREGROUND);
   dialogOpen = false;
   if (quitting) PostQuitMessage(static_cast<int>(quit.wParam));
   return answer == IDYES;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What the Core library knows of the application around it, and the dialog that offers to break into
-// the debugger.
+// What the Core library knows of the application around it, and the dialog that offers to break
+// into the debugger.
 //
 // Threading: none; the state is plain and process-wide, one thread at a time.
 #pragma once
@@ -14,13 +14,13 @@ void SetRunsInApplication(bool runs);
 void* MainWindow();
 void SetMainWindow(void* window);
 
-// Asks whether to break into the debugger for the failed check at `file`, `line`. True when the user
-// chose Yes: the caller then breaks. False at once while the dialog is already open. A quit message
-// that is waiting is held back for the dialog's time.
+// Asks whether to break into the debugger for the failed check at `file`, `line`. True when the
+// user chose Yes: the caller then breaks. False at once while the dialog is already open. A quit
+// message that is waiting is held back for the dialog's time.
 bool AskBreakIntoDebugger(const char* file, int line);
 
-// Checks that there is a main application object. Without one the failure is reported (level VERIFY),
-// the dialog is offered and the failure is shown; the caller goes on all the same.
+// Checks that there is a main application object. Without one the failure is reported (level
+// VERIFY), the dialog is offered and the failure is shown; the caller goes on all the same.
 void VerifyMainApplication(const void* application, const char* file, int line);
 
 // Shows a failure in a box without owner, captioned "Exception".

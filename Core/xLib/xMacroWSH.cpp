@@ -50,7 +50,8 @@ i32 xMacroWSH::Run(const char* file) {
   const xScriptInfo& info = CurrentScriptInfo();
   // On the heap, although it lives for this call only: a stop abandons it together with its engine,
   // which must not be left with a pointer into a frame that is gone.
-  site = new xScriptExecutor(info.GetLanguage(), info.IsFixCRLF(), info.IsFixDelimiter(), kSiteFlag);
+  site =
+      new xScriptExecutor(info.GetLanguage(), info.IsFixCRLF(), info.IsFixDelimiter(), kSiteFlag);
   if (!site) return -1;
   i32 result = -1;
   if (site->IsReady()) result = site->Execute(file) ? 1 : 0;

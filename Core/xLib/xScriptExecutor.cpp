@@ -100,8 +100,8 @@ bool xScriptExecutor::Parse(const char* file) {
     return false;
   }
   EXCEPINFO exception = {};
-  const HRESULT result = parser->ParseScriptText(text, nullptr, nullptr, nullptr, 0, 0, 0, nullptr,
-                                                 &exception);
+  const HRESULT result =
+      parser->ParseScriptText(text, nullptr, nullptr, nullptr, 0, 0, 0, nullptr, &exception);
   SendReport(result, "Error parsing '%s' macro script.", file, nullptr);
   CoTaskMemFree(text);
   return result == S_OK;
@@ -184,8 +184,8 @@ static void AppendNumber(String& text, long number) {
   text.Append(digits.Text());
 }
 
-// What the engine gives of the error's place and reason; its results are not looked at, the defaults
-// stand where it gives nothing. The exception's own strings stay with the engine.
+// What the engine gives of the error's place and reason; its results are not looked at, the
+// defaults stand where it gives nothing. The exception's own strings stay with the engine.
 HRESULT xScriptExecutor::OnScriptError(IActiveScriptError* error) {
   if (!error) return E_POINTER;
   BSTR lineText = nullptr;

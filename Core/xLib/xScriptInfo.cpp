@@ -18,7 +18,7 @@ xScriptInfo& DefaultScriptInfo() { return defaultScriptInfo; }
 // The texts that have a key of their own, in the order of the file, after Language.
 struct TextKey {
   const char* key;
-  String xScriptInfo::* member;
+  String xScriptInfo::*member;
 };
 static constexpr TextKey kTextKeys[] = {
     {"Extension", &xScriptInfo::Extension},
@@ -127,8 +127,8 @@ void xScriptInfo::Read(Profile& profile, const xScriptInfo& defaults) {
   Language.Delete(kLongestLanguage, kLargestSize);
   if (!Language.IsEmpty()) Description.Format("%s WSH Version 1.50", Language.Text());
   for (const TextKey& text : kTextKeys)
-    profile.ReadString(this->*text.member, kSection, text.key,
-                       (defaults.*text.member).Text(), false);
+    profile.ReadString(this->*text.member, kSection, text.key, (defaults.*text.member).Text(),
+                       false);
   FixCRLF = profile.ReadBool(kSection, "FixCRLF", defaults.FixCRLF);
   FixDelimiter = profile.ReadBool(kSection, "FixDelimiter", defaults.FixDelimiter);
   OpenBracket = defaults.OpenBracket;

@@ -22,8 +22,8 @@ class xScriptInfo {
   // Turns \n, \r and \t, in this order, into control characters. A backslash has no escape of its
   // own.
   SLOT(0) void Unescape(String& text);
-  // Unescape on the five templates from MacroBegin to FunctionPostfix. The escape members keep their
-  // backslashes.
+  // Unescape on the five templates from MacroBegin to FunctionPostfix. The escape members keep
+  // their backslashes.
   SLOT(1) void UnescapeTemplates();
   SLOT(2) void SetDefaults();
   SLOT(3) ~xScriptInfo() = default;

@@ -3,12 +3,13 @@
 
 #include <cstring>
 
+#include "RawHost.h"
+
 EnginePlan plan;
+int liveEngines = 0;
 
 static const CLSID kClassId = {
     0x5d7a1c30, 0x6e0b, 0x4e58, {0x9a, 0x41, 0x3b, 0x7c, 0x11, 0x52, 0xd0, 0x6f}};
-static const wchar_t kClassText[] = L"{5D7A1C30-6E0B-4E58-9A41-3B7C1152D06F}";
-static const wchar_t kProgIdKey[] = L"FakeEngine";
 
 namespace {
 class Factory : public IClassFactory {
@@ -23,39 +24,32 @@ class Factory : public IClassFactory {
   STDMETHODIMP CreateInstance(IUnknown*, REFIID riid, void** object) override {
     *object = nullptr;
     if (FAILED(plan.results["CreateInstance"])) return plan.results["CreateInstance"];
-    FakeEngine* engine = new FakeEngine;
-    engine->AddRef();
-    const HRESULT result = engine->QueryInterface(riid, object);
-    engine->Release();
-    return result;
+    return (new FakeEngine)->QueryInterface(riid, object);
   }
 };
-Factory factory;
 }  // namespace
 
-FakeEngineClass::FakeEngineClass() {
+// The key is volatile: it goes with the session, and other processes may be using it until then.
+void RegisterFakeEngine() {
+  static Factory factory;
+  static const wchar_t kText[] = L"{5D7A1C30-6E0B-4E58-9A41-3B7C1152D06F}";
   HKEY key;
-  RegCreateKeyW(HKEY_CLASSES_ROOT, (std::wstring(kProgIdKey) + L"\\CLSID").c_str(), &key);
-  RegSetValueExW(key, nullptr, 0, REG_SZ, reinterpret_cast<const BYTE*>(kClassText),
-                 sizeof kClassText);
+  RegCreateKeyExW(HKEY_CLASSES_ROOT, L"FakeEngine\\CLSID", 0, nullptr, REG_OPTION_VOLATILE,
+                  KEY_WRITE, nullptr, &key, nullptr);
+  RegSetValueExW(key, nullptr, 0, REG_SZ, reinterpret_cast<const BYTE*>(kText), sizeof kText);
   RegCloseKey(key);
+  DWORD cookie;
   CoRegisterClassObject(kClassId, &factory, CLSCTX_INPROC_SERVER, REGCLS_MULTIPLEUSE, &cookie);
 }
 
-FakeEngineClass::~FakeEngineClass() {
-  CoRevokeClassObject(cookie);
-  RegDeleteTreeW(HKEY_CLASSES_ROOT, kProgIdKey);
-}
-
-FakeEngine::FakeEngine() { ++plan.liveEngines; }
-
-FakeEngine::~FakeEngine() {
-  if (site) site->Release();
-  --plan.liveEngines;
+std::string Hex(HRESULT result) {
+  char text[16];
+  std::snprintf(text, sizeof text, "%08lX", static_cast<unsigned long>(result));
+  return text;
 }
 
 HRESULT FakeEngine::Note(const std::string& step) {
-  plan.log.push_back(step);
+  Log("engine: " + step);
   const auto planned = plan.results.find(step);
   return planned == plan.results.end() ? S_OK : planned->second;
 }
@@ -63,7 +57,7 @@ HRESULT FakeEngine::Note(const std::string& step) {
 HRESULT FakeEngine::QueryInterface(REFIID riid, void** object) {
   *object = nullptr;
   if (riid == __uuidof(IActiveScriptParse)) {
-    const HRESULT result = Note("QueryParse");
+    const HRESULT result = Note("QueryInterface of the parser");
     if (FAILED(result)) return result;
     *object = static_cast<IActiveScriptParse*>(this);
   } else if (riid == IID_IUnknown || riid == IID_IActiveScript) {
@@ -81,12 +75,6 @@ ULONG FakeEngine::Release() {
   return left;
 }
 
-HRESULT FakeEngine::SetScriptSite(IActiveScriptSite* newSite) {
-  site = newSite;
-  site->AddRef();
-  return Note("SetScriptSite");
-}
-
 HRESULT FakeEngine::SetScriptState(SCRIPTSTATE state) {
   const HRESULT result = Note("SetScriptState " + std::to_string(state));
   if (state == SCRIPTSTATE_CONNECTED && plan.onConnect) plan.onConnect(*this);
@@ -101,8 +89,8 @@ HRESULT FakeEngine::AddNamedItem(LPCOLESTR name, DWORD flags) {
 
 HRESULT FakeEngine::InterruptScriptThread(SCRIPTTHREADID thread, const EXCEPINFO* info,
                                           DWORD flags) {
-  return Note("Interrupt " + std::to_string(static_cast<int>(thread)) + (info ? " info " : " ") +
-              std::to_string(flags));
+  return Note("InterruptScriptThread " + std::to_string(static_cast<int>(thread)) +
+              (info ? " with info " : " ") + std::to_string(flags));
 }
 
 HRESULT FakeEngine::ParseScriptText(LPCOLESTR code, LPCOLESTR item, IUnknown* context,
@@ -117,43 +105,51 @@ HRESULT FakeEngine::ParseScriptText(LPCOLESTR code, LPCOLESTR item, IUnknown* co
 
 IDispatch* FakeEngine::Item() {
   IUnknown* item = nullptr;
-  if (site->GetItemInfo(L"tarn", SCRIPTINFO_IUNKNOWN, &item, nullptr) != S_OK) return nullptr;
+  site->GetItemInfo(L"tarn", SCRIPTINFO_IUNKNOWN, &item, nullptr);
   return static_cast<IDispatch*>(item);
 }
 
-HRESULT FakeEngine::Call(const wchar_t* name, std::vector<VARIANT> arguments, VARIANT* result) {
+static std::string Describe(const VARIANT& value) {
+  if (value.vt == VT_I4) return std::to_string(value.lVal);
+  if (value.vt != VT_BSTR) return "type " + std::to_string(value.vt);
+  std::string text = std::to_string(SysStringLen(value.bstrVal)) + " \"";
+  for (const wchar_t* unit = value.bstrVal; *unit; ++unit)
+    text +=
+        *unit < 128 ? std::string(1, static_cast<char>(*unit)) : "<" + Hex(*unit).substr(4) + ">";
+  return text + "\"";
+}
+
+void FakeEngine::Call(const wchar_t* name, std::vector<VARIANT> arguments) {
   IDispatch* item = Item();
   DISPID id = -1;
   LPOLESTR names[] = {const_cast<LPOLESTR>(name)};
+  VARIANT result = Value(VT_R8);
   HRESULT outcome = item->GetIDsOfNames(IID_NULL, names, 1, LOCALE_USER_DEFAULT, &id);
   if (outcome == S_OK) {
     std::vector<VARIANT> reversed(arguments.rbegin(), arguments.rend());
     DISPPARAMS params = {reversed.data(), nullptr, static_cast<UINT>(reversed.size()), 0};
-    outcome = item->Invoke(id, IID_NULL, LOCALE_USER_DEFAULT, DISPATCH_METHOD, &params, result,
+    outcome = item->Invoke(id, IID_NULL, LOCALE_USER_DEFAULT, DISPATCH_METHOD, &params, &result,
                            nullptr, nullptr);
   }
+  Log("returned " + Hex(outcome) + ", " + Describe(result));
+  VariantClear(&result);
   for (VARIANT& argument : arguments) VariantClear(&argument);
   item->Release();
-  return outcome;
 }
 
-VARIANT Plain(VARTYPE type, LONGLONG bits) {
+VARIANT Value(VARTYPE type, LONGLONG bits) {
   VARIANT value = {};
   value.vt = type;
   value.llVal = bits;
   return value;
 }
 
-VARIANT Integer(long value) { return Plain(VT_I4, value); }
-
 VARIANT Real(double value) {
   LONGLONG bits;
   std::memcpy(&bits, &value, sizeof bits);
-  return Plain(VT_R8, bits);
+  return Value(VT_R8, bits);
 }
 
-VARIANT Text(const wchar_t* value) {
-  VARIANT text = Plain(VT_BSTR);
-  text.bstrVal = value ? SysAllocString(value) : nullptr;
-  return text;
+VARIANT Text(const std::wstring& value) {
+  return Value(VT_BSTR, reinterpret_cast<LONG_PTR>(SysAllocString(value.c_str())));
 }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // A recording Active Scripting engine: an in-process COM class under the ProgID "FakeEngine". It
-// writes down every call of the script site, in order and with arguments, answers what the test's
-// plan says, and lets the test play the script.
+// logs every call of the script site, in order and with arguments, answers what the test's plan
+// says, and lets the test play the script.
 #pragma once
 
 #include <windows.h>
@@ -18,62 +18,53 @@
 class FakeEngine;
 
 struct EnginePlan {
-  std::map<std::string, HRESULT> results;         // by step; S_OK where nothing stands
-  std::function<void(FakeEngine&)> onParse;       // inside ParseScriptText
-  std::function<void(FakeEngine&)> onConnect;     // the script: inside SetScriptState(CONNECTED)
-  std::vector<std::string> log;                   // what the site asked for
-  std::wstring source;                            // what ParseScriptText got
-  int liveEngines = 0;
+  std::map<std::string, HRESULT> results;      // by step as it is logged; S_OK for others
+  std::function<void(FakeEngine&)> onParse;    // inside ParseScriptText
+  std::function<void(FakeEngine&)> onConnect;  // the script: inside SetScriptState(CONNECTED)
+  std::wstring source;                         // what ParseScriptText got
 };
 extern EnginePlan plan;
+extern int liveEngines;
 
-// Registers the class for this process; undone by the destructor. Needs an initialised apartment.
-class FakeEngineClass {
- public:
-  FakeEngineClass();
-  ~FakeEngineClass();
-
- private:
-  DWORD cookie = 0;
-};
+void RegisterFakeEngine();  // for this process; needs an initialised apartment
+std::string Hex(HRESULT result);
 
 class FakeEngine : public IActiveScript, public IActiveScriptParse {
  public:
-  FakeEngine();
-  virtual ~FakeEngine();
+  FakeEngine() { ++liveEngines; }
+  virtual ~FakeEngine() { --liveEngines; }
 
-  // The `tarn` object as an engine gets it from the site; null when the site refuses.
+  IActiveScriptSite* site = nullptr;
+  // The `tarn` object as an engine gets it from the site.
   IDispatch* Item();
-  // One script call `tarn.name(arguments)`, by GetIDsOfNames and Invoke.
-  HRESULT Call(const wchar_t* name, std::vector<VARIANT> arguments = {}, VARIANT* result = nullptr);
-  IActiveScriptSite* Site() { return site; }
+  // The script's call `tarn.name(arguments)`, with its outcome and result logged.
+  void Call(const wchar_t* name, std::vector<VARIANT> arguments = {});
 
   STDMETHODIMP QueryInterface(REFIID riid, void** object) override;
   STDMETHODIMP_(ULONG) AddRef() override { return ++references; }
   STDMETHODIMP_(ULONG) Release() override;
-
-  STDMETHODIMP SetScriptSite(IActiveScriptSite* newSite) override;
+  STDMETHODIMP SetScriptSite(IActiveScriptSite* newSite) override {
+    site = newSite;
+    return Note("SetScriptSite");
+  }
   STDMETHODIMP GetScriptSite(REFIID, void**) override { return Note("GetScriptSite"); }
   STDMETHODIMP SetScriptState(SCRIPTSTATE state) override;
   STDMETHODIMP GetScriptState(SCRIPTSTATE*) override { return Note("GetScriptState"); }
   STDMETHODIMP Close() override { return Note("Close"); }
   STDMETHODIMP AddNamedItem(LPCOLESTR name, DWORD flags) override;
   STDMETHODIMP AddTypeLib(REFGUID, DWORD, DWORD, DWORD) override { return Note("AddTypeLib"); }
-  STDMETHODIMP GetScriptDispatch(LPCOLESTR, IDispatch**) override {
-    return Note("GetScriptDispatch");
-  }
+  STDMETHODIMP GetScriptDispatch(LPCOLESTR, IDispatch**) override { return Note("GetDispatch"); }
   STDMETHODIMP GetCurrentScriptThreadID(SCRIPTTHREADID*) override { return Note("GetThread"); }
-  STDMETHODIMP GetScriptThreadID(DWORD, SCRIPTTHREADID*) override { return Note("GetThreadId"); }
+  STDMETHODIMP GetScriptThreadID(DWORD, SCRIPTTHREADID*) override { return Note("GetThreadID"); }
   STDMETHODIMP GetScriptThreadState(SCRIPTTHREADID, SCRIPTTHREADSTATE*) override {
     return Note("GetThreadState");
   }
   STDMETHODIMP InterruptScriptThread(SCRIPTTHREADID thread, const EXCEPINFO* info,
                                      DWORD flags) override;
   STDMETHODIMP Clone(IActiveScript**) override { return Note("Clone"); }
-
   STDMETHODIMP InitNew() override { return Note("InitNew"); }
-  STDMETHODIMP AddScriptlet(LPCOLESTR, LPCOLESTR, LPCOLESTR, LPCOLESTR, LPCOLESTR, LPCOLESTR,
-                            DWORD, ULONG, DWORD, BSTR*, EXCEPINFO*) override {
+  STDMETHODIMP AddScriptlet(LPCOLESTR, LPCOLESTR, LPCOLESTR, LPCOLESTR, LPCOLESTR, LPCOLESTR, DWORD,
+                            ULONG, DWORD, BSTR*, EXCEPINFO*) override {
     return Note("AddScriptlet");
   }
   STDMETHODIMP ParseScriptText(LPCOLESTR code, LPCOLESTR item, IUnknown* context,
@@ -83,10 +74,8 @@ class FakeEngine : public IActiveScript, public IActiveScriptParse {
  private:
   static HRESULT Note(const std::string& step);
   ULONG references = 0;
-  IActiveScriptSite* site = nullptr;
 };
 
-VARIANT Integer(long value);
+VARIANT Value(VARTYPE type, LONGLONG bits = 0);
 VARIANT Real(double value);
-VARIANT Text(const wchar_t* value);  // freed by Call
-VARIANT Plain(VARTYPE type, LONGLONG bits = 0);
+VARIANT Text(const std::wstring& value);  // freed by Call
