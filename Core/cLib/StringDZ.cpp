@@ -5,9 +5,7 @@
 
 #include "cLib/cReport.h"
 
-StringDZ::~StringDZ() {
-  Clear();
-}
+StringDZ::~StringDZ() { Clear(); }
 
 void StringDZ::Add(const char* s, bool numbered) {
   if (!s) {

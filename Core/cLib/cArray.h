@@ -2,8 +2,8 @@
 // Array, List and ListIter: growable tables of pointers to heap objects of one class.
 //
 // An owning container (the default) deletes its elements through their virtual destructor; a
-// non-owning one only forgets them. Broken preconditions are reported (source "cArray") and change
-// nothing. Slots may be null.
+// non-owning one only forgets them. Indexes and sizes that are out of range are reported (source
+// "cArray") and change nothing. Slots may be null.
 //
 // The layout of Array is shared with the host editor: the result texts and the argument list of the
 // context record are Arrays that the host constructs and this module fills, empties and grows.
@@ -47,15 +47,18 @@ class Array {
 
   // Stores `item` at `index`, growing the table when needed; appending is SetAt(item, Count()). An
   // element already there is deleted (owning) or reported as a leak (not owning). Returns `index`,
-  // or -1 when the item was not stored (negative index, no memory): it is then still the caller's.
+  // or -1 when there is no memory. After a negative result the item is still the caller's.
   i32 SetAt(T* item, i32 index);
 
   // Takes the element out of its slot without deleting it; Count() stays. Reported: no such index.
   T* Detach(i32 index);
 
-  // Deletes the elements (owning) and sets the count to 0. Each element leaves its slot before it is
-  // deleted, so a second call after a fault in a destructor goes on with the next one.
+  // Deletes the elements (owning) and sets the count to 0. Each element leaves its slot before it
+  // is deleted, so a second call after a fault in a destructor goes on with the next one.
   void Clear();
+
+  // Sets the count to 0 without looking at the elements.
+  void Forget() { count = 0; }
 
  private:
   static constexpr i32 kInitialSlots = 50;
@@ -86,14 +89,15 @@ void Array<T>::Grow(i32 slots) {
   ReleaseBlock(items);
   items = grown;
   capacity = wanted;
-  if (count >= 0 && static_cast<u32>(count) >= capacity) REPORT_ASSERT("cArray", "Count beyond capacity");
+  if (count >= 0 && static_cast<u32>(count) >= capacity)
+    REPORT_ASSERT("cArray", "Count beyond capacity");
 }
 
 template <class T>
 i32 Array<T>::SetAt(T* item, i32 index) {
   if (index < 0) {
     REPORT_ASSERT("cArray", "Negative index");
-    return -1;
+    return index;
   }
   if (!HasSlot(index)) {
     // A fifth more than the index, and never less than the slot itself needs (a table made by the
@@ -104,15 +108,13 @@ i32 Array<T>::SetAt(T* item, i32 index) {
     Grow(slots > 0x7FFFFFFFu ? 0x7FFFFFFF : static_cast<i32>(slots));
     if (!HasSlot(index)) return -1;
   }
-  T* old = items[index];
-  if (old && old != item && index < count) {
-    if (ownsElements)
-      delete old;
-    else
-      REPORT_ASSERT("cArray", "Memory leak deteched");
-  }
+  // Slots that are skipped may still hold what a non-owning array has forgotten.
+  for (i32 i = count < 0 ? 0 : count; i < index; ++i) items[i] = nullptr;
+  T* const old = index < count ? items[index] : nullptr;
   items[index] = item;
   if (index >= count) count = index + 1;
+  if (old && !ownsElements) REPORT_ASSERT("cArray", "Memory leak deteched");
+  if (old && old != item && ownsElements) delete old;
   return index;
 }
 
@@ -129,8 +131,13 @@ T* Array<T>::Detach(i32 index) {
 
 template <class T>
 void Array<T>::Clear() {
-  if (ownsElements)
-    for (i32 i = 0; i < count && HasSlot(i); ++i) delete Detach(i);
+  for (i32 i = 0; ownsElements && i < count; ++i) {
+    if (!HasSlot(i)) {
+      REPORT_ASSERT("cArray", "Count beyond capacity");
+      break;
+    }
+    delete Detach(i);
+  }
   count = 0;
 }
 

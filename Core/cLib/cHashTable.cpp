@@ -15,9 +15,7 @@ static cHashTableBase* clearingTable = nullptr;
 
 // --- The hash ------------------------------------------------------------------------------------
 
-static u32 Rotate(u32 x, u32 bits) {
-  return x << bits | x >> (32 - bits);
-}
+static u32 Rotate(u32 x, u32 bits) { return x << bits | x >> (32 - bits); }
 
 // Stirs three words reversibly. Each step takes the last word, rotated, out of the first one.
 static void Mix(u32& a, u32& b, u32& c) {

@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: MIT
-// The contract between the host editor and the module: the host macro interface, the context record,
-// and the module's view of the host that is current. Docs/abi.md describes it for host developers;
-// the byte offsets and the slot order are fixed by the editors in the field.
+// The contract between the host editor and the module: the host macro interface, the context
+// record, and the module's view of the host that is current. Docs/abi.md describes it for host
+// developers; the byte offsets and the slot order are fixed by the editors in the field.
 //
 // Ownership: the host owns both objects. Threading: everything here belongs to the host thread that
-// called `execute`; only the record's two stop fields may be written from any thread.
+// called `execute`, but for what `kill` does from any thread: it asks for the current host and its
+// record and writes the record's two stop fields.
 //
 // Next on the reader's path: Core/xLib/xMacro.h, the engine that `execute` drives.
 #pragma once
@@ -37,7 +38,8 @@ struct HostContext {
   u8 reserved22[1];
   u32 resultKind;     // kTextResult or anything else
   i32 integerResult;  // of the last macro function call
-  // Two Arrays by value, at offsets that no compiler would align: reach them through the functions.
+  // Two Arrays by value, deliberately at offsets that no compiler would align (this processor does
+  // not mind): reach them through the functions.
   u8 resultTexts[20];
   u8 argumentList[20];
 
@@ -60,17 +62,17 @@ static_assert(offsetof(HostContext, argumentList) == 51, "the host's Array of ar
 static_assert(sizeof(HostContext) == 71, "the part of the host's record that the module touches");
 #endif
 
-// The host macro interface. Never created or freed by the module. The slots that the module does not
-// call keep their places; the host fills them as it likes.
+// The host macro interface. Never created or freed by the module. The slots that the module does
+// not call keep their places; the host fills them as it likes.
 class HostInterface {
  public:
   SLOTS_FROM(0);
   SLOT(0) void Unused0() = 0;
   SLOT(1) HostContext* Context() = 0;
-  SLOT(2) void ReportMessage(const char* text) = 0;             // for the user
+  SLOT(2) void ReportMessage(const char* text) = 0;               // for the user
   SLOT(3) void __cdecl DebugOutput(const char* format, ...) = 0;  // trace lines
-  SLOT(4) void SetFixCRLF(u8 flag) = 0;                         // before every call
-  SLOT(5) void SetFixDelimiter(u8 flag) = 0;                    // before every call
+  SLOT(4) void SetFixCRLF(u8 flag) = 0;                           // before every call
+  SLOT(5) void SetFixDelimiter(u8 flag) = 0;                      // before every call
   SLOT(6) void Unused6() = 0;
   SLOT(7) u32 FunctionId(const char* name) = 0;  // kUnknownFunction: no such function
   SLOT(8) void Unused8() = 0;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The one place through which the Core library takes memory: blocks of the C heap, which the host
-// shares, so that a block made on one side may be released on the other.
+// The one place through which the Core library takes memory: blocks of the C heap. A host whose lists
+// the module grows makes their slots with the same C runtime's malloc (msvcrt.dll).
 //
 // Threading: as the C heap, any thread.
 #pragma once

@@ -2,9 +2,9 @@
 // The process-wide reporter of trace lines and failed assertions. Every Core class reports a broken
 // precondition here and then carries on; nothing here throws or ends the program.
 //
-// A line goes to the log file, when one is named, and in a short form to the debug-output hook, when
-// one is installed. The file is opened and closed for every line, so the log survives a crash up to
-// its last line.
+// A line goes to the log file, when one is named, and in a short form to the debug-output hook,
+// when one is installed. The file is opened and closed for every line, so the log survives a crash
+// up to its last line.
 //
 // Threading: none. The state is plain and process-wide; one thread at a time.
 #pragma once

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Numbers the virtual operations of a class where they are declared, so that swapping two lines does
-// not compile:
+// Numbers the virtual operations of a class where they are declared, so that swapping two lines
+// does not compile:
 //
 //   SLOTS_FROM(0);
 //   SLOT(0) ~Shape();
@@ -13,6 +13,6 @@
 
 #define SLOTS_FROM(first) enum : int { kSlotBase = __COUNTER__ + 1 - (first) }
 
-#define SLOT(number)                                                                   \
+#define SLOT(number)                                                                    \
   static_assert(__COUNTER__ - kSlotBase == (number), "virtual operation out of order"); \
   virtual

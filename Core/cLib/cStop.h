@@ -5,8 +5,9 @@
 // A stop always reaches the innermost armed `execute`: each one saves the stop point on entry and
 // puts it back when it ends, so a nested run never leaves the buffer pointing into its dead frame.
 //
-// Threading: the host thread inside `execute` only; the frames between are skipped, not unwound, so
-// a stop comes from within a call that the script made into the host.
+// Threading: the host thread inside `execute` only: a stop comes from within a call that the script
+// made into the host. Nothing of the module's own in the frames between is destroyed; handlers that
+// other frames have registered with the system do run.
 #pragma once
 
 #include <setjmp.h>

@@ -26,13 +26,9 @@ static char& NoCharacter() {
   return character;
 }
 
-static bool IsBlank(char ch) {
-  return ch == ' ' || ch == '\t';
-}
+static bool IsBlank(char ch) { return ch == ' ' || ch == '\t'; }
 
-static int Lower(char ch) {
-  return tolower(static_cast<u8>(ch));
-}
+static int Lower(char ch) { return tolower(static_cast<u8>(ch)); }
 
 static bool SameBytes(const char* a, const char* b, u32 size, bool caseSensitive) {
   if (caseSensitive) return memcmp(a, b, size) == 0;
@@ -41,9 +37,7 @@ static bool SameBytes(const char* a, const char* b, u32 size, bool caseSensitive
   return true;
 }
 
-static u32 LengthOf(const char* s) {
-  return static_cast<u32>(strlen(s));
-}
+static u32 LengthOf(const char* s) { return static_cast<u32>(strlen(s)); }
 
 // --- Blocks and arguments ----------------------------------------------------------------------
 
@@ -59,9 +53,7 @@ String::Argument::Argument(const String& owner, const void* source, u32 bytesWan
   copy[size] = copy[size + 1] = 0;
 }
 
-String::Argument::~Argument() {
-  ReleaseBlock(copy);
-}
+String::Argument::~Argument() { ReleaseBlock(copy); }
 
 u32 String::RoomFrom(const void* place) const {
   const uintptr_t offset = reinterpret_cast<uintptr_t>(place) - reinterpret_cast<uintptr_t>(text);
@@ -101,13 +93,9 @@ void String::ReplaceAt(u32 pos, u32 count, const char* bytes, u32 size) {
 
 // --- Construction --------------------------------------------------------------------------------
 
-String::~String() {
-  TakeBlock(nullptr, 0);
-}
+String::~String() { TakeBlock(nullptr, 0); }
 
-String::String() {
-  Begin(0);
-}
+String::String() { Begin(0); }
 
 String::String(const char* s) {
   const u32 n = s ? LengthOf(s) : 0;

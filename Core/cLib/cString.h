@@ -68,24 +68,25 @@ class String {
   void Assign(const char* s);  // null assigns the empty string
   String& operator=(const char* s);
   String& operator=(const String& other);
-  // Makes the block hold at least `n` bytes beyond the grow step: an absolute size, not one relative
-  // to the length. Doubles the grow step on every call, up to 32768. Reported: `n` of 0. False, and
-  // nothing changed, when there is no memory.
+  // Makes the block hold at least `n` bytes beyond the grow step: an absolute size, not one
+  // relative to the length. Doubles the grow step on every call, up to 32768. Reported: `n` of 0.
+  // False, and nothing changed, when there is no memory.
   bool Reserve(u32 n);
   // Empties the text and makes at least `n` bytes fit. When no new block is needed only the first
   // byte is cleared and the length is left for the caller to set. False, and nothing changed, when
   // there is no memory.
   bool EmptyReserve(u32 n);
-  // Appends `len` bytes of `s` (copying stops at a NUL of `s`, the rest are zero bytes), or all of it
-  // when `len` is -1; two zero bytes follow the terminator. Reported, without effect: `len` below -1.
+  // Appends `len` bytes of `s` (copying stops at a NUL of `s`, the rest are zero bytes), or all of
+  // it when `len` is -1; two zero bytes follow the terminator. Reported, without effect: `len`
+  // below -1.
   void Append(const char* s, int len = -1);
   void AppendChar(char ch);
 
   // --- Character access ------------------------------------------------------------------------
   // The character at `index`, the text being extended to it when it is shorter: by a blank when one
   // character is missing, else by the pad character (not at all by a pad character of 0). The
-  // reference is to a byte that belongs to no text for a negative index, which is reported, and when
-  // there is no memory to extend.
+  // reference is to a byte that belongs to no text for a negative index, which is reported, and
+  // when there is no memory to extend.
   char& At(int index);
   // Stores `ch` through At and returns the character that was there.
   char SetAt(int index, char ch);
@@ -159,8 +160,8 @@ class String {
   void FromUtf8ToUtf16(const char* s, int n = -1);
 
  private:
-  // Bytes that an operation reads while it changes its own block: copied, and terminated by two zero
-  // bytes, when they stand in that block, else used where they are.
+  // Bytes that an operation reads while it changes its own block: copied, and terminated by two
+  // zero bytes, when they stand in that block, else used where they are.
   class Argument {
    public:
     Argument(const String& owner, const void* source, u32 size);
@@ -175,10 +176,10 @@ class String {
     char* copy = nullptr;
   };
 
-  u32 RoomFrom(const void* place) const;          // bytes to the own block's end, if inside
+  u32 RoomFrom(const void* place) const;  // bytes to the own block's end, if inside
   u32 TextLength(const char* s, u32 most = kLargestSize) const;  // of an argument
-  bool Begin(u32 n);                              // the first block, for `n` characters
-  void TakeBlock(char* block, u32 size);          // in place of the old one
+  bool Begin(u32 n);                      // the first block, for `n` characters
+  void TakeBlock(char* block, u32 size);  // in place of the old one
   void ReplaceAt(u32 pos, u32 count, const char* bytes, u32 size);  // the block has room
   void DeleteThroughSlot(u32& pos);
   void FromWideIn(u32 codePage, const wchar_t* w, u32 units, u32 room);

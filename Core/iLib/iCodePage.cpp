@@ -7,9 +7,7 @@
 
 static u32 activeCodePage = kUtf8CodePage;
 
-u32 ActiveCodePage() {
-  return activeCodePage;
-}
+u32 ActiveCodePage() { return activeCodePage; }
 
 void SetActiveCodePageFromKeyboard() {
   const WORD language = LOWORD(reinterpret_cast<DWORD_PTR>(GetKeyboardLayout(0)));

@@ -10,8 +10,8 @@
 constexpr u32 kNarrowLimit = 512;  // characters that reach narrow text, terminator not counted
 constexpr u32 kWideLimit = 1024;   // units of a wide text, terminator included
 
-// The low byte of each UTF-16 unit, up to the terminator or kNarrowLimit characters; no code page is
-// involved, so a unit such as U+0100 ends the text. Null gives the empty text. Never null.
+// The low byte of each UTF-16 unit, up to the terminator or kNarrowLimit characters; no code page
+// is involved, so a unit such as U+0100 ends the text. Null gives the empty text. Never null.
 const char* NarrowFromWide(const wchar_t* text);
 
 // UTF-16 by the system's ANSI code page. A longer text delivers the leading units that convert to

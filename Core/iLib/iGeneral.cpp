@@ -14,7 +14,7 @@
 #include "cLib/cReport.h"
 #include "iLib/iModule.h"
 
-static constexpr int kFolderLocalAppData = 28;   // CSIDL_LOCAL_APPDATA
+static constexpr int kFolderLocalAppData = 28;    // CSIDL_LOCAL_APPDATA
 static constexpr DWORD kLongestModuleName = 255;  // longer names no longer join with a file name
 // Readers of logs know this check by its number, so it is fixed, wherever the check stands.
 static constexpr int kModuleNameReportLine = 899;
@@ -69,8 +69,8 @@ bool MayReadAndWrite(const char* folder) {
   GetFileSecurityA(folder, parts, nullptr, 0, &bytes);
   PSECURITY_DESCRIPTOR descriptor = bytes ? AllocateBlock(bytes) : nullptr;
   if (!descriptor) return false;
-  const bool granted = GetFileSecurityA(folder, parts, descriptor, bytes, &bytes) &&
-                       DescriptorGrants(descriptor);
+  const bool granted =
+      GetFileSecurityA(folder, parts, descriptor, bytes, &bytes) && DescriptorGrants(descriptor);
   ReleaseBlock(descriptor);
   return granted;
 }

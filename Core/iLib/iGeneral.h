@@ -6,8 +6,8 @@
 
 #include "cLib/cString.h"
 
-// Full folder of the loaded module with its trailing backslash; empty when the system does not tell.
-// A name of 255 characters or more, or none, is reported (source "iGeneral").
+// Full folder of the loaded module with its trailing backslash; empty when the system does not
+// tell. A name of 255 characters or more, or none, is reported (source "iGeneral").
 String ModuleFolder();
 
 // Whether the current user, as the thread's token has it when it impersonates, else the process's,
@@ -17,7 +17,8 @@ bool MayReadAndWrite(const char* folder);
 // Makes the folder and its missing parents. Whether it is there afterwards; false for empty.
 bool EnsureFolder(const char* folder);
 
-// <local application data>\Programs\, made when missing. Empty when the system names no such folder.
+// <local application data>\Programs\, made when missing. Empty when the system names no such
+// folder.
 String ProgramsFolder();
 
 // <local application data>\Programs\Tarn\, made when missing, cached.

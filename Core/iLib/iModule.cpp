@@ -3,10 +3,6 @@
 
 static void* moduleHandle = nullptr;
 
-void KeepModuleHandle(void* handle) {
-  moduleHandle = handle;
-}
+void KeepModuleHandle(void* handle) { moduleHandle = handle; }
 
-void* ModuleHandle() {
-  return moduleHandle;
-}
+void* ModuleHandle() { return moduleHandle; }

@@ -5,8 +5,8 @@
 
 static constexpr u32 kValueBytes = 512;  // terminator included
 
-bool Profile::ReadString(String& out, const char* section, const char* key,
-                         const char* defaultText, bool removeKey) const {
+bool Profile::ReadString(String& out, const char* section, const char* key, const char* defaultText,
+                         bool removeKey) const {
   char value[kValueBytes] = "";
   const DWORD copied =
       GetPrivateProfileStringA(section, key, defaultText, value, sizeof value, FileName());

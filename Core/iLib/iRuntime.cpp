@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What the cross compiler expects of the Microsoft C runtime and mingw's does not have, or has under
-// another name. With the Microsoft C runtime itself this file is empty.
+// What the cross compiler expects of the Microsoft C runtime and mingw's does not have, or has
+// under another name. With the Microsoft C runtime itself this file is empty.
 #include <stddef.h>
 
 #ifdef __MINGW64_VERSION_MAJOR

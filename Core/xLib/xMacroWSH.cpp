@@ -9,12 +9,14 @@
 static constexpr u8 kSiteFlag = 0;  // handed to the host with every script site
 
 static String descriptionPath;  // empty until first needed
-static String hostDataPath;
+static String hostDataPath;     // from the host's `version` call; nothing here reads it
 
-static const String& DescriptionPath() {
+// Empty, and tried again for the next engine, when no folder can be named.
+static String DescriptionPath() {
   if (descriptionPath.IsEmpty()) {
     String folder = ModuleFolder();
     if (!MayReadAndWrite(folder.Text())) folder = ProductFolder();
+    if (folder.IsEmpty()) return folder;
     EnsureFolder(folder.Text());
     descriptionPath = folder + "xMacroWSH.qwsh";
   }
@@ -50,14 +52,14 @@ i32 xMacroWSH::Run(const char* file) {
   const xScriptInfo& info = CurrentScriptInfo();
   // On the heap, although it lives for this call only: a stop abandons it together with its engine,
   // which must not be left with a pointer into a frame that is gone.
-  site =
+  xScriptExecutor* const running =
       new xScriptExecutor(info.GetLanguage(), info.IsFixCRLF(), info.IsFixDelimiter(), kSiteFlag);
-  if (!site) return -1;
+  if (!running) return -1;
+  site = running;
   i32 result = -1;
-  if (site->IsReady()) result = site->Execute(file) ? 1 : 0;
-  xScriptExecutor* finished = site;
+  if (running->IsReady()) result = running->Execute(file) ? 1 : 0;
   site = nullptr;
-  delete finished;
+  delete running;
   return result;
 }
 

@@ -101,17 +101,31 @@ static void SetArgument(xArgument& argument, VARIANT& value) {
   }
 }
 
-// Appends the arguments in the script's order; COM stores them last first. Empty values and objects
-// have no form that the host knows: they are skipped and later arguments move up.
-void xScript::AppendArguments(const DISPPARAMS& params, Array<xArgument>& arguments) {
+// Converts the arguments in the script's order; COM stores them last first. Empty values and
+// objects have no form that the host knows: they are skipped and later arguments move up. False: no
+// memory.
+static bool Convert(const DISPPARAMS& params, Array<xArgument>& arguments) {
   for (UINT i = params.rgvarg ? params.cArgs : 0; i-- > 0;) {
     VARIANT& value = params.rgvarg[i];
     if (value.vt == VT_EMPTY || value.vt == VT_DISPATCH) continue;
     xArgument* argument = new xArgument;
-    if (!argument) continue;
+    if (!argument) return false;
     SetArgument(*argument, value);
-    if (arguments.SetAt(argument, arguments.Count()) < 0) delete argument;
+    if (arguments.SetAt(argument, arguments.Count()) < 0) {
+      delete argument;
+      return false;
+    }
   }
+  return true;
+}
+
+// Hands the arguments over to the host's list.
+static bool Move(Array<xArgument>& from, Array<xArgument>& to) {
+  for (i32 i = 0; i < from.Count(); ++i) {
+    if (to.SetAt(from.At(i), i) < 0) return false;
+    from.Detach(i);
+  }
+  return true;
 }
 
 // The host's result. A text result of another kind leaves `result` as the caller gave it.
@@ -132,10 +146,14 @@ HRESULT xScript::Invoke(DISPID id, REFIID riid, LCID, WORD, DISPPARAMS* params, 
   HostInterface* current = CurrentHost();
   if (riid != IID_NULL || id < 0 || !current) return DISP_E_UNKNOWNINTERFACE;
   SetErrorInfo(0, nullptr);
+  // Converted before the record is touched: the value of an object may be the script's own code,
+  // whose calls pass through the same record.
+  Array<xArgument> arguments;
+  if (params && !Convert(*params, arguments)) return E_OUTOFMEMORY;
   HostContext& context = *current->Context();
   context.ArgumentList().Clear();
   context.ResultTexts().Clear();
-  if (params) AppendArguments(*params, context.ArgumentList());
+  if (!Move(arguments, context.ArgumentList())) return E_OUTOFMEMORY;
   current->SetFixCRLF(fixCRLF);
   current->SetFixDelimiter(fixDelimiter);
   current->CallFunction(static_cast<u32>(id));

@@ -4,8 +4,9 @@
 // finds the arguments in, and leaves the result in, the context record.
 //
 // Ownership: the script site holds it by value, so the reference count never ends its life.
-// Errors: COM results; what the host meets while it runs a function is not an error here.
-// Threading: the macro run's thread; only the reference count is atomic.
+// Errors: COM results, E_OUTOFMEMORY (without a call) among them; what the host meets while it runs
+// a function is not an error here. Threading: the macro run's thread; only the reference count is
+// atomic.
 //
 // Next on the reader's path: back in the host (Tools/macrorun/HostLink.h).
 #pragma once
@@ -47,7 +48,6 @@ class xScript : public IDispatch {
 
  private:
   static void CheckLayout();
-  void AppendArguments(const DISPPARAMS& params, Array<xArgument>& arguments);
 
   LONG references = 0;
   HostInterface* host;

@@ -9,7 +9,7 @@
 #include "iLib/iFile.h"
 #include "xLib/xProduct.h"
 
-// The 32-bit form of the parser; import libraries do not carry its identifier.
+// The 32-bit form of the parser; libraries do not carry its identifier under the header's name.
 static constexpr IID kActiveScriptParse = {
     0xBB1A2AE2, 0xA4F9, 0x11CF, {0x8F, 0x20, 0x00, 0x80, 0x5F, 0x2C, 0xD0, 0x64}};
 
@@ -20,16 +20,18 @@ static constexpr char kRubyEngine[] = "RubyScript";
 
 xScriptExecutor::xScriptExecutor(const char* progId, bool fixCRLF, bool fixDelimiter, u8 siteFlag)
     : dispatch(fixCRLF, fixDelimiter), host(CurrentHost()) {
+  // The caller's text may be read anew by a run that the host nests into this creation.
+  const String name(progId);
   // Whatever it answers, the destructor undoes one initialisation.
   CoInitialize(nullptr);
   host->Context()->siteFlag = siteFlag;
-  if (!progId || !*progId) {
+  if (name.IsEmpty()) {
     host->ReportMessage("No scripting module provided.");
     return;
   }
-  const HRESULT result = CreateEngine(progId);
+  const HRESULT result = CreateEngine(name.Text());
   ready = SUCCEEDED(result);
-  if (!ready) ReportCreation(result, progId);
+  if (!ready) ReportCreation(result, name.Text());
 }
 
 HRESULT xScriptExecutor::CreateEngine(const char* progId) {
@@ -87,7 +89,7 @@ void xScriptExecutor::CheckLayout() {
 bool xScriptExecutor::Execute(const char* file) {
   if (!ready || !Parse(file)) return false;
   const HRESULT result = engine->SetScriptState(SCRIPTSTATE_CONNECTED);
-  SendReport(result, "Error executing '%s' macro script.", file, nullptr);
+  SendReport(result, "Error executing '%s' macro script.", fileName.Text(), nullptr);
   return result == S_OK;
 }
 
@@ -102,8 +104,11 @@ bool xScriptExecutor::Parse(const char* file) {
   EXCEPINFO exception = {};
   const HRESULT result =
       parser->ParseScriptText(text, nullptr, nullptr, nullptr, 0, 0, 0, nullptr, &exception);
-  SendReport(result, "Error parsing '%s' macro script.", file, nullptr);
+  SendReport(result, "Error parsing '%s' macro script.", fileName.Text(), nullptr);
   CoTaskMemFree(text);
+  SysFreeString(exception.bstrSource);
+  SysFreeString(exception.bstrDescription);
+  SysFreeString(exception.bstrHelpFile);
   return result == S_OK;
 }
 
@@ -119,14 +124,13 @@ bool xScriptExecutor::IsRunning() {
 // `format` with `name` in place of its %s. Long names are appended, not formatted: a report never
 // shows a raw format.
 static String FormatName(const char* format, const char* name) {
-  String text(format ? format : "Unknown");
-  const char* mark = strstr(text.Text(), "%s");
-  if (!mark) return text;
-  const u32 before = static_cast<u32>(mark - text.Text());
-  String result = text.Mid(0, before);
-  result.Append(name ? name : "Unknown");
-  result.Append(mark + 2);
-  return result;
+  if (!format) format = "Unknown";
+  const char* mark = strstr(format, "%s");
+  if (!mark) return String(format);
+  String text(format, static_cast<u32>(mark - format));
+  text.Append(name ? name : "Unknown");
+  text.Append(mark + 2);
+  return text;
 }
 
 // Sends the system's reason for `result` with the text; any value but S_OK is reported.
@@ -153,13 +157,14 @@ void xScriptExecutor::SendReport(HRESULT result, const char* format, const char*
 // --- Site methods --------------------------------------------------------------------------------
 
 HRESULT xScriptExecutor::QueryInterface(REFIID riid, void** object) {
+  const bool window = riid == IID_IActiveScriptSiteWindow;
+  // Deliberately without touching the caller's pointer.
+  if (!window && riid != IID_IUnknown && riid != IID_IActiveScriptSite) return E_NOINTERFACE;
   if (!object) return E_POINTER;
-  if (riid == IID_IUnknown || riid == IID_IActiveScriptSite)
-    *object = static_cast<IActiveScriptSite*>(this);
-  else if (riid == IID_IActiveScriptSiteWindow)
+  if (window)
     *object = static_cast<IActiveScriptSiteWindow*>(this);
   else
-    return E_NOINTERFACE;  // deliberately without touching the caller's pointer
+    *object = static_cast<IActiveScriptSite*>(this);
   AddRef();
   return S_OK;
 }

@@ -4,10 +4,10 @@
 // error into one text for the host.
 //
 // Ownership: owns the engine, its parser and the dispatch object; owned by the run that made it.
-// The COM reference counting is a formality: AddRef and Release always answer 1. Errors: reported
-// to the host as text; operations of a site that is not ready do nothing. Threading: the macro
-// run's thread, which the constructor initialises for COM. Interrupt() is made while Execute() is
-// inside the engine.
+// The COM reference counting is a formality: AddRef and Release always answer 1.
+// Errors: reported to the host as text; a site that is not ready executes nothing.
+// Threading: the macro run's thread, which the constructor initialises for COM. Interrupt() is made
+// while Execute() is inside the engine.
 //
 // Next on the reader's path: xScript, the dispatch object.
 #pragma once

@@ -43,13 +43,9 @@ void xScriptInfo::Unescape(String& text) {
     const char* escape;
     char control;
   } kEscapes[] = {{"\\n", '\n'}, {"\\r", '\r'}, {"\\t", '\t'}};
-  for (const auto& pass : kEscapes) {
-    bool found = true;
-    while (found && !text.IsEmpty()) {
-      text.Reserve(text.Length() + 1);
-      found = text.ReplaceFirstWithChar(pass.escape, pass.control, 0);
+  for (const auto& pass : kEscapes)
+    while (text.ReplaceFirstWithChar(pass.escape, pass.control, 0)) {
     }
-  }
 }
 
 void xScriptInfo::UnescapeTemplates() {

@@ -68,6 +68,7 @@ static_assert(offsetof(xScriptInfo, OpenBracket) == 320, "four bytes in a row");
 static_assert(offsetof(xScriptInfo, CloseBracket) == 321, "four bytes in a row");
 static_assert(offsetof(xScriptInfo, FixCRLF) == 322, "four bytes in a row");
 static_assert(offsetof(xScriptInfo, FixDelimiter) == 323, "four bytes in a row");
+static_assert(sizeof(xScriptInfo) == 324, "nothing follows");
 #endif
 
 xScriptInfo& CurrentScriptInfo();

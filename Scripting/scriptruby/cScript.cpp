@@ -40,12 +40,13 @@ static void RunEngine(MacroRun& run) {
   run.result = run.engine->Run(run.file);
 }
 
-static void ClearContext(void* host) {
-  HostContext& context = *static_cast<HostInterface*>(host)->Context();
-  context.ArgumentList().Clear();
-  context.ResultTexts().Clear();
-  context.engine = nullptr;
-}
+static HostContext& ContextOf(void* host) { return *static_cast<HostInterface*>(host)->Context(); }
+
+static void ForgetEngine(void* host) { ContextOf(host).engine = nullptr; }
+static void ClearArguments(void* host) { ContextOf(host).ArgumentList().Clear(); }
+static void ClearTexts(void* host) { ContextOf(host).ResultTexts().Clear(); }
+static void ForgetArguments(void* host) { ContextOf(host).ArgumentList().Forget(); }
+static void ForgetTexts(void* host) { ContextOf(host).ResultTexts().Forget(); }
 
 static void RestoreCaller(const MacroRun& run) {
   CurrentStopPoint() = run.previousStop;
@@ -54,10 +55,12 @@ static void RestoreCaller(const MacroRun& run) {
 }
 
 static void FinishRun(MacroRun& run) {
-  ClearContext(run.host);
-  xMacro* engine = run.engine;
-  run.engine = nullptr;
-  if (engine) engine->Destroy();
+  // From here on the run cannot be stopped: it is over.
+  CurrentStopPoint().armed = false;
+  ClearArguments(run.host);
+  ClearTexts(run.host);
+  ForgetEngine(run.host);
+  if (run.engine) run.engine->Destroy();
   RestoreCaller(run);
 }
 
@@ -74,8 +77,23 @@ static void RunArmed(void* context) {
   FinishRun(run);
 }
 
+// A copy of text that may end where readable memory ends: what could be read, terminated.
+struct TextCopy {
+  const char* source;
+  char* target;  // zeroed by the caller
+  u32 size;      // of the target
+};
+
+static void CopyReadable(void* context) {
+  const TextCopy& copy = *static_cast<TextCopy*>(context);
+  for (u32 i = 0; i + 1 < copy.size && copy.source[i]; ++i) copy.target[i] = copy.source[i];
+}
+
 static void ReportFault(void* context) {
   const MacroRun& run = *static_cast<MacroRun*>(context);
+  char file[4096] = "";
+  TextCopy name = {run.file, file, sizeof file};
+  RunGuarded(CopyReadable, &name);
   char text[4096];
   snprintf(text, sizeof text, "%s\nScript file Name: %s\n",
            "Tarn has detected an internal scripting exception, most probably caused\n"
@@ -83,22 +101,30 @@ static void ReportFault(void* context) {
            "Please help us by sending a short bug report including the script code\n"
            "that is causing the issue:\n\n"
            "Please send your bug report to this address: " SCRIPTRUBY_SUPPORT_ADDRESS "\nTIA.\n",
-           run.file);
+           file);
   run.host->ReportMessage(text);
 }
 
+// Each failing try leaves one element fewer: it has left its list when its destructor faults. A
+// list that cannot be cleared is only emptied.
+static void ClearAfterFault(void (*clear)(void*), void (*forget)(void*), HostInterface* host) {
+  constexpr int kTries = 100;
+  for (int tries = 0; tries < kTries; ++tries)
+    if (RunGuarded(clear, host)) return;
+  RunGuarded(forget, host);
+}
+
 // After a fault nothing that the engine holds is trusted: it is leaked, on purpose. What the host
-// does on this path may fault again, so each step has its own guard.
+// does on this path may fault again, so each step has its own guard; and it may not stop this run,
+// whose armed frame is gone, nor its caller before that is restored.
 static void AbandonRun(MacroRun& run) {
-  // The armed frame is gone; a stop from here on must not go there.
-  CurrentStopPoint() = run.previousStop;
+  CurrentStopPoint().armed = false;
   run.engine = nullptr;
   run.result = -1;
   RunGuarded(ReportFault, &run);
-  // An element whose destructor faults has left its list by then: the next try goes on behind it.
-  constexpr int kTries = 100;
-  for (int tries = 0; tries < kTries && !RunGuarded(ClearContext, run.host); ++tries) {
-  }
+  RunGuarded(ForgetEngine, run.host);
+  ClearAfterFault(ClearArguments, ForgetArguments, run.host);
+  ClearAfterFault(ClearTexts, ForgetTexts, run.host);
   RestoreCaller(run);
 }
 
@@ -120,8 +146,8 @@ bool __stdcall kill(i32 value) {
   HostInterface* host = CurrentHost();
   HostContext* context = host ? host->Context() : nullptr;
   if (!context) return false;
+  context->stopValue = value;  // first: a host that polls the flag then finds its value
   context->stopRequested = 1;
-  context->stopValue = value;
   return true;
 }
 
@@ -147,27 +173,16 @@ static bool FillRecord(ScriptInfoRecord* record, const char* hostPath) {
   return filled;
 }
 
-struct RecordName {
-  const ScriptInfoRecord* record;
-  char text[sizeof ScriptInfoRecord::description];  // zeroed by the caller
-};
-
-// Copies what the caller left as its name. The record may be shorter than its layout, so this runs
-// guarded, byte by byte.
-static void CopyRecordName(void* context) {
-  RecordName& name = *static_cast<RecordName*>(context);
-  for (u32 i = 0; i + 1 < sizeof name.text && name.record->description[i]; ++i)
-    name.text[i] = name.record->description[i];
-}
-
 static bool FailVersion(const ScriptInfoRecord* record) {
-  RecordName name = {record, "<Unknown>"};
+  char name[sizeof record->description] = "<Unknown>";
   if (record) {
-    memset(name.text, 0, sizeof name.text);
-    RunGuarded(CopyRecordName, &name);
+    // What the caller left as its name; the record may be shorter than its layout.
+    memset(name, 0, sizeof name);
+    TextCopy copy = {record->description, name, sizeof name};
+    RunGuarded(CopyReadable, &copy);
   }
   String text;
-  text.Format("Module: %s\n\nUnexpected internal macro version error!\n", name.text);
+  text.Format("Module: %s\n\nUnexpected internal macro version error!\n", name);
   ShowProblem(__LINE__, text.Text());
   return false;
 }
@@ -176,7 +191,7 @@ bool __stdcall version(ScriptInfoRecord* record, const char* hostPath) {
   if (!record || record->size != sizeof(ScriptInfoRecord)) return FailVersion(record);
   if (record->layoutVersion != 0 && record->layoutVersion != kScriptInfoRecordVersion)
     ShowProblem(__LINE__, "Scripting size problems. This may cause problems!");
-  memset(record, 0, record->size);
+  memset(record, 0, sizeof *record);
   return FillRecord(record, hostPath) || FailVersion(record);
 }
 
@@ -200,9 +215,12 @@ extern "C" BOOL WINAPI DllMain(HINSTANCE module, DWORD reason, LPVOID) {
   }
   SetRunsInApplication(false);
   KeepModuleHandle(module);
-  SetErrorMode(GetErrorMode() | SEM_FAILCRITICALERRORS | SEM_NOOPENFILEERRORBOX);
-  CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED | COINIT_DISABLE_OLE1DDE);
+  constexpr UINT kNoBoxes = SEM_FAILCRITICALERRORS | SEM_NOOPENFILEERRORBOX;
+  SetErrorMode(SetErrorMode(kNoBoxes) | kNoBoxes);
+  const HRESULT initialised =
+      CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED | COINIT_DISABLE_OLE1DDE);
   const BOOL started = StartModule();
-  CoUninitialize();
+  // On a thread of another apartment nothing was initialised; its own count must stay.
+  if (SUCCEEDED(initialised)) CoUninitialize();
   return started;
 }

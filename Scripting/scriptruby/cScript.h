@@ -2,7 +2,8 @@
 // The module's three exports. The host editor loads the module by name and calls them with the
 // standard Windows calling convention; Docs/abi.md is their description for host developers.
 //
-// Errors: plain integers and one-byte booleans; nothing is thrown across an export.
+// Errors: plain integers and one-byte booleans. `execute` catches every fault of a run; the other two
+// rely on their arguments.
 // Threading: `execute` and `version` on the host thread; `kill` from any thread.
 //
 // Next on the reader's path: Core/cLib/cHost.h, the host's contract.

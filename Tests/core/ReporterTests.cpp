@@ -8,7 +8,7 @@
 
 class Reporter : public CoreTest {
  protected:
-  Reporter() { SetLogFile(path.c_str()); }
+  Reporter() { TakeLog(), SetLogFile(path.c_str()); }
   ~Reporter() override { SetLogFile(nullptr), TakeLog(); }
   Text TakeLog() const {
     std::stringstream text;
@@ -16,17 +16,12 @@ class Reporter : public CoreTest {
     std::filesystem::remove(path);
     return text.str();
   }
-  const Text path = testing::TempDir() + "core-report.log";
+  const Text name = testing::UnitTest::GetInstance()->current_test_info()->name();
+  const Text path = testing::TempDir() + "core-" + name + ".log";
 };
 
 TEST_F(Reporter, WritesTheLogLineAndTheHookLine) {
-  const struct {
-    const char* file;
-    int line;
-    const char* text;
-    int level;
-    Text log, hook;
-  } cases[] = {
+  const std::tuple<const char*, int, const char*, int, Text, Text> cases[] = {
       {"x", 7, "boom", 2, "[*] ASSERT    \"x\" (7)       >> boom\n", "\"x\" (7)      boom\n"},
       {"x", 12345, "", 1, "[*] TRACE     \"x\" (12345)   >> \n", "\"x\" (12345)  \n"},
       {"x", 123456, "b", 4, "[*] EXCEPTION \"x\" (123456)  >> b\n", "\"x\" (123456) b\n"},
@@ -34,47 +29,40 @@ TEST_F(Reporter, WritesTheLogLineAndTheHookLine) {
       {"x", 1, "b", 5, "[*] TIMESTAMP \"x\" (1)       >> * - b\n", "\"x\" (1)      * - b\n"},
       {"x", 1, nullptr, 5, "[*] TIMESTAMP \"x\" (1)       >> *\n", "\"x\" (1)      *\n"},
       {"x", 1, "b\n", 6, "[*] RUNTIME   \"x\" (1)       >> b\n", ""},
-      {"x", 1, "b", 9, "[*] UNKNOWN \"x\" (1)       >> b\n", "\"x\" (1)      b\n"},
-      {nullptr, 10, "b", 2, "[*] >> b\n", "\"\" (10)     b\n"},
-      {"x", 1, nullptr, 0, "[*] UNKNOWN \"x\" (1)       >> \n", "\"x\" (1)      \n"},
+      {"x", 1, nullptr, 9, "[*] UNKNOWN \"x\" (1)       >> \n", "\"x\" (1)      \n"},
+      {nullptr, 10, "b", 0, "[*] >> b\n", "\"\" (10)     b\n"},
   };
-  for (const auto& test : cases) {
-    EXPECT_EQ(Report(test.file, test.line, test.text, test.level), 0);
+  for (const auto& [file, line, text, level, logLine, hookLine] : cases) {
+    EXPECT_EQ(Report(file, line, text, level), 0);
     Text log = TakeLog(), hook = reports.empty() ? "" : reports.back();
     const Text now = log.substr(1, 24);
-    for (Text* text : {&log, &hook})
-      for (size_t at; (at = text->find(now)) != Text::npos;) text->replace(at, 24, "*");
-    EXPECT_EQ(log, test.log);
-    EXPECT_EQ(hook, test.hook);
+    for (Text* seen : {&log, &hook})
+      for (size_t at; (at = seen->find(now)) != Text::npos;) seen->replace(at, 24, "*");
+    EXPECT_EQ(log, logLine);
+    EXPECT_EQ(hook, hookLine);
     TakeReports();
   }
   Report("x", 1, Text(10000, 'y').c_str(), kReportTrace);
-  EXPECT_EQ(TakeLog().size(), 8192u);
-  EXPECT_EQ(reports.back().size(), 8191u);
+  EXPECT_TRUE(TakeLog().size() == 8192 && reports.back().size() == 8191);
 }
 
 TEST_F(Reporter, DoesNotCallTheHookFromWithinItself) {
   static int depth;
-  const DebugHook previous =
-      SetDebugHook([](const char*) { depth += Report("x", 2, "inner", kReportAssert); });
+  SetDebugHook([](const char*) { depth += Report("x", 2, "inner", kReportAssert); });
   EXPECT_EQ(Report("x", 1, "outer", kReportAssert), 0);
   EXPECT_EQ(depth, 1);
   EXPECT_NE(TakeLog().find("inner"), Text::npos);
-  SetDebugHook(previous);
-  Report("x", 3, "after", kReportAssert);
-  EXPECT_EQ(TakeReports("after"), 1);
 }
 
 TEST_F(Reporter, WritesLinesWhereItIsTold) {
-  for (const char* line : {"a", "b\n", "", No()}) WriteLogLine(line);
+  for (const char* line : {"a", "b\n", "", static_cast<const char*>(nullptr)}) WriteLogLine(line);
   for (const Text& other : {""s, testing::TempDir() + "no-such-folder/x.log"})
     SetLogFile(other.c_str()), WriteLogLine("c");
   EXPECT_EQ(TakeLog(), "a\nb\n\n\n");
   Text longPath = testing::TempDir();
   while (longPath.size() < 230) longPath += "./";
   longPath.resize(300, 'a');
-  SetLogFile(longPath.c_str());
-  WriteLogLine("x");
+  SetLogFile(longPath.c_str()), WriteLogLine("x");
   EXPECT_TRUE(std::filesystem::remove(longPath.substr(0, 255)));
   testing::internal::CaptureStdout();
   WriteStdout("a\n%s"), WriteStdout(nullptr);

@@ -3,12 +3,18 @@
 
 #include <stdlib.h>
 
+#include <iostream>
+#include <utility>
+
 #include "cLib/cReport.h"
 
 static int allocationsLeft = 0;
+static bool allocationFailed = false;
 
 static void* TestMalloc(size_t bytes) {
-  return allocationsLeft && --allocationsLeft == 0 ? nullptr : malloc(bytes);
+  if (allocationsLeft == 0 || --allocationsLeft > 0) return malloc(bytes);
+  allocationFailed = true;
+  return nullptr;
 }
 
 // The library's own allocation, but for the place where its memory comes from.
@@ -16,8 +22,9 @@ static void* TestMalloc(size_t bytes) {
 #include "cLib/cMemory.cpp"
 #undef malloc
 
-void FailAllocation(int n) {
+bool FailAllocation(int n) {
   allocationsLeft = n;
+  return std::exchange(allocationFailed, false);
 }
 
 int Element::live = 0;
@@ -25,6 +32,10 @@ std::vector<Text> CoreTest::reports;
 
 CoreTest::CoreTest() {
   SetDebugHook([](const char* line) { reports.push_back(line); });
+  const char* given = getenv("CORE_TEST_SEED");
+  const u32 seed = given ? static_cast<u32>(strtoul(given, nullptr, 10)) : std::random_device()();
+  std::cout << "CORE_TEST_SEED=" << seed << '\n';
+  random.seed(seed);
 }
 
 CoreTest::~CoreTest() {
@@ -38,6 +49,17 @@ int CoreTest::TakeReports(const Text& part) {
   int count = 0;
   for (const Text& line : std::exchange(reports, {})) count += line.find(part) != Text::npos;
   return count;
+}
+
+Text CoreTest::Word(u32 longest) {
+  Text word(Below(longest + 1), 0);
+  for (char& ch : word) ch = "aAb,, \t\x01\xE9"[Below(9)];
+  return word;
+}
+
+int CoreTest::Position(size_t size) {
+  static const int extremes[] = {-1, INT_MIN, INT_MAX};
+  return Below(8) ? static_cast<int>(Below(size + 3)) : extremes[Below(3)];
 }
 
 // Sizes that a 32-bit Windows process could not have fail natively, too.

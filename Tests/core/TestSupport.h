@@ -1,11 +1,14 @@
 // SPDX-License-Identifier: MIT
-// What the Core library's tests share: allocations that fail on request, and recorded reports.
+// What the Core library's tests share: allocations that fail on request, recorded reports, and
+// random operations, repeatable by the environment variable CORE_TEST_SEED.
 #pragma once
 
 #include <gtest/gtest.h>
 #include <limits.h>
 #include <string.h>
 
+#include <functional>
+#include <random>
 #include <string>
 #include <vector>
 
@@ -15,17 +18,23 @@
 using namespace std::string_literals;
 using Text = std::string;
 
-// The n-th allocation from now fails (1: the next one; 0: none does).
-void FailAllocation(int n);
+// The n-th allocation from now fails (1: the next one; 0: none does). Returns whether the one of
+// the last call has failed.
+bool FailAllocation(int n);
 
-// Records the debug-output lines of the test; there must be nothing left to fail after it.
 class CoreTest : public testing::Test {
  protected:
   CoreTest();
   ~CoreTest() override;
-  // How many lines since the last call contain `part`. All lines are forgotten.
+
+  // How many debug-output lines since the last call contain `part`. All lines are forgotten.
   static int TakeReports(const Text& part = "");
   static std::vector<Text> reports;
+
+  u32 Below(size_t n) { return static_cast<u32>(random() % n); }
+  Text Word(u32 longest);
+  int Position(size_t size);  // in or near what has `size` places, or an extreme one
+  std::mt19937 random;
 };
 
 // A container element that knows how many of its kind live.
@@ -36,9 +45,4 @@ struct Element {
   virtual ~Element() { --live; }
 };
 
-inline Text Bytes(const String& s) {
-  return {s.Text(), s.Length()};
-}
-inline const char* No() {
-  return nullptr;
-}  // a null text that the compiler does not see through
+inline Text Bytes(const String& s) { return {s.Text(), s.Length()}; }

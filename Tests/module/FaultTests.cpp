@@ -63,6 +63,7 @@ TEST_F(FaultTest, OutsideTheScript) {
   const std::string path = "C:\\" + std::string(5000, 'x');  // cut where the message is full
   Execute(path);
   host.noContext = false;
+  EXPECT_EQ(-1, Module().execute(reinterpret_cast<const char*>(8), host.Interface()));
 
   static void* brokenTable[] = {reinterpret_cast<void*>(&ExecuteData)};
   static void** broken[] = {brokenTable, brokenTable};
@@ -73,6 +74,25 @@ TEST_F(FaultTest, OutsideTheScript) {
     for (int i = 0; i < 2; ++i) host.Field<void**>(31 + 16)[i + 1] = &broken[i];
     RawHost::liveTexts -= 2;
   };
+  Run();
+  void* const items = host.Field<void*>(51 + 16);
+  host.onCall = [&] { host.Field<int>(51 + 16) = 8; };
+  Run();
+  host.Field<void*>(51 + 16) = items;
+}
+
+// A run that is over, or has faulted, cannot be stopped any more.
+TEST_F(FaultTest, StopsThatComeTooLate) {
+  void* engine = nullptr;
+  plan.onConnect = [&](FakeEngine& script) {
+    engine = host.Engine();
+    script.Call(L"f");
+  };
+  host.onText = [&](const std::string& text) {
+    if (text == "Destroying macro interface" || text.starts_with("Tarn has")) Stop(engine);
+  };
+  Run();
+  host.onCall = WriteNothing;
   Run();
 }
 

@@ -32,9 +32,13 @@ void THISCALL Unused(Object*) { Log("an unused slot was called"); }
 void* THISCALL Context(Object* host) {
   return host->self->noContext ? nullptr : host->self->context;
 }
-void THISCALL Report(Object*, const char* text) { Log("report: " + std::string(text)); }
-void Trace(Object*, const char* format, const char* text) {
+void THISCALL Report(Object* host, const char* text) {
+  Log("report: " + std::string(text));
+  if (host->self->onText) host->self->onText(text);
+}
+void Trace(Object* host, const char* format, const char* text) {
   Log("trace: " + std::string(std::strcmp(format, "Debug: %s\n") ? format : text));
+  if (host->self->onText) host->self->onText(text);
 }
 void THISCALL SetFixCRLF(Object*, unsigned char flag) { Log("fix CRLF " + std::to_string(flag)); }
 void THISCALL SetFixDelimiter(Object*, unsigned char flag) {

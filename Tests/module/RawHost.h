@@ -36,6 +36,7 @@ class RawHost {
 
   std::map<std::string, unsigned> functions = {{"f", 7}, {"g", 0}};  // others are unknown: 2000
   std::function<void()> onCall;
+  std::function<void(const std::string& text)> onText;  // reports and traces
   bool noContext = false;
   unsigned char context[128];
   static int liveTexts;

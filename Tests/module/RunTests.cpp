@@ -59,6 +59,18 @@ TEST_F(RunTest, StopsUnwindToTheInnermostRun) {
   }
 }
 
+// A stop ends the innermost run, whichever engine it names; the outer run then ends as usual.
+TEST_F(RunTest, TheOuterEngineStoppedInANestedRun) {
+  void* outer = nullptr;
+  plan.onConnect = [&](FakeEngine& engine) { engine.Call(L"f"); };
+  host.onCall = [&] {
+    if (outer) Stop(outer);
+    outer = host.Engine();
+    Execute(MacroPath());
+  };
+  Run();
+}
+
 TEST_F(RunTest, AThousandStops) {
   muted = true;
   plan.onConnect = [&](FakeEngine& engine) { engine.Call(L"f"); };
