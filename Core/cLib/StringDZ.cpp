@@ -7,6 +7,14 @@
 
 StringDZ::~StringDZ() { Clear(); }
 
+// Appended, not formatted: a text of any length keeps its characters. False: no memory.
+bool StringDZ::Fill(String& entry, const char* s, bool numbered) const {
+  if (numbered) entry.Format("%d=", entries.Count());
+  const u32 start = entry.Length();
+  entry.Append(s);
+  return entry.Length() - start == strlen(s) && (start != 0) == numbered;
+}
+
 void StringDZ::Add(const char* s, bool numbered) {
   if (!s) {
     REPORT_ASSERT("cString", "Null entry");
@@ -14,13 +22,10 @@ void StringDZ::Add(const char* s, bool numbered) {
   }
   if (!*s) return;
   String* entry = new String();
-  if (!entry) return;
-  // Appended, not formatted: a text of any length keeps its characters.
-  if (numbered) entry->Format("%d=", entries.Count());
-  const u32 start = entry->Length();
-  entry->Append(s);
-  const bool complete = entry->Length() - start == strlen(s) && (start != 0) == numbered;
-  if (!complete || entries.SetAt(entry, entries.Count()) < 0) delete entry;
+  if (!entry || !Fill(*entry, s, numbered) || entries.SetAt(entry, entries.Count()) < 0) {
+    REPORT_ASSERT("cString", "No memory for the entry");
+    delete entry;
+  }
 }
 
 void StringDZ::AddList(const char* dz) {

@@ -37,6 +37,7 @@ class StringDZ {
 
  private:
   static void CheckLayout();
+  bool Fill(String& entry, const char* s, bool numbered) const;
 
   [[maybe_unused]] u32 mark = 170;  // constant; tells a live list in a memory dump
   Array<String> entries;

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 // FIFO: a history of fixed size, newest element first. Stack: an Array used last in, first out.
 //
-// Both hold pointers to heap objects of one class, null allowed, and own them unless told
-// otherwise. Broken preconditions are reported (source "cFilo"). Threading: none; one thread at a
-// time.
+// Both hold pointers to heap objects of one class and own them unless told otherwise.
+// Broken preconditions are reported (source "cFilo"; a Stack without memory by its Array).
+// Threading: none; one thread at a time.
 #pragma once
 
 #include <stddef.h>

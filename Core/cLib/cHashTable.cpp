@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "cLib/cHashTable.h"
 
+#include <ctype.h>
 #include <string.h>
 
 #include "cLib/cCompat.h"
@@ -17,7 +18,7 @@ static cHashTableBase* clearingTable = nullptr;
 
 static u32 Rotate(u32 x, u32 bits) { return x << bits | x >> (32 - bits); }
 
-// Stirs three words reversibly. Each step takes the last word, rotated, out of the first one.
+// Stirs three words reversibly, each step a pair of them.
 static void Mix(u32& a, u32& b, u32& c) {
   static const u8 rotations[] = {4, 6, 8, 16, 19, 4};
   for (const u8 bits : rotations) {
@@ -30,7 +31,7 @@ static void Mix(u32& a, u32& b, u32& c) {
   }
 }
 
-// Lets every bit of three words reach the third one.
+// Lets every bit of three words reach the second one, which is the hash.
 static void Finish(u32& a, u32& b, u32& c) {
   static const u8 rotations[] = {14, 11, 25, 16, 4, 14, 24};
   for (const u8 bits : rotations) {
@@ -47,7 +48,7 @@ static u32 Word(const char* bytes, u32 size, bool fold) {
   u32 word = 0;
   for (u32 i = 0; i < 4 && i < size; ++i) {
     u32 byte = static_cast<u8>(bytes[i]);
-    if (fold && byte >= 'A' && byte <= 'Z') byte += 'a' - 'A';
+    if (fold) byte = static_cast<u32>(tolower(static_cast<int>(byte)));
     word |= byte << (8 * i);
   }
   return word;
@@ -114,7 +115,7 @@ u32 cHashTableBase::Insert(const char* key, u32 value) {
     return 0;
   }
   memcpy(copy, key, size);
-  Entry** head = Bucket(key);
+  Entry** const head = Bucket(key);
   *entry = {copy, value, *head};
   *head = entry;
   ++table.entryCount;

@@ -15,12 +15,13 @@
 #include "cLib/cSlots.h"
 #include "cLib/cTypes.h"
 
-// lookup3's byte-wise little-endian hash of `size` bytes; `fold` reads ASCII capitals as small.
+// lookup3's byte-wise little-endian hash of `size` bytes; `fold` reads capitals
+// as small letters, by the C runtime's current locale as the comparison of keys does.
 u32 HashBytes(const char* bytes, u32 size, u32 initial, bool fold);
 
 class cHashTableBase {
  public:
-  // Must not outlive the call; the entry it is called for may be removed by it.
+  // May remove the entry it is called for; `key` is then gone.
   using WalkCallback = void (*)(const char* key, u32 value);
 
   SLOTS_FROM(0);

@@ -18,7 +18,7 @@ static const char* LevelName(int level) {
   return level >= kReportTrace && level <= kReportRuntime ? names[level - 1] : "UNKNOWN";
 }
 
-// The local time without its line break, cut to `size` characters; empty when there is none.
+// The local time without its line break, cut to the `size` bytes; empty when there is none.
 static void LocalTime(char* text, u32 size) {
   const time_t now = time(nullptr);
   const char* local = ctime(&now);

@@ -18,6 +18,7 @@ enum ReportLevel {
   kReportRuntime = 6,    // log file only, never the hook
 };
 
+// Must return: a hook that leaves by a jump or a fault is not called again.
 using DebugHook = void (*)(const char* line);
 
 // Logs `text` (null counts as empty) and passes it to the hook. `file` is the unit's source name,

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The process-wide active code page, in which all 8-bit text of the module is written, and the
-// conversions between it and UTF-16.
+// The process-wide active code page, to which String converts wide text, and the conversions
+// between it and UTF-16.
 //
 // Threading: the active code page is set once at start-up and only read afterwards.
 #pragma once

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The handle of the loaded module, whose string resources the Core library reads. Kept once, when
-// the module is attached to its process; null until then.
+// The handle of the loaded module, whose string resources the Core library reads. Kept on
+// every load notification; null until the first.
 #pragma once
 
 void KeepModuleHandle(void* handle);  // an HMODULE

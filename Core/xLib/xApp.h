@@ -3,6 +3,8 @@
 // into the debugger.
 //
 // Threading: none; the state is plain and process-wide, one thread at a time.
+//
+// Only an application calls the dialog and the check; the module is a library and does not.
 #pragma once
 
 // Whether the Core library runs inside an application of its own. The module clears it on loading:

@@ -68,7 +68,7 @@ TEST_F(FaultTest, OutsideTheScript) {
   static void* brokenTable[] = {reinterpret_cast<void*>(&ExecuteData)};
   static void** broken[] = {brokenTable, brokenTable};
   plan.onParse = nullptr;
-  plan.onConnect = [&](FakeEngine& engine) { engine.Call(L"f"); };
+  plan.onConnect = [&](FakeEngine& engine) { engine.Call(L"f", {Value(VT_I4, 1)}); };
   host.onCall = [&] {
     host.AnswerTexts({"a", "b", "c"});
     for (int i = 0; i < 2; ++i) host.Field<void**>(31 + 16)[i + 1] = &broken[i];
