@@ -18,5 +18,6 @@ set_up
 build_release macrorun scriptruby
 exec 9>&-
 
+start_wine
 cd "$started_in"
 exec wine "$BUILD/release/bin/macrorun.exe" "$@"

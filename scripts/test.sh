@@ -10,6 +10,7 @@ set_up
 build_release
 exec 9>&-
 
+start_wine
 cd "$ROOT"
 say "-- testing"
 exec ctest --preset release "$@"
