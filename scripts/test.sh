@@ -13,4 +13,4 @@ exec 9>&-
 start_wine
 cd "$ROOT"
 say "-- testing"
-exec ctest --preset release "$@"
+exec ctest --preset release -j "$(nproc)" "$@"

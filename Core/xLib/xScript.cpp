@@ -119,13 +119,26 @@ static bool Convert(const DISPPARAMS& params, Array<xArgument>& arguments) {
   return true;
 }
 
-// Hands the arguments over to the host's list.
+// Hands the arguments over to the host's list. False: no memory.
 static bool Move(Array<xArgument>& from, Array<xArgument>& to) {
   for (i32 i = 0; i < from.Count(); ++i) {
     if (to.SetAt(from.At(i), i) < 0) return false;
     from.Detach(i);
   }
   return true;
+}
+
+// Empties the record and fills its argument list. Null: no memory. What it needs is freed before
+// the host is called, which may never return.
+static HostContext* PrepareCall(HostInterface& host, const DISPPARAMS* params) {
+  // Converted before the record is touched: the value of an object may be the script's own code,
+  // whose calls pass through the same record.
+  Array<xArgument> arguments;
+  if (params && !Convert(*params, arguments)) return nullptr;
+  HostContext& context = *host.Context();
+  context.ArgumentList().Clear();
+  context.ResultTexts().Clear();
+  return Move(arguments, context.ArgumentList()) ? &context : nullptr;
 }
 
 // The host's result. A text result of another kind leaves `result` as the caller gave it.
@@ -146,18 +159,12 @@ HRESULT xScript::Invoke(DISPID id, REFIID riid, LCID, WORD, DISPPARAMS* params, 
   HostInterface* current = CurrentHost();
   if (riid != IID_NULL || id < 0 || !current) return DISP_E_UNKNOWNINTERFACE;
   SetErrorInfo(0, nullptr);
-  // Converted before the record is touched: the value of an object may be the script's own code,
-  // whose calls pass through the same record.
-  Array<xArgument> arguments;
-  if (params && !Convert(*params, arguments)) return E_OUTOFMEMORY;
-  HostContext& context = *current->Context();
-  context.ArgumentList().Clear();
-  context.ResultTexts().Clear();
-  if (!Move(arguments, context.ArgumentList())) return E_OUTOFMEMORY;
+  HostContext* const context = PrepareCall(*current, params);
+  if (!context) return E_OUTOFMEMORY;
   current->SetFixCRLF(fixCRLF);
   current->SetFixDelimiter(fixDelimiter);
   current->CallFunction(static_cast<u32>(id));
-  if (result) GetResult(context, *result);
+  if (result) GetResult(*context, *result);
   return S_OK;
 }
 
