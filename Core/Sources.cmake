@@ -30,7 +30,7 @@ set(ILIB_MICROSOFT_ABI_SOURCES
     ${CORE}/iLib/iGuard.cpp
     ${CORE}/iLib/iRuntime.cpp)
 
-# The macro engine and the application object.
+# The macro engine, and what the library knows of the application around it.
 set(XLIB_SOURCES
     ${CORE}/xLib/xApp.cpp
     ${CORE}/xLib/xArgument.cpp

@@ -4,7 +4,9 @@
 
 # Warnings are errors in every target.
 if(MSVC)
-  set(STRICT_WARNINGS /W4 /WX)
+  # C4611: setjmp beside C++ objects, which the stop mechanism is about. C4458: a constructor's
+  # parameter named as its member.
+  set(STRICT_WARNINGS /W4 /WX /wd4611 /wd4458 /D_CRT_SECURE_NO_WARNINGS)
 else()
   set(STRICT_WARNINGS -Wall -Wextra -Werror -Wshadow -Wconversion -Wno-sign-conversion
       -Woverloaded-virtual -Wsuggest-override -Wno-invalid-offsetof)
@@ -27,5 +29,6 @@ endif()
 function(add_microsoft_abi_library name)
   add_library(${name} OBJECT ${ARGN})
   target_compile_options(${name} PRIVATE ${STRICT_WARNINGS} ${MICROSOFT_ABI_OPTIONS})
+  target_compile_definitions(${name} PRIVATE WIN32_LEAN_AND_MEAN NOMINMAX)
   target_include_directories(${name} PUBLIC ${PROJECT_SOURCE_DIR}/Core)
 endfunction()

@@ -1,4 +1,5 @@
 # SPDX-License-Identifier: MIT
+# shellcheck shell=bash
 # What the commands share: set-up of a Debian machine, the Wine prefix and the build. Progress goes to
 # standard error; the output of a step goes to a log that is shown when the step fails.
 
@@ -18,6 +19,8 @@ PACKAGES=(
 export WINEARCH=win32
 export WINEPREFIX=$BUILD/wineprefix
 export WINEDEBUG=-all
+# Wine names files by it.
+export LC_ALL=C.UTF-8
 
 say() { printf '%s\n' "$*" >&2; }
 
@@ -26,7 +29,8 @@ die() {
   exit 1
 }
 
-# step NAME COMMAND...: runs the command with its output in a log, and shows the log's end when it fails.
+# step NAME COMMAND...: runs the command with its output in a log, and shows the log's end when it
+# fails. The command is a condition here, so `set -e` is off inside: functions chain with &&.
 step() {
   local name=$1 log
   shift
@@ -63,7 +67,7 @@ as_root() {
 install_packages() {
   local codename
   codename=$(. /etc/os-release && printf %s "${VERSION_CODENAME:-}")
-  as_root dpkg --add-architecture i386
+  as_root dpkg --add-architecture i386 || return
   as_root apt-get update || say "some package indexes could not be fetched; going on"
   as_root env DEBIAN_FRONTEND=noninteractive apt-get install -y --no-install-recommends \
     ${codename:+-t "$codename"} "$@"
@@ -71,10 +75,10 @@ install_packages() {
 
 # A prefix without a display: windows and message boxes work, nothing is drawn.
 make_wine_prefix() {
-  wineboot -i
-  wine reg add 'HKCU\Software\Wine\Drivers' /v Graphics /d null /f
-  wineserver -w
-  touch "$WINEPREFIX/.complete"
+  wineboot -i &&
+    wine reg add 'HKCU\Software\Wine\Drivers' /v Graphics /d null /f &&
+    wineserver -w &&
+    touch "$WINEPREFIX/.complete"
 }
 
 # set_up: everything a fresh machine needs before a build, each part only when it is missing.
@@ -95,12 +99,26 @@ set_up() {
 
 # Keeps Wine's server for a minute after its last program: starting it takes longer than a macro does.
 start_wine() {
-  wineserver -p60 >/dev/null 2>&1 </dev/null 9>&- || true # it is running already
+  wineserver -p60 >/dev/null 2>&1 </dev/null || true # it is running already
 }
 
-# build_release [TARGET...]: configures once and builds.
+# build_release [TARGET...]: configures when that is due, and builds.
 build_release() {
-  cd "$ROOT"
-  [ -e "$BUILD/release/build.ninja" ] || step "configuring" cmake --preset release
-  step "building" cmake --build --preset release ${1:+--target "$@"}
+  local made=$BUILD/release/build.ninja
+  if ! [ "$made" -nt "$ROOT/CMakePresets.json" ] ||
+    ! [ "$made" -nt "$ROOT/cmake/i686-w64-mingw32-clang.cmake" ]; then
+    step "configuring" cmake -S "$ROOT" --preset release --fresh
+  fi
+  step "building" cmake --build "$BUILD/release" ${1:+--target "$@"}
+}
+
+# prepare [TARGET...]: set-up, build and Wine's server; one process at a time.
+prepare() {
+  mkdir -p "$BUILD"
+  exec 9>"$BUILD/.lock"
+  flock 9
+  set_up
+  build_release "$@"
+  exec 9>&-
+  start_wine
 }

@@ -9,15 +9,5 @@ source "$(dirname "${BASH_SOURCE[0]}")/lib.sh"
 
 [ $# -gt 0 ] || die "usage: scripts/run.sh [OPTION...] MACRO [FILE]"
 
-started_in=$PWD
-# One set-up and build at a time.
-mkdir -p "$BUILD"
-exec 9>"$BUILD/.lock"
-flock 9
-set_up
-build_release macrorun scriptruby
-exec 9>&-
-
-start_wine
-cd "$started_in"
+prepare macrorun scriptruby
 exec wine "$BUILD/release/bin/macrorun.exe" "$@"

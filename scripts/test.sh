@@ -3,14 +3,7 @@
 # Runs all tests: sets the machine up and builds first when needed. Arguments go to ctest.
 source "$(dirname "${BASH_SOURCE[0]}")/lib.sh"
 
-mkdir -p "$BUILD"
-exec 9>"$BUILD/.lock"
-flock 9
-set_up
-build_release
-exec 9>&-
-
-start_wine
-cd "$ROOT"
+prepare
 say "-- testing"
+cd "$ROOT"
 exec ctest --preset release -j "$(nproc)" "$@"

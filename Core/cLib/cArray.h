@@ -113,6 +113,7 @@ i32 Array<T>::SetAt(T* item, i32 index) {
   T* const old = index < count ? items[index] : nullptr;
   items[index] = item;
   if (index >= count) count = index + 1;
+  // The spelling is fixed: readers of logs search for it.
   if (old && !ownsElements) REPORT_ASSERT("cArray", "Memory leak deteched");
   if (old && old != item && ownsElements) delete old;
   return index;

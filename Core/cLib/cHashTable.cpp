@@ -10,7 +10,8 @@
 static constexpr u32 kBucketCount = 211;
 static constexpr u32 kInitialHash = 42;
 
-// What RemoveWhileClearing works on: a walk's callback has no argument of its own.
+// What RemoveWhileClearing works on: a walk's callback has no argument of its own. Deliberately one
+// pair for the process: one table is cleared at a time.
 static void (*clearingDeleter)(u32 value) = nullptr;
 static cHashTableBase* clearingTable = nullptr;
 

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "iLib/iClipboard.h"
 
-#define WIN32_LEAN_AND_MEAN
 #include <string.h>
 #include <windows.h>
 

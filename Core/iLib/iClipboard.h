@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Reading text from the clipboard.
+// Reading text from the clipboard, in the system's ANSI code page. Threading: any one thread.
 #pragma once
 
 #include "cLib/cString.h"

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "iLib/iCodePage.h"
 
-#define WIN32_LEAN_AND_MEAN
 #include <stdlib.h>
 #include <windows.h>
 

@@ -104,8 +104,7 @@ const String& ProductFolder() {
   if (productFolder.IsEmpty()) {
     String folder = ProgramsFolder();
     if (folder.IsEmpty()) return productFolder;
-    folder.Append("Tarn");
-    EndWithBackslash(folder);
+    folder.Append("Tarn\\");
     EnsureFolder(folder.Text());
     productFolder.Assign(folder.Text());
   }

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The handle of the loaded module, whose string resources the Core library reads. Kept on
+// The handle of the loaded module, whose file name and string resources the Core library
+// reads. Kept on
 // every load notification; null until the first.
 #pragma once
 

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // A private-profile (.ini) file: its name and typed operations over the system's profile functions,
-// which decide about quotes, blanks, encodings and duplicate keys.
+// which decide about quotes, blanks, encodings and duplicate keys. Threading: any thread.
 #pragma once
 
 #include "cLib/cString.h"

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // What the cross compiler expects of the Microsoft C runtime and mingw's does not have, or has
 // under another name. With the Microsoft C runtime itself this file is empty.
-#include <stddef.h>
+#include <stddef.h>  // for __MINGW64_VERSION_MAJOR
 
 #ifdef __MINGW64_VERSION_MAJOR
 // Marks objects that use floating point; only its presence counts.

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
 // The operations of String that ask the system: resources, error messages, case and code pages.
-#define WIN32_LEAN_AND_MEAN
 #include <string.h>
 #include <wchar.h>
 #include <windows.h>

@@ -2,7 +2,8 @@
 // One macro-function argument as the host receives it: its kind, and the value in all three forms
 // where the kind has them (a text argument carries only its text).
 //
-// The host reads these records by byte offset through the context record's argument list.
+// The host reads these records by byte offset through the context record's argument list, which
+// owns them for one call. Threading: the macro run's thread.
 #pragma once
 
 #include <stddef.h>

@@ -5,6 +5,7 @@
 #include "iLib/iGeneral.h"
 #include "xLib/xScriptExecutor.h"
 #include "xLib/xScriptInfo.h"
+#include "xLib/xTexts.h"
 
 static constexpr u8 kSiteFlag = 0;  // handed to the host with every script site
 
@@ -18,7 +19,7 @@ static String DescriptionPath() {
     if (!MayReadAndWrite(folder.Text())) folder = ProductFolder();
     if (folder.IsEmpty()) return folder;
     EnsureFolder(folder.Text());
-    descriptionPath = folder + "xMacroWSH.qwsh";
+    descriptionPath = folder + kDescriptionFileName;
   }
   return descriptionPath;
 }

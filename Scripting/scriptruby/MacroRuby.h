@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
 // The Ruby flavour of the macro engine, its factory, and the Ruby language description.
+// Threading: the host thread only.
 #pragma once
 
 #include "xLib/xMacroWSH.h"

@@ -16,11 +16,12 @@
 #include "xLib/xApp.h"
 #include "xLib/xArgument.h"
 #include "xLib/xProduct.h"
+#include "xLib/xTexts.h"
 
 // --- execute -------------------------------------------------------------------------------------
 
 // One call of `execute`. It lives in that call's frame, so it survives the jump of a stop.
-struct MacroRun {
+struct ExecuteCall {
   const char* file;
   HostInterface* host;
   HostInterface* previousHost;
@@ -29,7 +30,7 @@ struct MacroRun {
   i32 result;
 };
 
-static void RunEngine(MacroRun& run) {
+static void RunEngine(ExecuteCall& run) {
   run.engine = CreateMacroEngine();
   if (!run.engine) {
     REPORT_ASSERT("cScript", "No memory for the macro engine");
@@ -48,13 +49,12 @@ static void ClearTexts(void* host) { ContextOf(host).ResultTexts().Clear(); }
 static void ForgetArguments(void* host) { ContextOf(host).ArgumentList().Forget(); }
 static void ForgetTexts(void* host) { ContextOf(host).ResultTexts().Forget(); }
 
-static void RestoreCaller(const MacroRun& run) {
+static void RestoreCaller(const ExecuteCall& run) {
   CurrentStopPoint() = run.previousStop;
-  SetCurrentHost(nullptr);
   SetCurrentHost(run.previousHost);
 }
 
-static void FinishRun(MacroRun& run) {
+static void FinishRun(ExecuteCall& run) {
   // From here on the run cannot be stopped: it is over.
   CurrentStopPoint().armed = false;
   ClearArguments(run.host);
@@ -66,7 +66,7 @@ static void FinishRun(MacroRun& run) {
 
 // The guarded part of a run. A stop comes back to the setjmp with everything between skipped.
 static void RunArmed(void* context) {
-  MacroRun& run = *static_cast<MacroRun*>(context);
+  ExecuteCall& run = *static_cast<ExecuteCall*>(context);
   StopPoint& stop = CurrentStopPoint();
   if (setjmp(stop.buffer) == 0) {
     stop.armed = true;
@@ -90,13 +90,13 @@ static void CopyReadable(void* context) {
 }
 
 static void ReportFault(void* context) {
-  const MacroRun& run = *static_cast<MacroRun*>(context);
+  const ExecuteCall& run = *static_cast<ExecuteCall*>(context);
   char file[4096] = "";
   TextCopy name = {run.file, file, sizeof file};
   RunGuarded(CopyReadable, &name);
   char text[4096];
-  snprintf(text, sizeof text, "%s\nScript file Name: %s\n",
-           "Tarn has detected an internal scripting exception, most probably caused\n"
+  snprintf(text, sizeof text, "%s%s\nScript file Name: %s\n", kFaultReport,
+           ", most probably caused\n"
            "by something in the syntax of the scripting macro code.\n\n"
            "Please help us by sending a short bug report including the script code\n"
            "that is causing the issue:\n\n"
@@ -117,7 +117,7 @@ static void ClearAfterFault(void (*clear)(void*), void (*forget)(void*), HostInt
 // After a fault nothing that the engine holds is trusted: it is leaked, on purpose. What the host
 // does on this path may fault again, so each step has its own guard; and it may not stop this run,
 // whose armed frame is gone, nor its caller before that is restored.
-static void AbandonRun(MacroRun& run) {
+static void AbandonRun(ExecuteCall& run) {
   CurrentStopPoint().armed = false;
   run.engine = nullptr;
   run.result = -1;
@@ -134,7 +134,7 @@ i32 __stdcall execute(const char* file, HostInterface* host) {
     host->ReportMessage("Unexpected internal macro execute error!");
     return -1;
   }
-  MacroRun run = {file, host, CurrentHost(), CurrentStopPoint(), nullptr, -1};
+  ExecuteCall run = {file, host, CurrentHost(), CurrentStopPoint(), nullptr, -1};
   SetCurrentHost(host);
   if (!RunGuarded(RunArmed, &run)) AbandonRun(run);
   return run.result;

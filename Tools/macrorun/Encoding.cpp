@@ -3,10 +3,9 @@
 
 #include <windows.h>
 
-namespace {
+#include "iLib/iComText.h"
 
-// What the module returns to a script at most, in UTF-16 units.
-constexpr std::size_t kResultLimit = 1023;
+namespace {
 
 std::wstring Widen(std::string_view text, UINT codePage) {
   const int length = static_cast<int>(text.size());
@@ -30,17 +29,11 @@ std::string Narrow(std::wstring_view text, UINT codePage) {
 
 }  // namespace
 
-std::filesystem::path PathFromUtf8(std::string_view text) {
-  return Widen(text, CP_UTF8);
-}
+std::filesystem::path PathFromUtf8(std::string_view text) { return Widen(text, CP_UTF8); }
 
-std::string ToUtf8(const std::filesystem::path& path) {
-  return WideToUtf8(path.wstring());
-}
+std::string ToUtf8(const std::filesystem::path& path) { return WideToUtf8(path.wstring()); }
 
-std::string WideToUtf8(std::wstring_view text) {
-  return Narrow(text, CP_UTF8);
-}
+std::string WideToUtf8(std::wstring_view text) { return Narrow(text, CP_UTF8); }
 
 std::optional<std::filesystem::path> AnsiNamed(const std::filesystem::path& path) {
   if (Widen(ToAnsi(path), CP_ACP) == path.wstring()) return path;
@@ -51,13 +44,11 @@ std::optional<std::filesystem::path> AnsiNamed(const std::filesystem::path& path
   return shortName;
 }
 
-std::string ToAnsi(const std::filesystem::path& path) {
-  return Narrow(path.wstring(), GetACP());
-}
+std::string ToAnsi(const std::filesystem::path& path) { return Narrow(path.wstring(), GetACP()); }
 
 bool PassesUnchanged(const std::string& text) {
   const std::wstring wide = Widen(text, CP_ACP);
-  if (wide.size() > kResultLimit || wide.size() != text.size()) return false;
+  if (wide.size() > kWideLimit - 1 || wide.size() != text.size()) return false;
   for (std::size_t i = 0; i < wide.size(); ++i)
     if (text[i] == '\0' || static_cast<char>(wide[i]) != text[i]) return false;
   return true;

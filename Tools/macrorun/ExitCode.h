@@ -9,7 +9,7 @@ enum ExitCode {
   kMacroFailed = 1,  // it did not parse, ended with an error, or called a macro function wrongly
   kWrongUsage = 2,   // UsageError
   kStopped = 3,      // by Ctrl+C
-  kFault = 4,        // in the module or in the script engine
+  kFault = 4,        // in this program, the module or the script engine
 };
 
 // Something the user must put right before a macro can run; the text names the file or option.

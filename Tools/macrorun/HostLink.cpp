@@ -15,9 +15,7 @@ static_assert(kTextArgument == static_cast<u32>(xArgument::kText) &&
               "the kind passes unchanged");
 
 // Constructs in place: the record's lists stand at offsets that no compiler would choose.
-inline void* operator new(size_t, void* place) noexcept {
-  return place;
-}
+inline void* operator new(size_t, void* place) noexcept { return place; }
 
 struct HostLink final : HostInterface {
   explicit HostLink(const HostCallbacks& functions);
@@ -77,17 +75,11 @@ void HostLink::CallFunction(u32 id) {
   if (record.engine) record.engine->Stop();
 }
 
-HostLink* CreateHostLink(const HostCallbacks* callbacks) {
-  return new HostLink(*callbacks);
-}
+HostLink* CreateHostLink(const HostCallbacks* callbacks) { return new HostLink(*callbacks); }
 
-void DestroyHostLink(HostLink* link) {
-  delete link;
-}
+void DestroyHostLink(HostLink* link) { delete link; }
 
-void* HostLinkInterface(HostLink* link) {
-  return static_cast<HostInterface*>(link);
-}
+void* HostLinkInterface(HostLink* link) { return static_cast<HostInterface*>(link); }
 
 uint32_t HostLinkArgumentCount(HostLink* link) {
   const i32 count = link->record.ArgumentList().Count();
@@ -119,6 +111,4 @@ bool HostLinkSetText(HostLink* link, const char* text) {
   return true;
 }
 
-HostStopCause HostLinkStopCause(HostLink* link) {
-  return link->stopCause;
-}
+HostStopCause HostLinkStopCause(HostLink* link) { return link->stopCause; }

@@ -23,7 +23,7 @@ struct HostCallbacks {
 };
 
 // What `functionId` answers for an unknown name.
-enum : uint32_t { kUnknownId = 2000 };
+constexpr uint32_t kUnknownId = 2000;
 
 enum HostArgumentKind : uint32_t { kTextArgument = 1, kIntegerArgument = 2, kRealArgument = 3 };
 

@@ -9,11 +9,9 @@
 #include <vector>
 
 #include "Encoding.h"
+#include "iLib/iComText.h"
 
 namespace {
-
-// What the module passes at most; a longer argument arrives cut, so one of this length is suspect.
-constexpr std::size_t kArgumentLimit = 512;
 
 enum class Kind {
   kLine,       // an existing line
@@ -142,7 +140,7 @@ std::size_t LineNumber(const MacroFunction& function, std::size_t index, std::si
 std::string Text(const MacroFunction& function, std::size_t index, Kind kind,
                  const HostArgument& argument) {
   std::string text(argument.text);
-  if (text.size() >= kArgumentLimit)
+  if (text.size() >= kNarrowLimit)
     FailArgument(function, index, "at most 511 characters (the text may have been cut at 512)",
                  argument);
   if (kind == Kind::kLineText && text.find('\n') != text.npos)

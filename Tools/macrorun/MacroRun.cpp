@@ -9,12 +9,9 @@
 
 #include "HostLink.h"
 #include "MacroFunctions.h"
+#include "xLib/xTexts.h"
 
 namespace {
-
-// How the module's reports begin that tell more than the result of `execute` does.
-constexpr std::string_view kScriptErrorReport = "Scripting Error :> ";
-constexpr std::string_view kFaultReport = "Tarn has detected an internal scripting exception";
 
 class MacroRun {
  public:
@@ -57,6 +54,7 @@ class MacroRun {
   std::unique_ptr<HostLink, DestroyLink> link;
 };
 
+// The beginnings of some reports tell more than the result of `execute` does.
 void MacroRun::Report(std::string_view text) noexcept {
   if (text.starts_with(kScriptErrorReport)) scriptError = true;
   if (text.starts_with(kFaultReport)) faulted = true;

@@ -24,7 +24,8 @@ std::string Footer() {
          "A macro's source is read byte by byte, so UTF-8 in its texts is written as it\n"
          "stands.\n"
          "\n"
-         "Exit codes: 0 success, 1 the macro failed, 2 wrong usage, 3 stopped by Ctrl+C, 4 fault.\n"
+         "Exit codes: 0 success, 1 the macro failed, 2 wrong usage or\n"
+         "a file that cannot be read or written, 3 stopped by Ctrl+C, 4 fault.\n"
          "Standard output is the document, and only after success.";
 }
 

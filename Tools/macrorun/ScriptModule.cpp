@@ -1,25 +1,24 @@
 // SPDX-License-Identifier: MIT
 #include "ScriptModule.h"
 
-#include <atomic>
 #include <cstdio>
 #include <cwchar>
-#include <string_view>
+#include <mutex>
+#include <utility>
 
 #include "Encoding.h"
 #include "ExitCode.h"
 #include "xLib/ScriptInfoRecord.h"
+#include "xLib/xTexts.h"
 
 namespace fs = std::filesystem;
 
 namespace {
 
 constexpr wchar_t kModuleName[] = L"scriptruby.dll";
-// The name under which the module looks for its language description.
-constexpr wchar_t kDescriptionName[] = L"xMacroWSH.qwsh";
 
-// Private folders are named by this, the process's id and a number.
-constexpr std::wstring_view kFolderPrefix = L"macrorun-";
+// Private folders are named by the process's id and a number.
+constexpr wchar_t kFolderName[] = L"macrorun-%lu-%lu";
 
 using ExecuteFunction = i32(__stdcall*)(const char* file, void* host);
 using KillFunction = bool(__stdcall*)(i32 value);
@@ -30,12 +29,20 @@ Function As(FARPROC address) {
   return reinterpret_cast<Function>(reinterpret_cast<void*>(address));
 }
 
-// For the console's own thread, on which Ctrl+C arrives; null outside a run.
-std::atomic<KillFunction> killRun = nullptr;
+// For the console's own thread, on which Ctrl+C arrives; null outside a run. The lock is held while
+// it is called, so that the host and the module outlive the call.
+std::mutex killLock;
+KillFunction killRun = nullptr;
+
+void SetKill(KillFunction kill) {
+  const std::lock_guard lock(killLock);
+  killRun = kill;
+}
 
 BOOL WINAPI OnConsoleEvent(DWORD event) {
   if (event != CTRL_C_EVENT && event != CTRL_BREAK_EVENT) return FALSE;
-  const KillFunction kill = killRun.exchange(nullptr);
+  const std::lock_guard lock(killLock);
+  const KillFunction kill = std::exchange(killRun, nullptr);
   if (!kill || !kill(1)) TerminateProcess(GetCurrentProcess(), kStopped);
   return TRUE;
 }
@@ -56,16 +63,28 @@ bool ProcessExists(DWORD id) {
   return running;
 }
 
+// Removes a private folder by the names of what it holds and never recursively: what else stands in
+// a folder of such a name, or behind a link, is not this program's.
+void RemoveFolder(const fs::path& folder, std::error_code& error) {
+  for (const fs::path& name : {fs::path(kModuleName), fs::path(kDescriptionFileName)})
+    if (fs::remove(folder / name, error); error) return;
+  fs::remove(folder, error);
+}
+
 // Removes the folders of processes that were killed.
 void RemoveAbandoned(const fs::path& parent) {
   std::error_code error;
   for (fs::directory_iterator entry(parent, error), end; !error && entry != end;
        entry.increment(error)) {
     const std::wstring name = entry->path().filename().wstring();
-    if (!name.starts_with(kFolderPrefix)) continue;
-    const DWORD owner = wcstoul(name.c_str() + kFolderPrefix.size(), nullptr, 10);
+    DWORD owner = 0, number = 0;
+    wchar_t rest = 0;
+    if (swscanf(name.c_str(), L"macrorun-%lu-%lu%lc", &owner, &number, &rest) != 2) continue;
+    const DWORD attributes = GetFileAttributesW(entry->path().c_str());
+    if (attributes == INVALID_FILE_ATTRIBUTES || attributes & FILE_ATTRIBUTE_REPARSE_POINT)
+      continue;
     std::error_code ignored;
-    if (owner != 0 && !ProcessExists(owner)) fs::remove_all(entry->path(), ignored);
+    if (!ProcessExists(owner)) RemoveFolder(entry->path(), ignored);
   }
 }
 
@@ -83,10 +102,10 @@ PrivateFolder::PrivateFolder() {
   std::error_code error;
   const fs::path parent = fs::temp_directory_path(error);
   RemoveAbandoned(parent);
-  const std::wstring stem =
-      std::wstring(kFolderPrefix) + std::to_wstring(GetCurrentProcessId()) + L"-";
   for (DWORD i = 0; i < 100 && !error; ++i) {
-    const fs::path candidate = parent / (stem + std::to_wstring(GetTickCount() + i));
+    wchar_t name[40];
+    std::swprintf(name, std::size(name), kFolderName, GetCurrentProcessId(), GetTickCount() + i);
+    const fs::path candidate = parent / name;
     if (!fs::create_directory(candidate, error)) continue;
     path = candidate;
     return;
@@ -97,7 +116,7 @@ PrivateFolder::PrivateFolder() {
 
 PrivateFolder::~PrivateFolder() {
   std::error_code error;
-  fs::remove_all(path, error);
+  RemoveFolder(path, error);
   if (error)
     std::fprintf(stderr, "macrorun: the temporary folder %s is left behind: %s\n",
                  ToUtf8(path).c_str(), error.message().c_str());
@@ -123,26 +142,24 @@ ScriptModule::ScriptModule(const fs::path& file, const fs::path& description) {
 fs::path ScriptModule::CopyPrivately(const fs::path& file, const fs::path& description) {
   folder.emplace();
   Copy(file, folder->Path() / kModuleName);
-  Copy(description, folder->Path() / kDescriptionName);
+  Copy(description, folder->Path() / kDescriptionFileName);
   // The module asks for its own folder in the ANSI code page.
   return RequireAnsiNamed(folder->Path()) / kModuleName;
 }
 
-ScriptModule::~ScriptModule() {
-  FreeLibrary(library);
-}
+// Also after a stop or a fault, which leave a script engine behind that points into the module: it
+// makes no call of its own, and the process ends next.
+ScriptModule::~ScriptModule() { FreeLibrary(library); }
 
-FARPROC ScriptModule::Export(const char* name) const {
-  return GetProcAddress(library, name);
-}
+FARPROC ScriptModule::Export(const char* name) const { return GetProcAddress(library, name); }
 
 int ScriptModule::Execute(const fs::path& macro, void* host) {
   const std::string file = ToAnsi(RequireAnsiNamed(fs::absolute(macro)));
-  killRun = As<KillFunction>(Export("kill"));
+  SetKill(As<KillFunction>(Export("kill")));
   SetConsoleCtrlHandler(OnConsoleEvent, TRUE);
   const int result = As<ExecuteFunction>(Export("execute"))(file.c_str(), host);
   SetConsoleCtrlHandler(OnConsoleEvent, FALSE);
-  killRun = nullptr;
+  SetKill(nullptr);
   return result;
 }
 

@@ -4,6 +4,8 @@
 // The module reads its language description from its own folder. To give it another one, its file
 // and the description are copied into a private temporary folder and loaded from there; the folder
 // goes when the object does. A process that is killed leaves its folder to the next run.
+//
+// Threading: one thread; Ctrl+C arrives on a thread of the console's, which calls only `kill`.
 #pragma once
 
 #include <windows.h>
@@ -12,7 +14,7 @@
 #include <optional>
 #include <string>
 
-// A folder under the user's temporary folder, removed with all it holds.
+// A folder under the user's temporary folder, removed with the two files that it may hold.
 class PrivateFolder {
  public:
   PrivateFolder();  // throws UsageError

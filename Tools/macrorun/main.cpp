@@ -108,8 +108,11 @@ int main() {
     Options options;
     if (const std::optional<int> finished = ParseOptions(options)) return *finished;
     return Run(options);
-  } catch (const std::exception& error) {
+  } catch (const UsageError& error) {
     std::fprintf(stderr, "macrorun: %s\n", error.what());
     return kWrongUsage;
+  } catch (const std::exception& error) {
+    std::fprintf(stderr, "macrorun: %s\n", error.what());
+    return kFault;
   }
 }
