@@ -5,7 +5,7 @@
 
 set -euo pipefail
 
-ROOT=$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)
+ROOT=$(cd "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/.." && pwd)
 BUILD=$ROOT/build
 LOGS=$BUILD/logs
 
@@ -26,7 +26,7 @@ say() { printf '%s\n' "$*" >&2; }
 
 die() {
   say "error: $*"
-  exit 1
+  exit "${STATUS:-1}"
 }
 
 # step NAME COMMAND...: runs the command with its output in a log, and shows the log's end when it
@@ -109,7 +109,8 @@ build_release() {
     ! [ "$made" -nt "$ROOT/cmake/i686-w64-mingw32-clang.cmake" ]; then
     step "configuring" cmake -S "$ROOT" --preset release --fresh
   fi
-  step "building" cmake --build "$BUILD/release" ${1:+--target "$@"}
+  ninja -C "$BUILD/release" -n "$@" 2>/dev/null | grep -q 'no work to do' ||
+    step "building" cmake --build "$BUILD/release" ${1:+--target "$@"}
 }
 
 # prepare [TARGET...]: set-up, build and Wine's server; one process at a time.

@@ -5,9 +5,10 @@
 #   scripts/run.sh [OPTION...] MACRO [FILE]
 #
 # Options are macrorun's (--help lists them). Sets the machine up and builds first when needed.
-source "$(dirname "${BASH_SOURCE[0]}")/lib.sh"
+set -euo pipefail
+source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
-[ $# -gt 0 ] || die "usage: scripts/run.sh [OPTION...] MACRO [FILE]"
+[ $# -gt 0 ] || STATUS=2 die "usage: scripts/run.sh [OPTION...] MACRO [FILE]"
 
 prepare macrorun scriptruby
 exec wine "$BUILD/release/bin/macrorun.exe" "$@"

@@ -1,7 +1,8 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: MIT
 # Runs all tests: sets the machine up and builds first when needed. Arguments go to ctest.
-source "$(dirname "${BASH_SOURCE[0]}")/lib.sh"
+set -euo pipefail
+source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 prepare
 say "-- testing"

@@ -4,10 +4,14 @@
 #define NOMINMAX
 #include <windows.h>
 
+#include "../MessageBoxes.h"
 #include "TestSupport.h"
 #include "iLib/iClipboard.h"
 #include "iLib/iCodePage.h"
 #include "iLib/iModule.h"
+#include "iLib/iProfile.h"
+#include "xLib/xApp.h"
+#include "xLib/xScriptInfo.h"
 
 using SystemText = CoreTest;
 
@@ -32,55 +36,44 @@ TEST_F(SystemText, NamesErrors) {
   EXPECT_TRUE(none == ERROR_ACCESS_DENIED && !last.Equals(missing.Text(), true));
   SetLastError(ERROR_FILE_NOT_FOUND);
   EXPECT_TRUE(!last.FromLastError() && last.Equals(missing.Text(), true) && last.Length() > 5);
-  last.FromError(unknown);
-  EXPECT_EQ(Bytes(last), "Unexpected error performing the operation request!");
+  EXPECT_TRUE(!last.FromError(unknown) && last.EndsWith("performing the operation request!", true));
   SetLastError(0);
   EXPECT_TRUE(!last.FromLastError() && last.IsEmpty());
 }
 
-TEST_F(SystemText, ConvertsToUtf8AndBack) {
+TEST_F(SystemText, Converts) {
   const std::wstring wide = L"a\u00E9\u20AC\U0001F600";
-  const Text utf8 = "a\u00E9\u20AC\U0001F600";
   String text;
   text.FromUtf16ToUtf8(wide.c_str(), 5);
   for (int round = 0; round < 3; ++round) {  // from the string's own buffer
-    EXPECT_EQ(Text(text.Text(), text.Length() + 2), utf8 + "\0\0"s);
+    EXPECT_EQ(Text(text.Text(), text.Length() + 2), "a\u00E9\u20AC\U0001F600\0\0"s);
     text.FromUtf8ToUtf16(text.Text());
-    EXPECT_EQ(text.Length(), wide.size() * 2);
-    EXPECT_EQ(reinterpret_cast<const wchar_t*>(text.Text()), wide);
-    text.FromUtf16ToUtf8(reinterpret_cast<const wchar_t*>(text.Text()));
+    const auto* units = reinterpret_cast<const wchar_t*>(text.Text());
+    EXPECT_TRUE(text.Length() == wide.size() * 2 && units == wide);
+    text.FromUtf16ToUtf8(units);
   }
   text.FromUtf8ToUtf16("\xFFzzz");
   EXPECT_TRUE(text.Length() == 104 && text.Text()[0] == 0 && text.Text()[1] == 0);
-  text.FromUtf8ToUtf16("abc", 0);
-  EXPECT_TRUE(text.IsEmpty());
-}
-
-TEST_F(SystemText, ConvertsToCodePages) {
-  const wchar_t* const wide = L"hELLO W\u00D6RLD-foo 3D";
-  EXPECT_EQ(String(std::wstring(4095, 'x').c_str(), 1252).Length(), 4095u);
-  EXPECT_TRUE(String(std::wstring(4096, 'x').c_str(), 1252).IsEmpty());
+  EXPECT_TRUE((text.FromUtf8ToUtf16("abc", 0), text.IsEmpty()));
+  for (const u32 n : {4095u, 4096u})
+    EXPECT_EQ(String(std::wstring(n, 'x').c_str(), 1252).Length(), n == 4095 ? n : 0);
   EXPECT_EQ(ActiveCodePage(), kUtf8CodePage);
-  String text;
-  text.FromWide(wide);
-  EXPECT_EQ(Bytes(text), Bytes(String(wide, CP_ACP)));
+  text.FromWide(wide.c_str());
+  EXPECT_EQ(Bytes(text), Bytes(String(wide.c_str(), CP_ACP)));
   SetActiveCodePageFromKeyboard();
   EXPECT_EQ(ActiveCodePage(), GetACP());  // Wine takes both from the user's locale
-  text.FromWide(wide, 11);
-  EXPECT_EQ(Bytes(text), Bytes(String(wide, ActiveCodePage())).substr(0, 11));
+  text.FromWide(wide.c_str(), 2);
+  EXPECT_EQ(Bytes(text), Bytes(String(L"a\u00E9", ActiveCodePage())));
   text = "hELLO wORLD-foo 3D x", text.CapitalizeWords();
   EXPECT_EQ(Bytes(text), "Hello World-Foo 3d X");
-}
-
-TEST_F(SystemText, TerminatesConversionsWhileRoomLasts) {
   for (const int room : {1, 2, 3, 8}) {
     const int count = room > 1 ? 2 : 0;
     Text bytes(8, '#');
-    std::wstring wide(8, '#');
+    std::wstring units(8, '#');
     EXPECT_EQ(Utf16ToMultiByte(L"ab", 2, bytes.data(), room, 1252), count);
-    EXPECT_EQ(MultiByteToUtf16("ab", 2, wide.data(), room, 1252), count);
+    EXPECT_EQ(MultiByteToUtf16("ab", 2, units.data(), room, 1252), count);
     EXPECT_EQ(std::count(bytes.begin(), bytes.end(), 0), count ? std::min(room - 2, 2) : 1);
-    EXPECT_EQ(std::count(wide.begin(), wide.end(), 0), count ? std::min(room - 2, 4) : 0);
+    EXPECT_EQ(std::count(units.begin(), units.end(), 0), count ? std::min(room - 2, 4) : 0);
   }
 }
 
@@ -88,9 +81,47 @@ TEST_F(SystemText, ReadsTheClipboard) {
   String text("old");
   ASSERT_TRUE(OpenClipboard(nullptr) && EmptyClipboard() && CloseClipboard());
   EXPECT_TRUE(!GetClipboardText(text) && text.IsEmpty());
-  const HGLOBAL block = GlobalAlloc(GMEM_MOVEABLE, 8);
-  memcpy(GlobalLock(block), "abc\0def", 8);
-  GlobalUnlock(block);
+  const HGLOBAL block = GlobalAlloc(GMEM_FIXED, 8);
+  memcpy(block, "abc\0def", 8);
   ASSERT_TRUE(OpenClipboard(nullptr) && SetClipboardData(CF_TEXT, block) && CloseClipboard());
   EXPECT_TRUE(GetClipboardText(text) && Bytes(text) == "abc");
+}
+
+// --- The application and the description file ----------------------------------------------------
+
+TEST_F(SystemText, AsksAboutFailedChecks) {
+  Text boxes;
+  onBox = [&](const Text& box) {
+    boxes += box + "\n";
+    if (box[0] == 'b') EXPECT_FALSE(AskBreakIntoDebugger("again", 1));
+  };
+  PostQuitMessage(42);
+  EXPECT_FALSE(AskBreakIntoDebugger("a.cpp", 7));
+  MSG quit = {};
+  EXPECT_TRUE(PeekMessageA(&quit, nullptr, WM_QUIT, WM_QUIT, PM_REMOVE) && quit.wParam == 42);
+  VerifyMainApplication(&quit, "b.cpp", 8);
+  VerifyMainApplication(nullptr, "b.cpp", 8);
+  const Text question = "\nDo you wish to attempt to break into the debugger?\n";
+  const Text failure = "No main application object has been defined!";
+  EXPECT_EQ(boxes, "box Assertion Failed: ASSERT: File a.cpp, Line 7" + question +
+                       "box Assertion Failed: ASSERT: File b.cpp, Line 8" + question +
+                       "stop box Exception: " + failure + "\n");
+  EXPECT_EQ(TakeReports("\"b.cpp\" (8)      " + failure), 1);
+}
+
+TEST_F(SystemText, WritesAndReadsTheDescription) {
+  const Text path = testing::TempDir() + "core-description.ini";
+  Profile profile(path.c_str()), impossible("?:\\no\\x.ini");
+  xScriptInfo defaults(true), info(false), again(false);
+  info.Read(profile, defaults);
+  info.FixCRLF = true;
+  EXPECT_TRUE(info.Write(profile) && !info.Write(impossible));
+  again.Read(profile, xScriptInfo(false));
+  EXPECT_TRUE(again.FixCRLF && !again.FixDelimiter && again.Quote.Equals("\\\"", true));
+  String value;
+  for (const char* expected : {"function key_macro()", "none"}) {  // up to the real line feed
+    EXPECT_TRUE(profile.ReadString(value, "Options", "MacroBegin", "none", true));
+    EXPECT_EQ(Bytes(value), expected) << "the key is removed by the first";
+  }
+  DeleteFileA(path.c_str());
 }

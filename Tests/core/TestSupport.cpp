@@ -8,13 +8,11 @@
 
 #include "cLib/cReport.h"
 
-static int allocationsLeft = 0;
-static bool allocationFailed = false;
+static int allocationsLeft = 0, allocationFailed = 0;
 
 static void* TestMalloc(size_t bytes) {
   if (allocationsLeft == 0 || --allocationsLeft > 0) return malloc(bytes);
-  allocationFailed = true;
-  return nullptr;
+  return ++allocationFailed, nullptr;
 }
 
 // The library's own allocation, but for the place where its memory comes from.
@@ -24,11 +22,8 @@ static void* TestMalloc(size_t bytes) {
 
 bool FailAllocation(int n) {
   allocationsLeft = n;
-  return std::exchange(allocationFailed, false);
+  return std::exchange(allocationFailed, 0);
 }
-
-int Element::live = 0;
-std::vector<Text> CoreTest::reports;
 
 CoreTest::CoreTest() {
   SetDebugHook([](const char* line) { reports.push_back(line); });
@@ -39,9 +34,7 @@ CoreTest::CoreTest() {
 }
 
 CoreTest::~CoreTest() {
-  SetDebugHook(nullptr);
-  FailAllocation(0);
-  TakeReports();
+  SetDebugHook(nullptr), FailAllocation(0), TakeReports();
   EXPECT_EQ(Element::live, 0);
 }
 

@@ -29,7 +29,7 @@ class CoreTest : public testing::Test {
 
   // How many debug-output lines since the last call contain `part`. All lines are forgotten.
   static int TakeReports(const Text& part = "");
-  static std::vector<Text> reports;
+  static inline std::vector<Text> reports;
 
   u32 Below(size_t n) { return static_cast<u32>(random() % n); }
   Text Word(u32 longest);
@@ -39,7 +39,7 @@ class CoreTest : public testing::Test {
 
 // A container element that knows how many of its kind live.
 struct Element {
-  static int live;
+  static inline int live = 0;
   int id;
   explicit Element(int number = 0) : id(number) { ++live; }
   virtual ~Element() { --live; }

@@ -2,8 +2,7 @@
 // A module whose every run ends as a fault does. It calls the host by slot number.
 #include <windows.h>
 
-extern "C" {
-int __stdcall execute(const char*, void* host) {
+extern "C" int __stdcall execute(const char*, void* host) {
   using ReportMessage = void(__thiscall*)(void* self, const char* text);
   void** slots = *static_cast<void***>(host);
   reinterpret_cast<ReportMessage>(slots[2])(
@@ -11,11 +10,5 @@ int __stdcall execute(const char*, void* host) {
   return -1;
 }
 
-bool __stdcall kill(int) {
-  return false;
-}
-
-bool __stdcall version(void*, const char*) {
-  return false;
-}
-}
+extern "C" bool __stdcall kill(int) { return false; }
+extern "C" bool __stdcall version(void*, const char*) { return false; }

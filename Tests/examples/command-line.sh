@@ -75,7 +75,7 @@ set_line(1, new Array(600).join("x"))|may have been cut at 512
 CALLS
 for line in "$(printf '%01024d' 0)" "$(printf '\200')"; do
   printf '%s\n' "$line" > input.txt
-  expect_js 1 'get_line: line 1 cannot be passed' 'tarn.get_line(1);'
+  expect_js 1 'get_line: line 1 has ' 'tarn.get_line(1);'
 done
 : > input.txt
 expect_js 1 'the document has none' 'tarn.get_line(1);'

@@ -1,46 +1,12 @@
 // SPDX-License-Identifier: MIT
 #include "FakeEngine.h"
 
-#include <cstring>
+#include <algorithm>
+#include <deque>
+#include <filesystem>
+#include <utility>
 
 #include "RawHost.h"
-
-EnginePlan plan;
-int liveEngines = 0;
-
-static const CLSID kClassId = {
-    0x5d7a1c30, 0x6e0b, 0x4e58, {0x9a, 0x41, 0x3b, 0x7c, 0x11, 0x52, 0xd0, 0x6f}};
-
-namespace {
-class Factory : public IClassFactory {
- public:
-  STDMETHODIMP QueryInterface(REFIID, void** object) override {
-    *object = this;
-    return S_OK;
-  }
-  STDMETHODIMP_(ULONG) AddRef() override { return 2; }
-  STDMETHODIMP_(ULONG) Release() override { return 1; }
-  STDMETHODIMP LockServer(BOOL) override { return S_OK; }
-  STDMETHODIMP CreateInstance(IUnknown*, REFIID riid, void** object) override {
-    *object = nullptr;
-    if (FAILED(plan.results["CreateInstance"])) return plan.results["CreateInstance"];
-    return (new FakeEngine)->QueryInterface(riid, object);
-  }
-};
-}  // namespace
-
-// The key is volatile: it goes with the session, and other processes may be using it until then.
-void RegisterFakeEngine() {
-  static Factory factory;
-  static const wchar_t kText[] = L"{5D7A1C30-6E0B-4E58-9A41-3B7C1152D06F}";
-  HKEY key;
-  RegCreateKeyExW(HKEY_CLASSES_ROOT, L"FakeEngine\\CLSID", 0, nullptr, REG_OPTION_VOLATILE,
-                  KEY_WRITE, nullptr, &key, nullptr);
-  RegSetValueExW(key, nullptr, 0, REG_SZ, reinterpret_cast<const BYTE*>(kText), sizeof kText);
-  RegCloseKey(key);
-  DWORD cookie;
-  CoRegisterClassObject(kClassId, &factory, CLSCTX_INPROC_SERVER, REGCLS_MULTIPLEUSE, &cookie);
-}
 
 std::string Hex(HRESULT result) {
   char text[16];
@@ -48,108 +14,98 @@ std::string Hex(HRESULT result) {
   return text;
 }
 
-HRESULT FakeEngine::Note(const std::string& step) {
+static std::string Utf8(const wchar_t* text) { return std::filesystem::path(text).string(); }
+
+static HRESULT Note(const std::string& step) {
   Log("engine: " + step);
-  const auto planned = plan.results.find(step);
-  return planned == plan.results.end() ? S_OK : planned->second;
+  return results[step];
 }
 
-HRESULT FakeEngine::QueryInterface(REFIID riid, void** object) {
-  *object = nullptr;
-  if (riid == __uuidof(IActiveScriptParse)) {
-    const HRESULT result = Note("QueryInterface of the parser");
-    if (FAILED(result)) return result;
-    *object = static_cast<IActiveScriptParse*>(this);
-  } else if (riid == IID_IUnknown || riid == IID_IActiveScript) {
-    *object = static_cast<IActiveScript*>(this);
-  } else {
-    return E_NOINTERFACE;
-  }
-  AddRef();
-  return S_OK;
-}
+// Two interfaces of one object: each is the address of its table. The class object shares what all
+// interfaces begin with.
+struct FakeEngine {
+  void** script;
+  void** parser;
+  IActiveScriptSite* site;
+};
 
-ULONG FakeEngine::Release() {
-  const ULONG left = --references;
-  if (left == 0) delete this;
-  return left;
-}
-
-HRESULT FakeEngine::SetScriptState(SCRIPTSTATE state) {
-  const HRESULT result = Note("SetScriptState " + std::to_string(state));
-  if (state == SCRIPTSTATE_CONNECTED && plan.onConnect) plan.onConnect(*this);
+namespace {
+HRESULT __stdcall QueryInterface(FakeEngine* engine, REFIID riid, void** object) {
+  const bool parser = riid == __uuidof(IActiveScriptParse);
+  const HRESULT result = Note(parser ? "QueryInterface of the parser" : "QueryInterface");
+  *object = FAILED(result) ? nullptr : parser ? &engine->parser : &engine->script;
+  engineReferences += SUCCEEDED(result);
   return result;
 }
-
-HRESULT FakeEngine::AddNamedItem(LPCOLESTR name, DWORD flags) {
-  const std::wstring wide(name);
-  return Note("AddNamedItem " + std::string(wide.begin(), wide.end()) + " " +
+ULONG __stdcall AddRef(void*) { return ++engineReferences; }
+ULONG __stdcall Release(void*) { return --engineReferences; }
+HRESULT __stdcall SetScriptSite(FakeEngine* engine, IActiveScriptSite* newSite) {
+  engine->site = newSite;
+  return Note("SetScriptSite");
+}
+HRESULT __stdcall SetScriptState(FakeEngine* engine, SCRIPTSTATE state) {
+  IActiveScriptSite* const outer = std::exchange(site, engine->site);
+  const HRESULT result = Note("SetScriptState " + std::to_string(state));
+  site = outer;
+  return result;
+}
+HRESULT __stdcall AddNamedItem(void*, LPCOLESTR name, DWORD flags) {
+  return Note("AddNamedItem " + Utf8(name) + " " + std::to_string(flags));
+}
+HRESULT __stdcall InterruptScriptThread(void*, int thread, const void* info, DWORD flags) {
+  return Note("InterruptScriptThread " + std::to_string(thread) + (info ? " with info " : " ") +
               std::to_string(flags));
 }
-
-HRESULT FakeEngine::InterruptScriptThread(SCRIPTTHREADID thread, const EXCEPINFO* info,
-                                          DWORD flags) {
-  return Note("InterruptScriptThread " + std::to_string(static_cast<int>(thread)) +
-              (info ? " with info " : " ") + std::to_string(flags));
+HRESULT __stdcall InitNew(void*) { return Note("InitNew"); }
+HRESULT __stdcall ParseScriptText(void*, LPCOLESTR code, int item, int context, int delimiter,
+                                  int cookie, int line, int flags, int result, EXCEPINFO* info) {
+  source = code;
+  const bool plain = !(item | context | delimiter | cookie | line | flags | result);
+  return Note(plain && !info->bstrDescription ? "ParseScriptText" : "ParseScriptText, not plain");
 }
 
-HRESULT FakeEngine::ParseScriptText(LPCOLESTR code, LPCOLESTR item, IUnknown* context,
-                                    LPCOLESTR delimiter, DWORD cookie, ULONG line, DWORD flags,
-                                    VARIANT* result, EXCEPINFO* info) {
-  plan.source = code;
-  const bool plain = !item && !context && !delimiter && !cookie && !line && !flags && !result &&
-                     info && !info->bstrDescription;
-  if (plan.onParse) plan.onParse(*this);
-  return Note(plain ? "ParseScriptText" : "ParseScriptText with surprising arguments");
+HRESULT __stdcall CreateInstance(void*, IUnknown*, REFIID riid, void** object) {
+  static auto script =
+      Table(QueryInterface, AddRef, Release, SetScriptSite, Unused, SetScriptState, Unused, Unused,
+            AddNamedItem, Unused, Unused, Unused, Unused, Unused, InterruptScriptThread, Unused);
+  static auto parser = Table(QueryInterface, AddRef, Release, InitNew, Unused, ParseScriptText);
+  static std::deque<FakeEngine> engines;  // kept: a run that was stopped has forgotten its own
+  engines.push_back({script.data(), parser.data(), nullptr});
+  return QueryInterface(&engines.back(), riid, object);
+}
+}  // namespace
+
+void RegisterFakeEngine() {
+  static auto table = Table(QueryInterface, AddRef, Release, CreateInstance, Unused);
+  static void** factory = table.data();
+  CLSID classId;
+  DWORD cookie;
+  CLSIDFromProgID(L"JScript", &classId);
+  CoRegisterClassObject(classId, reinterpret_cast<IUnknown*>(&factory), CLSCTX_INPROC_SERVER,
+                        REGCLS_MULTIPLEUSE, &cookie);
 }
 
-IDispatch* FakeEngine::Item() {
+IDispatch* Item() {
   IUnknown* item = nullptr;
   site->GetItemInfo(L"tarn", SCRIPTINFO_IUNKNOWN, &item, nullptr);
   return static_cast<IDispatch*>(item);
 }
 
-static std::string Describe(const VARIANT& value) {
-  if (value.vt == VT_I4) return std::to_string(value.lVal);
-  if (value.vt != VT_BSTR) return "type " + std::to_string(value.vt);
-  std::string text = std::to_string(SysStringLen(value.bstrVal)) + " \"";
-  for (const wchar_t* unit = value.bstrVal; *unit; ++unit)
-    text +=
-        *unit < 128 ? std::string(1, static_cast<char>(*unit)) : "<" + Hex(*unit).substr(4) + ">";
-  return text + "\"";
-}
-
-void FakeEngine::Call(const wchar_t* name, std::vector<VARIANT> arguments) {
+void Call(const wchar_t* name, std::vector<VARIANT> arguments) {
   IDispatch* item = Item();
-  DISPID id = -1;
   LPOLESTR names[] = {const_cast<LPOLESTR>(name)};
-  VARIANT result = Value(VT_R8);
+  std::reverse(arguments.begin(), arguments.end());
+  DISPPARAMS params = {arguments.data(), nullptr, static_cast<UINT>(arguments.size()), 0};
+  DISPID id = -1;
+  VARIANT result = Value(VT_R8, 0.0);
   HRESULT outcome = item->GetIDsOfNames(IID_NULL, names, 1, LOCALE_USER_DEFAULT, &id);
-  if (outcome == S_OK) {
-    std::vector<VARIANT> reversed(arguments.rbegin(), arguments.rend());
-    DISPPARAMS params = {reversed.data(), nullptr, static_cast<UINT>(reversed.size()), 0};
+  if (outcome == S_OK)
     outcome = item->Invoke(id, IID_NULL, LOCALE_USER_DEFAULT, DISPATCH_METHOD, &params, &result,
                            nullptr, nullptr);
-  }
-  Log("returned " + Hex(outcome) + ", " + Describe(result));
-  VariantClear(&result);
+  const bool text = result.vt == VT_BSTR;
+  Log("returned " + Hex(outcome) + ", type " + std::to_string(result.vt) + ", " +
+      std::to_string(text ? static_cast<int>(SysStringLen(result.bstrVal)) : result.lVal) + " " +
+      Utf8(text ? result.bstrVal : L""));
   for (VARIANT& argument : arguments) VariantClear(&argument);
-  item->Release();
-}
-
-VARIANT Value(VARTYPE type, LONGLONG bits) {
-  VARIANT value = {};
-  value.vt = type;
-  value.llVal = bits;
-  return value;
-}
-
-VARIANT Real(double value) {
-  LONGLONG bits;
-  std::memcpy(&bits, &value, sizeof bits);
-  return Value(VT_R8, bits);
-}
-
-VARIANT Text(const std::wstring& value) {
-  return Value(VT_BSTR, reinterpret_cast<LONG_PTR>(SysAllocString(value.c_str())));
+  VariantClear(&result), item->Release();
 }

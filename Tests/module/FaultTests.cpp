@@ -3,108 +3,79 @@
 // with -1 and the message, and the next run is as if nothing had been.
 #include "ModuleTest.h"
 
-class FaultTest : public ModuleTest {};
+using FaultTest = ModuleTest;
 
 namespace {
 volatile int sink;
+unsigned char data[16] = {0xC3};
 
-void ReadNothing() { sink = *reinterpret_cast<volatile int*>(8); }
 void WriteNothing() { *reinterpret_cast<volatile int*>(8) = 1; }
-void ExecuteData() {
-  static unsigned char data[16] = {0xC3};
-  reinterpret_cast<void (*)()>(reinterpret_cast<void*>(data))();
-}
-void DivideByZero() { __asm__ volatile("idivl %0" ::"r"(0), "a"(1), "d"(0)); }
-void IllegalInstruction() { __asm__ volatile("ud2"); }
-void LanguageException() { RaiseException(0xE06D7363, EXCEPTION_NONCONTINUABLE, 0, nullptr); }
 __attribute__((noinline)) void OverflowStack() {
-  volatile char page[4096];
-  page[0] = 1;
+  volatile char page[4096] = {1};
   if (page[0] == 1) OverflowStack();
   sink = page[0];
 }
-void (*const kFaults[])() = {ReadNothing,        WriteNothing,      ExecuteData,  DivideByZero,
-                             IllegalInstruction, LanguageException, OverflowStack};
 }  // namespace
 
+// A stop is among them: it leaves as much behind, and must stay possible as often.
 TEST_F(FaultTest, EveryKindInTheHostAndInTheEngine) {
+  const std::pair<const char*, std::function<void()>> faults[] = {
+      {"read", [] { sink = *reinterpret_cast<volatile int*>(8); }},
+      {"write", WriteNothing},
+      {"data executed", [] { reinterpret_cast<void (*)()>(reinterpret_cast<void*>(data))(); }},
+      {"division", [] { __asm__ volatile("idivl %0" ::"r"(0), "a"(1), "d"(0)); }},
+      {"illegal instruction", [] { __asm__ volatile("ud2"); }},
+      {"exception", [] { RaiseException(0xE06D7363, EXCEPTION_NONCONTINUABLE, 0, nullptr); }},
+      {"stack overflow", OverflowStack},
+      {"stop", [&] { Stop(host.Engine()); }}};
   const char* repeats = std::getenv("SCRIPTRUBY_TEST_FAULTS");
-  for (const auto& fault : kFaults)
+  const auto script = on["engine: SetScriptState 2"];
+  for (const auto& [kind, fault] : faults)
     for (bool inHost : {true, false}) {
-      Log("--- fault " + std::to_string(&fault - kFaults) +
-          (inHost ? " in the host" : " in the engine"));
-      for (int i = repeats ? std::atoi(repeats) : 1000; i-- > 0;) {
-        muted = i > 0;  // the last one is logged
-        plan.onConnect = [&](FakeEngine& engine) {
-          if (!inHost) fault();
-          engine.Call(L"f", {Value(VT_I4, 1)});
-        };
-        host.onCall = [&] {
-          host.AnswerTexts({"text"});
-          fault();
-        };
-        liveEngines = 0;
-        ASSERT_EQ(-1, Run()) << i;
-        ASSERT_TRUE(host.IsClean());
-        ASSERT_FALSE(Module().kill(0)) << "the host is no longer current";
+      Log("--- "s + kind + (inHost ? " in the host" : " in the engine"));
+      for (int i = repeats ? std::atoi(repeats) : 1000; i >= 0; --i) {
+        muted = i > 1;  // the last one is logged, and a run without a fault
+        on["engine: SetScriptState 2"] = [&] { inHost || !i ? script() : fault(); };
+        on["call 7"] = [&] { host.AnswerTexts({"text"}), i ? fault() : void(); };
+        ASSERT_EQ(i ? -1 : 1, Run()) << i;
       }
-      plan.onConnect = [&](FakeEngine& engine) { engine.Call(L"f"); };
-      host.onCall = nullptr;
-      liveEngines = 0;
-      ASSERT_EQ(1, Run());
     }
 }
 
 // Where the script is parsed, before there is an engine, and in the clean-up itself.
 TEST_F(FaultTest, OutsideTheScript) {
-  plan.onParse = [](FakeEngine&) { WriteNothing(); };
+  on["engine: ParseScriptText"] = WriteNothing;
   Run();
   host.noContext = true;
-  const std::string path = "C:\\" + std::string(5000, 'x');  // cut where the message is full
-  Execute(path);
+  Run("C:\\" + std::string(5000, 'x'));  // cut where the message is full
   host.noContext = false;
-  EXPECT_EQ(-1, Module().execute(reinterpret_cast<const char*>(8), host.Interface()));
+  EXPECT_EQ(-1, ExecuteFor(&host, reinterpret_cast<const char*>(8)));
 
-  static void* brokenTable[] = {reinterpret_cast<void*>(&ExecuteData)};
-  static void** broken[] = {brokenTable, brokenTable};
-  plan.onParse = nullptr;
-  plan.onConnect = [&](FakeEngine& engine) { engine.Call(L"f", {Value(VT_I4, 1)}); };
-  host.onCall = [&] {
-    host.AnswerTexts({"a", "b", "c"});
-    for (int i = 0; i < 2; ++i) host.Field<void**>(31 + 16)[i + 1] = &broken[i];
-    RawHost::liveTexts -= 2;
+  void* brokenTable[] = {data};
+  void** broken = brokenTable;
+  on.erase("engine: ParseScriptText");
+  on["call 7"] = [&] {
+    host.AnswerTexts({"a", "b", "c", "d"});
+    for (int i : {1, 2}) At<void**>(host.context, 31 + 16)[i] = &broken;
+    liveTexts -= 2;
   };
   Run();
-  void* const items = host.Field<void*>(51 + 16);
-  host.onCall = [&] { host.Field<int>(51 + 16) = 8; };
+  void* const items = At<void*>(host.context, 51 + 16);
+  on["call 7"] = [&] { At<int>(host.context, 51 + 16) = 8; };
   Run();
-  host.Field<void*>(51 + 16) = items;
+  At<void*>(host.context, 51 + 16) = items;
 }
 
 // A run that is over, or has faulted, cannot be stopped any more.
 TEST_F(FaultTest, StopsThatComeTooLate) {
   void* engine = nullptr;
-  plan.onConnect = [&](FakeEngine& script) {
+  bool faults = false;
+  on["call 7"] = [&] {
     engine = host.Engine();
-    script.Call(L"f");
+    if (faults) WriteNothing();
   };
-  host.onText = [&](const std::string& text) {
-    if (text == "Destroying macro interface" || text.starts_with("Tarn has")) Stop(engine);
-  };
+  on["trace: Destroying"] = on["report: Tarn has"] = [&] { Stop(engine), Log("still here"); };
   Run();
-  host.onCall = WriteNothing;
-  Run();
-}
-
-TEST_F(FaultTest, InANestedRun) {
-  bool inner = false;
-  plan.onConnect = [&](FakeEngine& engine) { engine.Call(L"f"); };
-  host.onCall = [&] {
-    void* engine = host.Engine();
-    if (inner) WriteNothing();
-    inner = true;
-    Execute(MacroPath());
-    Stop(engine);  // must reach the outer run, not the faulted one's frame
-  };
+  faults = true;
   Run();
 }

@@ -1,43 +1,58 @@
 // SPDX-License-Identifier: MIT
 // What every test of the module shares: the DLL that ships, loaded from a folder of the test's own,
-// one host, one fake engine, and a transcript. Whatever the host, the engine and the user's screen
-// see is logged in order, and the end of each test compares it with golden/<suite>.<test>.txt, so
-// an unexpected call fails by itself. With SCRIPTRUBY_PROMOTE=1 the files are rewritten instead.
+// one host, one fake engine whose script calls f(1), and a transcript. Whatever the host, the engine
+// and the user's screen see is logged in order, and the end of each test compares it with
+// golden/<suite>.<test>.txt, so an unexpected call fails by itself. With SCRIPTRUBY_PROMOTE=1 the
+// files are rewritten instead.
 #pragma once
 
 #include <gtest/gtest.h>
 
+#include <filesystem>
+#include <fstream>
+
 #include "FakeEngine.h"
 #include "RawHost.h"
 
+using namespace std::string_literals;
+
 // A copy of the DLL in a folder of its own, loaded from there.
-struct LoadedModule {
-  explicit LoadedModule(const std::string& folder);
-  ~LoadedModule() { FreeLibrary(handle); }
+HMODULE LoadModule(const std::string& folder);
+inline HMODULE dll;  // loaded from testFolder
 
-  HMODULE handle;
-  int(__stdcall* execute)(const char* file, void* host);
-  bool(__stdcall* kill)(int value);
-  bool(__stdcall* version)(void* record, const char* path);
-};
+template <class Result, class... Arguments>
+Result CallExport(HMODULE module, const char* name, Arguments... arguments) {
+  void* const function = reinterpret_cast<void*>(GetProcAddress(module, name));
+  return reinterpret_cast<Result(__stdcall*)(Arguments...)>(function)(arguments...);
+}
+inline bool Kill(int value) { return CallExport<bool>(dll, "kill", value); }
+inline int ExecuteFor(RawHost* host, const char* file) {
+  return CallExport<int>(dll, "execute", file, host);
+}
 
-void WriteBytes(const std::string& path, const std::string& bytes);
-std::string TestFolder();  // of this process, made on first use
-inline std::string MacroPath() { return TestFolder() + "\\macro.rbs"; }
+// Of this process.
+inline const std::string testFolder = std::filesystem::temp_directory_path().string() +
+                                      "scriptruby-tests-" + std::to_string(GetCurrentProcessId());
+inline const std::string macroPath = testFolder + "\\macro.rbs";
+
+inline void WriteBytes(const std::string& path, const std::string& bytes) {
+  std::ofstream(path, std::ios::binary) << bytes;
+}
 
 class ModuleTest : public testing::Test {
  protected:
   ModuleTest();
   void TearDown() override;
 
-  static LoadedModule& Module();
-  // Writes the description file: lines of its section.
+  // Logs and writes the description file: lines of its section.
   static void Describe(const std::string& lines) {
-    WriteBytes(TestFolder() + "\\xMacroWSH.qwsh", "[Options]\r\n" + lines);
+    Log("--- " + lines);
+    WriteBytes(testFolder + "\\xMacroWSH.qwsh", "[Options]\r\n" + lines);
   }
-  // Runs a macro of these bytes on the host and logs the result; `plan` plays it.
-  int Run(const std::string& macro = "\n");
-  int Execute(const std::string& path);
+  // Runs a macro on the host and logs the result.
+  int Run(const std::string& path = macroPath);
+  // Runs the test's body as the script.
+  void Script(const std::function<void()>& body) { on["engine: SetScriptState 2"] = body, Run(); }
 
   RawHost host;
 };

@@ -1,114 +1,83 @@
 // SPDX-License-Identifier: MIT
 #include "RawHost.h"
 
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 
-int RawHost::liveTexts = 0;
+using namespace std::string_literals;
 
 namespace {
 constexpr unsigned char kGuard = 0xA5;  // what stands behind the record's 71 bytes
-constexpr int kTexts = 31, kArguments = 51;
-constexpr int kCapacity = 4, kCount = 8, kOwns = 12, kItems = 16;  // of a list
-constexpr int kTextField = 8;                                      // of a string
+constexpr int kSize = 71, kTexts = 31, kArguments = 51;
+// Of a list, and of a string.
+constexpr int kCapacity = 4, kCount = 8, kOwns = 12, kItems = 16, kText = 8;
 
-struct Object {
-  void** table;
-  RawHost* self;
-};
-
-std::string Argument(char* record) {
-  const std::string text =
-      "\"" + std::string(*reinterpret_cast<char**>(record + 24 + kTextField)) + "\"";
-  const int kind = *reinterpret_cast<int*>(record + 8);
-  if (kind == 1) return text;
-  char numbers[64];
-  std::snprintf(numbers, sizeof numbers, "%d:%d:%.17g:", kind, *reinterpret_cast<int*>(record + 12),
-                *reinterpret_cast<double*>(record + 16));
-  return numbers + text;
+void* THISCALL Context(RawHost* host) { return host->noContext ? nullptr : host->context; }
+void THISCALL Report(RawHost*, const char* text) { Log("report: "s + text); }
+void Trace(RawHost*, const char* format, const char* text) {
+  Log("trace: "s + (format == "Debug: %s\n"s ? text : format));
 }
-
-void THISCALL Unused(Object*) { Log("an unused slot was called"); }
-void* THISCALL Context(Object* host) {
-  return host->self->noContext ? nullptr : host->self->context;
+void THISCALL SetFixCRLF(RawHost*, char on) { Log("fix CRLF " + std::to_string(on)); }
+void THISCALL SetFixDelimiter(RawHost*, char on) { Log("fix delimiter " + std::to_string(on)); }
+unsigned THISCALL FunctionId(RawHost*, const char* name) {
+  return name == "f"s ? 7 : name == "g"s ? 0 : 2000;
 }
-void THISCALL Report(Object* host, const char* text) {
-  Log("report: " + std::string(text));
-  if (host->self->onText) host->self->onText(text);
-}
-void Trace(Object* host, const char* format, const char* text) {
-  Log("trace: " + std::string(std::strcmp(format, "Debug: %s\n") ? format : text));
-  if (host->self->onText) host->self->onText(text);
-}
-void THISCALL SetFixCRLF(Object*, unsigned char flag) { Log("fix CRLF " + std::to_string(flag)); }
-void THISCALL SetFixDelimiter(Object*, unsigned char flag) {
-  Log("fix delimiter " + std::to_string(flag));
-}
-unsigned THISCALL FunctionId(Object* host, const char* name) {
-  const auto found = host->self->functions.find(name);
-  return found == host->self->functions.end() ? 2000 : found->second;
-}
-void* THISCALL WindowHandle(Object*) { return reinterpret_cast<void*>(0x1234); }
-void THISCALL CallFunction(Object* host, unsigned id) {
-  RawHost& self = *host->self;
+void* THISCALL WindowHandle(RawHost*) { return reinterpret_cast<void*>(0x1234); }
+void THISCALL CallFunction(RawHost* host, unsigned id) {
   std::string line = "call " + std::to_string(id);
-  char** items = self.Field<char**>(kArguments + kItems);
-  for (int i = 0; i < self.Field<int>(kArguments + kCount); ++i) line += " " + Argument(items[i]);
+  for (int i = 0; i < At<int>(host->context, kArguments + kCount); ++i) {
+    void* argument = At<void**>(host->context, kArguments + kItems)[i];
+    char numbers[64];
+    std::snprintf(numbers, sizeof numbers, " %d:%d:%.17g:", At<int>(argument, 8),
+                  At<int>(argument, 12), At<double>(argument, 16));
+    line += numbers + ("\""s + At<char*>(argument, 24 + kText) + "\"");
+  }
   Log(line);
-  if (self.onCall) self.onCall();
 }
 
 void* THISCALL DeleteText(char* text, unsigned flags) {
-  --RawHost::liveTexts;
-  std::free(*reinterpret_cast<char**>(text + kTextField));
+  --liveTexts;
+  std::free(At<char*>(text, kText));
   if (flags & 1) std::free(text);
   return text;
 }
-template <class F>
-void* Address(F* function) {
-  return reinterpret_cast<void*>(function);
-}
-void* textTable[] = {Address(DeleteText)};
+
+std::vector<void*> textTable = Table(DeleteText);
+std::vector<void*> hostTable =
+    Table(Unused, Context, Report, Trace, SetFixCRLF, SetFixDelimiter, Unused, FunctionId, Unused,
+          WindowHandle, Unused, Unused, CallFunction);
 }  // namespace
 
-RawHost::RawHost() {
-  static void* table[13] = {Address(Unused),       Address(Context),    Address(Report),
-                            Address(Trace),        Address(SetFixCRLF), Address(SetFixDelimiter),
-                            Address(Unused),       Address(FunctionId), Address(Unused),
-                            Address(WindowHandle), Address(Unused),     Address(Unused),
-                            Address(CallFunction)};
-  object = {table, this};
-  std::memset(context, 0, sizeof context);
-  std::memset(context + 71, kGuard, sizeof context - 71);
+RawHost::RawHost() : table(hostTable.data()) {
+  std::memset(context + kSize, kGuard, sizeof context - kSize);
   context[8] = 0xEE;
   for (int list : {kTexts, kArguments}) {
-    Field<unsigned>(list + kCapacity) = 1;  // small, so that the module has to grow it
-    Field<unsigned>(list + kOwns) = 1;
-    Field<void*>(list + kItems) = std::calloc(1, sizeof(void*));
+    // The module sees one slot, so that it has to make the list of arguments grow.
+    At<unsigned>(context, list + kCapacity) = At<unsigned>(context, list + kOwns) = 1;
+    At<void*>(context, list + kItems) = std::calloc(8, sizeof(void*));
   }
 }
 
 RawHost::~RawHost() {
-  for (int list : {kTexts, kArguments}) std::free(Field<void*>(list + kItems));
+  for (int list : {kTexts, kArguments}) std::free(At<void*>(context, list + kItems));
 }
 
 bool RawHost::IsClean() {
-  bool clean = !Engine() && !Field<int>(kTexts + kCount) && !Field<int>(kArguments + kCount);
-  for (unsigned i = 71; i < sizeof context; ++i) clean = clean && context[i] == kGuard;
-  return clean && liveTexts == 0;
+  return !Engine() && !At<int>(context, kTexts + kCount) &&
+         !At<int>(context, kArguments + kCount) &&
+         std::all_of(context + kSize, std::end(context), [](int byte) { return byte == kGuard; }) &&
+         liveTexts == 0;
 }
 
 void RawHost::AnswerTexts(const std::vector<std::string>& texts, unsigned resultKind) {
-  Field<unsigned>(23) = resultKind;
+  At<unsigned>(context, 23) = resultKind;
   for (const std::string& text : texts) {
-    char* element = static_cast<char*>(std::calloc(1, 24));
-    *reinterpret_cast<void***>(element) = textTable;
-    *reinterpret_cast<char**>(element + kTextField) = strdup(text.c_str());
+    void* element = std::calloc(1, 24);
+    At<void**>(element, 0) = textTable.data();
+    At<char*>(element, kText) = strdup(text.c_str());
+    At<void**>(context, kTexts + kItems)[At<int>(context, kTexts + kCount)++] = element;
+    At<int>(context, kTexts + kCapacity) = At<int>(context, kTexts + kCount);
     ++liveTexts;
-    const int index = Field<int>(kTexts + kCount)++;
-    void**& items = Field<void**>(kTexts + kItems);
-    items = static_cast<void**>(std::realloc(items, (index + 1) * sizeof(void*)));
-    items[index] = element;
-    Field<int>(kTexts + kCapacity) = index + 1;
   }
 }

@@ -11,42 +11,42 @@
 
 #define THISCALL __attribute__((thiscall))
 
-// Adds one line to the transcript of the running test; line ends and bytes that do not print are
-// shown as escapes. Nothing while `muted`.
-void Log(const std::string& text);
-extern bool muted;
+// Adds one line to the transcript of the running test, unless `muted`; line ends and bytes that do
+// not print are shown as escapes. Then does what the test has planned for lines that begin so: this
+// is how it plays the host's functions, the engine and the script.
+void Log(const std::string& line);
+inline bool muted = false;
+inline std::map<std::string, std::function<void()>> on;
 
-class RawHost {
- public:
+// The field at a byte offset of a record, such as the context.
+template <class T>
+T& At(void* object, int offset) {
+  return *reinterpret_cast<T*>(static_cast<char*>(object) + offset);
+}
+
+// A table of operations, for an object that begins with its address. Unused logs its call.
+template <class... Functions>
+std::vector<void*> Table(Functions*... functions) {
+  return {reinterpret_cast<void*>(functions)...};
+}
+inline void THISCALL Unused() { Log("an unused slot was called"); }
+
+// Its address is the host interface's: the table comes first. It knows two macro functions, f and
+// g, by the numbers 7 and 0.
+struct RawHost {
   RawHost();
   ~RawHost();
-  RawHost(const RawHost&) = delete;
-
-  void* Interface() { return &object; }
-  // The field at a byte offset of the context record.
-  template <class T>
-  T& Field(int offset) {
-    return *reinterpret_cast<T*>(context + offset);
-  }
-  void* Engine() { return Field<void*>(18); }
-  // Leaves text results as the host does: elements whose deletion the host counts.
+  void*& Engine() { return At<void*>(context, 18); }
+  // Leaves text results as the host does: at most eight, whose deletion is counted.
   void AnswerTexts(const std::vector<std::string>& texts, unsigned resultKind = 1);
   // Whether the record is as `execute` must leave it, and nothing behind it was written.
   bool IsClean();
 
-  std::map<std::string, unsigned> functions = {{"f", 7}, {"g", 0}};  // others are unknown: 2000
-  std::function<void()> onCall;
-  std::function<void(const std::string& text)> onText;  // reports and traces
+  void** table;
   bool noContext = false;
-  unsigned char context[128];
-  static int liveTexts;
-
- private:
-  struct {
-    void** table;
-    RawHost* self;
-  } object;
+  unsigned char context[128] = {};
 };
+inline int liveTexts = 0;
 
 // Calls an operation of a table of the Microsoft ABI, such as the running engine's.
 template <class Result, class... Arguments>

@@ -42,9 +42,11 @@ struct MacroFunction {
 MacroResult GetLine(Document& document, const Values& values) {
   const std::string& text = document.Line(values.line);
   if (!PassesUnchanged(text))
-    throw WrongCall("get_line: line " + std::to_string(values.line) +
-                    " cannot be passed to a macro unchanged: it is longer than 1023 characters or "
-                    "holds bytes that the system's code page would change");
+    throw WrongCall("get_line: line " + std::to_string(values.line) + " has " +
+                    (text.size() >= kWideLimit
+                         ? std::to_string(text.size()) + " bytes, and a macro receives at most 1023"
+                         : "a byte from 0x80 to 0x9F, which the system's code page would change on "
+                           "its way to the macro (in UTF-8, capital umlauts and dashes have one)"));
   return text;
 }
 

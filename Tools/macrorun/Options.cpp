@@ -20,12 +20,14 @@ std::string Footer() {
          "insert_line also take the number after the last line.\n" +
          MacroFunctionHelp() +
          "A line feed in the text of write begins a new line. Texts: at most 511 characters\n"
-         "in, 1023 out; characters above U+00FF do not pass.\n"
+         "in, 1023 out; characters above U+00FF do not pass. A real arrives with six decimals:\n"
+         "convert it first. No dialogs: use message. What a function refuses ends the macro.\n"
          "A macro's source is read byte by byte, so UTF-8 in its texts is written as it\n"
          "stands.\n"
          "\n"
          "Exit codes: 0 success, 1 the macro failed, 2 wrong usage or\n"
-         "a file that cannot be read or written, 3 stopped by Ctrl+C, 4 fault.\n"
+         "a file that cannot be read or written, 3 stopped by Ctrl+C\n"
+         "(a macro that calls nothing: by a second one), 4 fault.\n"
          "Standard output is the document, and only after success.";
 }
 

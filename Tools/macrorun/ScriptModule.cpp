@@ -44,6 +44,7 @@ BOOL WINAPI OnConsoleEvent(DWORD event) {
   const std::lock_guard lock(killLock);
   const KillFunction kill = std::exchange(killRun, nullptr);
   if (!kill || !kill(1)) TerminateProcess(GetCurrentProcess(), kStopped);
+  std::fputs("macrorun: stopping at the macro's next call; Ctrl+C again ends it at once\n", stderr);
   return TRUE;
 }
 

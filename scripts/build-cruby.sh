@@ -1,0 +1,153 @@
+#!/usr/bin/env bash
+# SPDX-License-Identifier: MIT
+# Cross-builds CRuby for 32-bit Windows from Debian's source package, for the Ruby engine that is to
+# come, and prints the folder that holds it:
+#   include/   headers for embedding (ruby.h, ruby/config.h)
+#   lib/       libmsvcrt-ruby310.dll.a
+#   ruby/      what a Windows machine needs: bin, lib/ruby/3.1.0, licenses. It works wherever it is copied.
+#   samples/   the package's own test/ruby, sample and benchmark, and tool/lib, which the tests need
+# The folder is in a cache outside the build folder and appears in one rename, so it is whole or not
+# there. Changing this file makes another one. Call it before taking the build lock: it takes that itself.
+set -euo pipefail
+source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
+
+PACKAGES+=(ruby dpkg-dev)
+
+PACKAGE_VERSION=3.1.2-7+deb12u1
+VERSION=${PACKAGE_VERSION%%-*}
+API=3.1.0
+ARCH=i386-mingw32
+HOST=i686-w64-mingw32
+
+# Each needs a library that is not there for Windows, or serves none there.
+LEFT_OUT=openssl,readline,readline-ext,zlib,dbm,gdbm,fiddle,psych,pty,syslog,socket
+
+# Libraries that cannot load without those, and tools for developers at a console.
+UNUSABLE=(
+  bundled_gems.rb drb drb.rb ipaddr.rb net open-uri.rb psych psych.rb readline.rb resolv-replace.rb
+  resolv.rb rinda win32 yaml yaml.rb "$ARCH/win32"
+  bundler bundler.rb debug.rb irb irb.rb mkmf.rb rdoc rdoc.rb reline reline.rb un.rb
+)
+
+CACHE=${SCRIPTRUBY_CACHE:-$HOME/.cache/scriptruby}
+RECIPE=$(sha256sum <"${BASH_SOURCE[0]}")
+NAME=cruby-$VERSION-${RECIPE:0:12}
+RESULT=$CACHE/$NAME
+
+# A list of its own: the machine's sources stay as they are, and root is not needed.
+fetch_source() {
+  local codename mirror
+  codename=$(. /etc/os-release && printf %s "$VERSION_CODENAME")
+  mirror=$(apt-get indextargets --format '$(SITE)' "Codename: $codename" | head -n 1)
+  local apt=(
+    apt-get -o Dir::Etc::sourcelist="$WORK/source.list" -o Dir::Etc::sourceparts=-
+    -o Dir::State::lists="$WORK/lists" -o Dir::Cache::pkgcache= -o Dir::Cache::srcpkgcache=
+    -o APT::Sandbox::User=root -o APT::Update::Error-Mode=any
+  )
+  printf 'deb-src [signed-by=%s] %s %s main\n' /usr/share/keyrings/debian-archive-keyring.gpg \
+    "${mirror:-http://deb.debian.org/debian}" "$codename" >"$WORK/source.list"
+  mkdir -p "$WORK/lists/partial" &&
+    "${apt[@]}" update &&
+    "${apt[@]}" source "ruby3.1=$PACKAGE_VERSION" &&
+    mv "ruby3.1-$VERSION" source &&
+    touch source/configure && # newer than the patched configure.ac, so autoconf is not called for
+    rm -r source/ext/-test-
+}
+
+# The static libgcc leaves only system DLLs to import; the blank option drops debug information.
+configure_ruby() (
+  mkdir build && cd build &&
+    ../source/configure --build=x86_64-linux-gnu --host=$HOST --prefix=/ --with-baseruby=/usr/bin/ruby \
+      CC=$HOST-gcc-posix CXX=$HOST-g++-posix LDFLAGS=-static-libgcc optflags=-O2 debugflags= \
+      --enable-shared --disable-jit-support --disable-install-doc --without-gmp --with-out-ext=$LEFT_OUT
+)
+
+# The whole "install" fetches bundled gems from the network; these parts of it do not.
+install_ruby() {
+  make -C build DESTDIR="$WORK/installed" install-bin install-lib install-ext-comm install-ext-arch
+}
+
+collect_headers() {
+  local built=build/.ext/include/$ARCH/ruby
+  mkdir -p result/lib &&
+    cp -r source/include result/ &&
+    cp "$built/config.h" result/include/ruby/ &&
+    cp installed/lib/libmsvcrt-ruby310.dll.a result/lib/
+}
+
+collect_runtime() {
+  local ruby=result/ruby library=result/ruby/lib/ruby/$API
+  mkdir -p $ruby/bin "${library%/*}" &&
+    cp installed/bin/{ruby.exe,msvcrt-ruby310.dll} $ruby/bin/ &&
+    cp -r installed/lib/ruby/$API "$library" &&
+    (cd "$library" && rm -rf "${UNUSABLE[@]}") &&
+    find $ruby -regex '.*\.\(exe\|dll\|so\)' -exec $HOST-strip --strip-all {} +
+}
+
+# Parts of the compiler's and the C library's run-time are linked into every file.
+collect_licenses() {
+  local folder=result/ruby/licenses
+  mkdir $folder &&
+    cp source/{BSDL,COPYING,GPL,LEGAL} $folder/ &&
+    cp source/debian/copyright $folder/debian-copyright &&
+    cp /usr/share/doc/mingw-w64-common/copyright $folder/mingw-w64-copyright &&
+    cp /usr/share/doc/gcc-mingw-w64-base/copyright $folder/gcc-copyright
+}
+
+collect_samples() {
+  mkdir -p result/samples/{test,tool} &&
+    cp -r source/{sample,benchmark} result/samples/ &&
+    cp -r source/test/ruby result/samples/test/ &&
+    cp -r source/tool/lib result/samples/tool/
+}
+
+collect() {
+  collect_headers && collect_runtime && collect_licenses && collect_samples
+}
+
+# Everything that is shipped must load, and character tables must be there.
+check_runtime() {
+  timeout 300 wine result/ruby/bin/ruby.exe -W0 --disable-gems -r rbconfig -e '
+    folder = RbConfig::CONFIG["rubylibdir"]
+    names = Dir.children(folder).grep(/\.rb\z/) + Dir.glob("**/*.so", base: RbConfig::CONFIG["rubyarchdir"])
+    failed = names.reject do |name|
+      require name
+      true
+    rescue Exception => error
+      warn "#{name}: #{error.message}"
+    end
+    failed << "encodings" unless Encoding.list.size > 100 && "\u00fc".encode("Windows-1252").bytes == [252]
+    failed << "Unicode" unless "Gr\u00fc\u00dfe".upcase == "GR\u00dcSSE" && "\u6f22".match?(/\p{Han}/u)
+    abort "unusable: #{failed.join(" ")}" unless failed.empty?
+  '
+}
+
+# What an interrupted build left behind goes away; the lock says that nobody works there.
+build_ruby() {
+  rm -rf "$CACHE"/.cruby-*
+  WORK=$(mktemp -d "$CACHE/.$NAME.XXXXXX")
+  cd "$WORK"
+  step "fetching the source of CRuby $PACKAGE_VERSION" fetch_source
+  step "configuring CRuby" configure_ruby
+  step "building CRuby (some minutes)" make -C build -j "$(nproc)"
+  step "installing CRuby" install_ruby
+  step "collecting CRuby" collect
+  step "checking CRuby" check_runtime
+  chmod 755 result
+  mv -T result "$RESULT"
+  cd "$CACHE"
+  rm -rf "$WORK"
+}
+
+if [ ! -d "$RESULT" ]; then
+  [[ $CACHE != *[[:space:]]* ]] || die "CRuby cannot be built in a folder with a blank: set SCRIPTRUBY_CACHE"
+  mkdir -p "$BUILD" "$CACHE"
+  exec 9>"$BUILD/.lock"
+  flock 9
+  set_up
+  exec 9>"$CACHE/.lock"
+  flock 9
+  [ -d "$RESULT" ] || build_ruby
+  say "CRuby $VERSION: $(du -sh "$RESULT/ruby" | cut -f 1) for Windows in $RESULT"
+fi
+printf '%s\n' "$RESULT"
