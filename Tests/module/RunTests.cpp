@@ -42,10 +42,8 @@ TEST_F(RunTest, StepsThatFailAndDescriptions) {
   const std::string js = "Language=JScript\r\n";
   for (const std::string& lines :
        {""s, "Language=rubyscript"s, "Language=NoSuchEngine123456789"s, "Language="s,
-        js + "NoCase=1", js + "FixCRLF=yes\r\nFixDelimiter=-1",
-        js + "FixCRLF=1\r\nFixDelimiter=0"}) {
+        js + "NoCase=1", js + "FixCRLF=yes\r\nFixDelimiter=-1", js + "FixCRLF=1\r\nFixDelimiter=0"})
     Describe(lines), Run();
-  }
 }
 
 // Three levels. Each stop is called by one of them, before its inner run (0, 1, 2) or after it (3:
@@ -93,7 +91,7 @@ TEST_F(RunTest, MacroFiles) {
   for (wchar_t byte = 255; byte > 0; --byte) bytes += byte;
   for (const std::wstring& macro :
        {L""s, L"abc\r\n"s, bytes, std::wstring(50 * 1024 * 1024, 'x')}) {
-    Run(std::string(macro.begin(), macro.end()) + '\0' + "x");
+    WriteBytes(macroPath, std::string(macro.begin(), macro.end()) + '\0' + "x"), Run();
     EXPECT_TRUE(macro == source);
   }
 }
