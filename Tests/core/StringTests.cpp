@@ -24,6 +24,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"abc", [](String& s) { s.Append("d"); }, "abcd", 15, 8},
       {"abc", [](String& s) { s.Insert("123", 0), s.InsertChar('x', 0); }, "x123abc", 15, 8},
       {"abc", [](String& s) { s.Insert("12345", 0); }, "12345abc", 19, 8},
+      {"abc", [](String& s) { s.Insert("123", 0), FailAllocation(1), s.SetAt(6, 'x'); }, "123abc"},
       {"abc", [](String& s) { s.Format("%04d", 1); }, "0001", 10, 4},
       {"abc", [](String& s) { s.SetPadChar('*'), s.At(3), s.At(7); }, "abc ****"},
       {"abc", [](String& s) { s.ReplaceAll("b", "x"); }, "axc", 13, 16},

@@ -123,5 +123,11 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
     EXPECT_TRUE(profile.ReadString(value, "Options", "MacroBegin", "none", true));
     EXPECT_EQ(Bytes(value), expected) << "the key is removed by the first";
   }
+  profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick");
+  profile.ReadString(value, "Options", "Tick", "", false);
+  EXPECT_EQ(value.Length(), 511u);
+  EXPECT_TRUE(profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick"));
+  EXPECT_TRUE(profile.ReadString(value, "Options", "Tick", "", false));
+  EXPECT_EQ(value.Length(), 511u);
   DeleteFileA(path.c_str());
 }

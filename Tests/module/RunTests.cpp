@@ -89,9 +89,9 @@ TEST_F(RunTest, MacroFiles) {
   // Byte for byte up to the first NUL, as the C runtime's plain locale has it.
   std::wstring bytes;
   for (wchar_t byte = 255; byte > 0; --byte) bytes += byte;
-  for (const std::wstring& macro :
-       {L""s, L"abc\r\n"s, bytes, std::wstring(50 * 1024 * 1024, 'x')}) {
-    WriteBytes(macroPath, std::string(macro.begin(), macro.end()) + '\0' + "x"), Run();
-    EXPECT_TRUE(macro == source);
-  }
+  for (const std::wstring& macro : {L""s, L"abc\r\n"s, bytes, std::wstring(50 * 1024 * 1024, 'x')})
+    for (const std::string& tail : {""s, "\0x"s}) {
+      WriteBytes(macroPath, std::string(macro.begin(), macro.end()) + tail), Run();
+      EXPECT_TRUE(macro == source);
+    }
 }
