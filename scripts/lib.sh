@@ -98,8 +98,10 @@ set_up() {
 }
 
 # Keeps Wine's server for a minute after its last program: starting it takes longer than a macro does.
+# The first program starts Wine's services, which keep its output open: that must be no caller's pipe.
 start_wine() {
   wineserver -p60 >/dev/null 2>&1 </dev/null || true # it is running already
+  wine cmd /c exit >/dev/null 2>&1 </dev/null || true
 }
 
 # build_release [TARGET...]: configures when that is due, and builds.
