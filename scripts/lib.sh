@@ -104,24 +104,29 @@ start_wine() {
   wine cmd /c exit >/dev/null 2>&1 </dev/null || true
 }
 
-# build_release [TARGET...]: configures when that is due, and builds.
+# build_release CRUBY [TARGET...]: configures with that CRuby when it is due, and builds.
 build_release() {
-  local made=$BUILD/release/build.ninja
+  local cruby=$1 made=$BUILD/release/build.ninja
+  shift
   if ! [ "$made" -nt "$ROOT/CMakePresets.json" ] ||
-    ! [ "$made" -nt "$ROOT/cmake/i686-w64-mingw32-clang.cmake" ]; then
-    step "configuring" cmake -S "$ROOT" --preset release --fresh
+    ! [ "$made" -nt "$ROOT/cmake/i686-w64-mingw32-clang.cmake" ] ||
+    ! grep -qxF "SCRIPTRUBY_CRUBY:PATH=$cruby" "$BUILD/release/CMakeCache.txt"; then
+    step "configuring" cmake -S "$ROOT" --preset release --fresh "-DSCRIPTRUBY_CRUBY=$cruby"
   fi
   ninja -C "$BUILD/release" -n "$@" 2>/dev/null | grep -q 'no work to do' ||
     step "building" cmake --build "$BUILD/release" ${1:+--target "$@"}
 }
 
-# prepare [TARGET...]: set-up, build and Wine's server; one process at a time.
+# prepare [TARGET...]: set-up, build and Wine's server; one process at a time. CRuby comes first, since
+# its script takes the lock itself.
 prepare() {
+  local cruby
+  cruby=$("$ROOT/scripts/build-cruby.sh")
   mkdir -p "$BUILD"
   exec 9>"$BUILD/.lock"
   flock 9
   set_up
-  build_release "$@"
+  build_release "$cruby" "$@"
   exec 9>&-
   start_wine
 }

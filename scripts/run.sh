@@ -10,5 +10,5 @@ source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 [ $# -gt 0 ] || STATUS=2 die "usage: scripts/run.sh [OPTION...] MACRO [FILE]"
 
-prepare macrorun scriptruby
+prepare macrorun scriptruby rubyscript
 exec wine "$BUILD/release/bin/macrorun.exe" "$@"

@@ -3,7 +3,7 @@
 
 #include <windows.h>
 
-#include "iLib/iComText.h"
+#include <algorithm>
 
 namespace {
 
@@ -46,12 +46,12 @@ std::optional<std::filesystem::path> AnsiNamed(const std::filesystem::path& path
 
 std::string ToAnsi(const std::filesystem::path& path) { return Narrow(path.wstring(), GetACP()); }
 
-bool PassesUnchanged(const std::string& text) {
+std::size_t WideLength(const std::string& text) { return Widen(text, CP_ACP).size(); }
+
+bool LowBytesStay(const std::string& text) {
   const std::wstring wide = Widen(text, CP_ACP);
-  if (wide.size() > kWideLimit - 1 || wide.size() != text.size()) return false;
-  for (std::size_t i = 0; i < wide.size(); ++i)
-    if (text[i] == '\0' || static_cast<char>(wide[i]) != text[i]) return false;
-  return true;
+  return std::equal(wide.begin(), wide.end(), text.begin(), text.end(),
+                    [](wchar_t unit, char byte) { return static_cast<char>(unit) == byte; });
 }
 
 std::string SystemMessage(unsigned long code) {

@@ -16,9 +16,10 @@ std::string WideToUtf8(std::wstring_view text);
 std::optional<std::filesystem::path> AnsiNamed(const std::filesystem::path& path);
 std::string ToAnsi(const std::filesystem::path& path);
 
-// Whether a text that the module hands to a script as a result, and takes back as an argument, is
-// still the same bytes.
-bool PassesUnchanged(const std::string& text);
+// The module widens a text for a script by the system's ANSI code page: to how many UTF-16 units, and
+// whether their low bytes, which it takes when the script hands the text back, are the same text.
+std::size_t WideLength(const std::string& text);
+bool LowBytesStay(const std::string& text);
 
 // The system's text for an error code, without its line end.
 std::string SystemMessage(unsigned long code);

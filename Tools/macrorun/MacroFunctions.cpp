@@ -39,17 +39,6 @@ struct MacroFunction {
   MacroResult (*run)(Document& document, const Values& values);
 };
 
-MacroResult GetLine(Document& document, const Values& values) {
-  const std::string& text = document.Line(values.line);
-  if (!PassesUnchanged(text))
-    throw WrongCall("get_line: line " + std::to_string(values.line) + " has " +
-                    (text.size() >= kWideLimit
-                         ? std::to_string(text.size()) + " bytes, and a macro receives at most 1023"
-                         : "a byte from 0x80 to 0x9F, which the system's code page would change on "
-                           "its way to the macro (in UTF-8, capital umlauts and dashes have one)"));
-  return text;
-}
-
 const MacroFunction kFunctions[] = {
     {"write",
      {{"text", Kind::kText}},
@@ -64,7 +53,12 @@ const MacroFunction kFunctions[] = {
      [](Document& document, const Values&) -> MacroResult {
        return static_cast<std::int32_t>(document.LineCount());
      }},
-    {"get_line", {{"line", Kind::kLine}}, "the text of a line, without its line end", GetLine},
+    {"get_line",
+     {{"line", Kind::kLine}},
+     "the text of a line, without its line end",
+     [](Document& document, const Values& values) -> MacroResult {
+       return document.Line(values.line);
+     }},
     {"set_line",
      {{"line", Kind::kLine}, {"text", Kind::kLineText}},
      "replaces the text of a line",
@@ -175,6 +169,26 @@ Values CheckArguments(const MacroFunction& function, const Document& document,
   return values;
 }
 
+// Why a macro would not receive this text as it is; empty when it would.
+std::string Hindrance(const std::string& text, TextPassage passage) {
+  const std::size_t length = WideLength(text);
+  if (length >= kWideLimit)
+    return std::to_string(length) + " characters, and a macro receives at most 1023";
+  if (text.find('\0') != text.npos) return "a zero byte, which would end it";
+  if (passage == TextPassage::kBytes || LowBytesStay(text)) return {};
+  return "a byte from 0x80 to 0x9F, which the system's code page would change on its way to the "
+         "macro (in UTF-8, capital umlauts and dashes have one)";
+}
+
+void CheckResult(const MacroFunction& function, std::size_t line, const MacroResult& result,
+                 TextPassage passage) {
+  const std::string* text = std::get_if<std::string>(&result);
+  const std::string hindrance = text ? Hindrance(*text, passage) : "";
+  if (hindrance.empty()) return;
+  throw WrongCall(std::string(function.name) + ": line " + std::to_string(line) + " has " +
+                  hindrance);
+}
+
 }  // namespace
 
 std::uint32_t MacroFunctionId(std::string_view name) {
@@ -189,11 +203,14 @@ std::uint32_t MacroFunctionId(std::string_view name) {
 }
 
 MacroResult CallMacroFunction(std::uint32_t id, Document& document,
-                              std::span<const HostArgument> arguments) {
+                              std::span<const HostArgument> arguments, TextPassage passage) {
   if (id < 1 || id > std::size(kFunctions))
     throw WrongCall("call of macro function " + std::to_string(id) + ", which does not exist");
   const MacroFunction& function = kFunctions[id - 1];
-  return function.run(document, CheckArguments(function, document, arguments));
+  const Values values = CheckArguments(function, document, arguments);
+  MacroResult result = function.run(document, values);
+  CheckResult(function, values.line, result, passage);
+  return result;
 }
 
 std::string MacroFunctionHelp() {

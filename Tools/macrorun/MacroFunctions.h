@@ -8,8 +8,9 @@
 // A text that cannot pass between macro and host unchanged makes the call fail instead of changing
 // the document: the module cuts a text argument at 512 characters and a text result at 1023, and
 // widens results by the system's ANSI code page but narrows arguments by dropping high bytes, so
-// some bytes (0x80 to 0x9F in Western code pages) would come back as others. What cannot be seen
-// from here is a character above U+00FF in an argument: the module has already narrowed it.
+// some bytes (0x80 to 0x9F in Western code pages) would come back as others unless the engine undoes
+// the widening. What cannot be seen from here is a character above U+00FF in an argument: the module
+// has already narrowed it.
 #pragma once
 
 #include <cstdint>
@@ -34,9 +35,16 @@ using MacroResult = std::variant<std::int32_t, std::string>;
 // none. Never 0, which engines call for an object's default value.
 std::uint32_t MacroFunctionId(std::string_view name);
 
+// How a script engine shows its macros a text result, which it gets in UTF-16 by the system's ANSI
+// code page.
+enum class TextPassage {
+  kCharacters,  // as that UTF-16
+  kBytes,       // as the bytes that the host gave
+};
+
 // Carries out function `id`. Throws WrongCall. `message` writes to standard error.
 MacroResult CallMacroFunction(std::uint32_t id, Document& document,
-                              std::span<const HostArgument> arguments);
+                              std::span<const HostArgument> arguments, TextPassage passage);
 
 // One line for each function.
 std::string MacroFunctionHelp();

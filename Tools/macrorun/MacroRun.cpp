@@ -7,6 +7,7 @@
 #include <string_view>
 #include <vector>
 
+#include "EngineManifest.h"
 #include "HostLink.h"
 #include "MacroFunctions.h"
 #include "xLib/xTexts.h"
@@ -15,7 +16,8 @@ namespace {
 
 class MacroRun {
  public:
-  MacroRun(Document& text, bool traceLines) : document(text), trace(traceLines) {
+  MacroRun(Document& text, TextPassage textPassage, bool traceLines)
+      : document(text), passage(textPassage), trace(traceLines) {
     const HostCallbacks callbacks = {this, OnReport, OnTrace, OnFunctionId, OnCall};
     link.reset(CreateHostLink(&callbacks));
     if (!link) throw std::bad_alloc();
@@ -48,6 +50,7 @@ class MacroRun {
   void SetResult(const MacroResult& result);
 
   Document& document;
+  const TextPassage passage;
   const bool trace;
   bool scriptError = false;
   bool faulted = false;
@@ -66,7 +69,7 @@ bool MacroRun::Call(std::uint32_t id) noexcept try {
   std::vector<HostArgument> arguments;
   for (std::uint32_t i = 0; i < HostLinkArgumentCount(link.get()); ++i)
     arguments.push_back(HostLinkArgument(link.get(), i));
-  SetResult(CallMacroFunction(id, document, arguments));
+  SetResult(CallMacroFunction(id, document, arguments, passage));
   return true;
 } catch (const std::exception& error) {
   std::fprintf(stderr, "macrorun: %s\n", error.what());
@@ -85,5 +88,8 @@ void MacroRun::SetResult(const MacroResult& result) {
 
 ExitCode RunMacro(ScriptModule& module, const std::filesystem::path& macro, Document& document,
                   bool trace) {
-  return MacroRun(document, trace).Run(module, macro);
+  if (!module.RunsRuby())
+    return MacroRun(document, TextPassage::kCharacters, trace).Run(module, macro);
+  const EngineManifest manifest;
+  return MacroRun(document, TextPassage::kBytes, trace).Run(module, macro);
 }

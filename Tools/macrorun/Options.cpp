@@ -20,8 +20,9 @@ std::string Footer() {
          "insert_line also take the number after the last line.\n" +
          MacroFunctionHelp() +
          "A line feed in the text of write begins a new line. Texts: at most 511 characters\n"
-         "in, 1023 out; characters above U+00FF do not pass. A real arrives with six decimals:\n"
-         "convert it first. No dialogs: use message. What a function refuses ends the macro.\n"
+         "in, 1023 out. Ruby's pass as bytes; of other languages, characters above U+00FF do\n"
+         "not pass. A real arrives with six decimals: convert it first. No dialogs: use\n"
+         "message. What a function refuses ends the macro.\n"
          "A macro's source is read byte by byte, so UTF-8 in its texts is written as it\n"
          "stands.\n"
          "\n"

@@ -171,3 +171,6 @@ std::string ScriptModule::Description() {
   if (!As<VersionFunction>(Export("version"))(&record, "")) return {};
   return record.description;
 }
+
+// The module's name for a language begins with the engine's.
+bool ScriptModule::RunsRuby() { return Description().starts_with("RubyScript "); }

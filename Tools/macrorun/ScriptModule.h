@@ -43,6 +43,7 @@ class ScriptModule {
 
   // The name of the module's language; empty when the module refuses to tell.
   std::string Description();
+  bool RunsRuby();
 
  private:
   std::filesystem::path CopyPrivately(const std::filesystem::path& file,

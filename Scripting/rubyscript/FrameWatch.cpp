@@ -1,0 +1,76 @@
+// SPDX-License-Identifier: MIT
+#include "FrameWatch.h"
+
+#include <stdint.h>
+
+// The thread's chain of handlers begins at the start of its information block.
+static void* ChainHead() { return reinterpret_cast<void*>(__readfsdword(0)); }
+static void SetChainHead(void* record) { __writefsdword(0, reinterpret_cast<DWORD>(record)); }
+static void* const kEmptyChain = reinterpret_cast<void*>(UINT32_MAX);
+
+static constexpr DWORD kUnwinding = EXCEPTION_UNWINDING | EXCEPTION_EXIT_UNWIND;
+
+// --- FrameWatch ----------------------------------------------------------------------------------
+
+FrameWatch::FrameWatch(void (*callback)(void*), void* callbackContext)
+    : record{static_cast<Record*>(ChainHead()), Handle},
+      discarded(callback),
+      context(callbackContext) {
+  SetChainHead(&record);
+}
+
+FrameWatch::~FrameWatch() { SetChainHead(record.next); }
+
+EXCEPTION_DISPOSITION FrameWatch::Handle(EXCEPTION_RECORD* exception, void* frame, CONTEXT*,
+                                         void*) {
+  if (exception->ExceptionFlags & kUnwinding) {
+    FrameWatch& watch = *static_cast<FrameWatch*>(frame);
+    watch.discarded(watch.context);
+  }
+  return ExceptionContinueSearch;
+}
+
+// --- FaultBase -----------------------------------------------------------------------------------
+
+static FaultBase* base = nullptr;
+
+FaultBase::FaultBase(EXCEPTION_RECORD& target, void (*landing)())
+    : record{static_cast<Record*>(ChainHead()), Handle},
+      fault(target),
+      land(landing),
+      thread(GetCurrentThreadId()) {
+  base = this;
+  SetChainHead(&record);
+  AddVectoredExceptionHandler(FALSE, HandleEmptyChain);
+}
+
+// Errors and the compilers' language-level exceptions; not messages to a debugger, nor guard pages.
+static bool IsFault(DWORD code) { return code >= 0xC0000000; }
+
+// The rest of the frame that holds the base is of no use any more: the landing takes its place.
+bool FaultBase::Take(const EXCEPTION_RECORD& exception, CONTEXT& state) {
+  if (!active || !IsFault(exception.ExceptionCode)) return false;
+  active = false;
+  fault = exception;
+  constexpr uintptr_t kBelowFrame = 1024;  // keeps clear of this object and its neighbours
+  const uintptr_t stack = (reinterpret_cast<uintptr_t>(this) - kBelowFrame) & ~uintptr_t{15};
+  state.Esp = static_cast<DWORD>(stack - sizeof(void*));  // as after a call instruction
+  state.Eip = reinterpret_cast<DWORD>(land);
+  SetChainHead(&record);
+  return true;
+}
+
+EXCEPTION_DISPOSITION FaultBase::Handle(EXCEPTION_RECORD* exception, void*, CONTEXT* context,
+                                        void*) {
+  if (exception->ExceptionFlags & kUnwinding) return ExceptionContinueSearch;
+  return base->Take(*exception, *context) ? ExceptionContinueExecution : ExceptionContinueSearch;
+}
+
+// The interpreter's own fibers begin with an empty chain, so no record would be asked.
+LONG FaultBase::HandleEmptyChain(EXCEPTION_POINTERS* exception) {
+  if (GetCurrentThreadId() != base->thread || ChainHead() != kEmptyChain)
+    return EXCEPTION_CONTINUE_SEARCH;
+  return base->Take(*exception->ExceptionRecord, *exception->ContextRecord)
+             ? EXCEPTION_CONTINUE_EXECUTION
+             : EXCEPTION_CONTINUE_SEARCH;
+}

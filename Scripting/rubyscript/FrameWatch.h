@@ -1,0 +1,61 @@
+// SPDX-License-Identifier: MIT
+// Two records for the system's chain of exception handlers, in assembler's reach only on 32-bit x86:
+// one tells that a frame of the host's stack was discarded, the other keeps a fault on the
+// interpreter's stack from ending the process. Both are plain members of a frame: they work for
+// structured exceptions and for the C library's longjmp, which unwinds the same chain.
+//
+// Threading: a record belongs to the thread and the stack it was made on.
+#pragma once
+
+#include <windows.h>
+
+// Calls `discarded(context)` when its frame is left by a fault that an outer frame has caught, or by
+// a jump. The call is made on top of the discarded frames, before they are gone; it must return.
+class FrameWatch {
+ public:
+  FrameWatch(void (*discarded)(void*), void* context);
+  ~FrameWatch();
+  FrameWatch(const FrameWatch&) = delete;
+  FrameWatch& operator=(const FrameWatch&) = delete;
+
+ private:
+  static EXCEPTION_DISPOSITION __cdecl Handle(EXCEPTION_RECORD* record, void* frame,
+                                              CONTEXT* context, void* dispatcher);
+  struct Record {
+    Record* next;
+    decltype(&Handle) handle;
+  };
+  Record record;  // first: the chain's records are found by their own address
+  void (*discarded)(void*);
+  void* context;
+};
+
+// The outermost frame of the interpreter's stack. A fault that nothing above it handles is copied
+// to `fault`, and the thread goes on in `land`, on this frame's stack; all above it is lost. Also
+// takes faults on stacks that the interpreter made itself, whose chains are empty.
+class FaultBase {
+ public:
+  // One at a time in a process. `land` must not return.
+  FaultBase(EXCEPTION_RECORD& fault, void (*land)());
+  FaultBase(const FaultBase&) = delete;
+  FaultBase& operator=(const FaultBase&) = delete;
+
+  // Whether the thread runs on the interpreter's side; outside of it nothing is taken.
+  void SetActive(bool value) { active = value; }
+
+ private:
+  static EXCEPTION_DISPOSITION __cdecl Handle(EXCEPTION_RECORD* record, void* frame,
+                                              CONTEXT* context, void* dispatcher);
+  static LONG CALLBACK HandleEmptyChain(EXCEPTION_POINTERS* exception);
+  bool Take(const EXCEPTION_RECORD& record, CONTEXT& context);
+
+  struct Record {
+    Record* next;
+    decltype(&Handle) handle;
+  };
+  Record record;
+  EXCEPTION_RECORD& fault;
+  void (*land)();
+  DWORD thread;
+  bool active = true;
+};

@@ -1,0 +1,65 @@
+// SPDX-License-Identifier: MIT
+// The process-wide state that belongs to the host and that CRuby or a script may change: a snapshot
+// of it is taken before a run and put back after it. It covers the locale, the signal handlers and
+// the modes of the standard streams of msvcrt, the error mode, the current directory and the
+// environment. The floating-point control words are switched elsewhere, with the fibers.
+//
+// The variables that CRuby adds to the environment when it starts (HOME and the like) are for
+// scripts only. The order of calls is therefore, where CRuby is started,
+//     Save, start CRuby, KeepAdditions, Restore
+// and in each run
+//     Save, ApplyAdditions, run, Restore,
+// where ApplyAdditions goes to the object that has kept them and the others to any.
+//
+// Ownership: the object owns its copies. It is plain memory, free to live on any stack or fiber.
+// Errors: none are reported. What cannot be saved, for want of memory or because it does not exist (a
+// closed stream), is left alone by Restore; what cannot be put back (a directory that has been
+// deleted) stays as it is.
+// Threading: the thread of the run; Save and Restore on the same fiber, as msvcrt may keep the
+// handlers of hardware faults by fiber. Other threads may see the intermediate states.
+#pragma once
+
+#include <signal.h>
+
+class HostProcess {
+ public:
+  HostProcess() = default;
+  HostProcess(const HostProcess&) = delete;
+  HostProcess& operator=(const HostProcess&) = delete;
+  ~HostProcess();
+
+  // Replaces the snapshot by the present state.
+  void Save();
+
+  // Puts the state back as the snapshot has it. The snapshot stays. Nothing without one.
+  //
+  // Of the environment, the block of the process is compared and, where it differs, written through
+  // to msvcrt's copy. Two differences cannot be seen or mended so: one in msvcrt's copy alone, and
+  // a variable with an empty value, which msvcrt regards as missing once it has been put back.
+  void Restore() const;
+
+  // Remembers the environment's variables that the snapshot does not have, instead of those
+  // remembered before.
+  void KeepAdditions();
+  // Sets what KeepAdditions has remembered, except variables that the environment has by now.
+  void ApplyAdditions() const;
+
+ private:
+  static constexpr int kSignals[] = {SIGINT, SIGILL, SIGFPE, SIGSEGV, SIGTERM, SIGBREAK, SIGABRT};
+  static constexpr int kSignalCount = sizeof kSignals / sizeof *kSignals;
+  static constexpr int kStreams = 3;  // standard input, output and error: descriptors 0 to 2
+
+  void Forget();
+  void RestoreEnvironment() const;
+
+  bool saved = false;
+  unsigned errorMode = 0;
+  char* locale = nullptr;
+  __p_sig_fn_t handlers[kSignalCount] = {};  // SIG_ERR: unknown
+  int modes[kStreams] = {};                  // -1: closed
+  wchar_t* directory = nullptr;
+  // Lines NAME=value, each terminated, and an empty one. A line is written to for the moment in which
+  // its name alone is needed.
+  wchar_t* environment = nullptr;
+  wchar_t* additions = nullptr;
+};

@@ -1,0 +1,242 @@
+// SPDX-License-Identifier: MIT
+#include "Interpreter.h"
+
+#include "FrameWatch.h"
+#include "Interrupter.h"
+#include "RubyRuntime.h"
+
+namespace {
+
+// A task that the interpreter is running, on its stack; a nested one points to the outer one.
+struct Entry {
+  RubyTask* task;
+  Entry* outer;
+  const void* hostFrame;  // address in the frame of Enter; stacks grow downwards
+  bool abandoned = false;
+  bool interrupted = false;
+  bool interruptible = false;
+  bool leaving = false;  // its Ruby code is being unwound
+};
+
+// What the side that switches tells the other one.
+enum class Message { kStart, kBegin, kResume, kFinished, kCall };
+
+// Of x87 and of SSE: rounding, precision and exception masks belong to each side alone.
+struct FloatControl {
+  unsigned short x87;
+  unsigned int sse;
+};
+
+constexpr FloatControl kRubyFloatControl = {0x037F, 0x1F80};  // extended precision, all masked
+
+struct State {
+  DWORD thread = 0;
+  void* rubyFiber = nullptr;
+  void* hostFiber = nullptr;  // of the latest switch; a host may use fibers itself
+  bool started = false;
+  Message message = Message::kStart;
+  RubyTask* task = nullptr;         // of kBegin
+  const void* hostFrame = nullptr;  // of kBegin
+  HostCall* call = nullptr;         // of kCall
+  Entry* innermost = nullptr;
+  EXCEPTION_RECORD fault = {};
+  FaultBase* faultBase = nullptr;
+  // Guards `innermost` and its chain, for Interrupt; changed by the interpreter's thread alone.
+  SRWLOCK lock = SRWLOCK_INIT;
+};
+
+State state;
+
+FloatControl CurrentFloatControl() {
+  FloatControl control;
+  asm volatile("fnstcw %0" : "=m"(control.x87));
+  asm volatile("stmxcsr %0" : "=m"(control.sse));
+  return control;
+}
+
+void SetFloatControl(const FloatControl& control) {
+  asm volatile("fldcw %0" : : "m"(control.x87));
+  asm volatile("ldmxcsr %0" : : "m"(control.sse));
+}
+
+// --- Ruby side -----------------------------------------------------------------------------------
+
+void SwitchToHost(Message message) {
+  state.message = message;
+  state.faultBase->SetActive(false);
+  SwitchToFiber(state.hostFiber);
+  state.faultBase->SetActive(true);
+  SetFloatControl(kRubyFloatControl);
+}
+
+void SetInnermost(Entry* entry) {
+  AcquireSRWLockExclusive(&state.lock);
+  state.innermost = entry;
+  ReleaseSRWLockExclusive(&state.lock);
+}
+
+void RunTask() {
+  Entry entry = {state.task, state.innermost, state.hostFrame};
+  SetInnermost(&entry);
+  entry.task->Run();
+  SetInnermost(entry.outer);
+}
+
+// Does what the host asks until it resumes the pending call. Without one it never returns.
+void Serve(Message answer) {
+  for (;;) {
+    SwitchToHost(answer);
+    if (state.message == Message::kResume) return;
+    RunTask();
+    answer = Message::kFinished;
+  }
+}
+
+[[noreturn]] void Land() {
+  for (;;) SwitchToFiber(state.hostFiber);
+}
+
+void CALLBACK RunFiber(void*) {
+  FaultBase base(state.fault, Land);
+  state.faultBase = &base;
+  SetFloatControl(kRubyFloatControl);
+  state.started = StartRuby();
+  Serve(Message::kFinished);
+}
+
+// --- Host side -----------------------------------------------------------------------------------
+
+void SwitchToRuby(Message message) {
+  const FloatControl control = CurrentFloatControl();
+  state.message = message;
+  state.hostFiber = GetCurrentFiber();
+  SwitchToFiber(state.rubyFiber);
+  SetFloatControl(control);
+}
+
+// The task of an entry whose frame of Enter is gone, or is about to be.
+void Abandon(Entry* entry) {
+  RubyTask* const task = entry->task;
+  entry->abandoned = true;
+  Interrupter::Wake();             // in case its `ensure` blocks do not end by themselves
+  SwitchToRuby(Message::kResume);  // ends the task: it can make no further call
+  if (!Interpreter::LostTo()) delete task;
+}
+
+// Inner frames are older victims of the same jump.
+void AbandonUpTo(Entry* last) {
+  while (state.innermost && !Interpreter::LostTo()) {
+    Entry* const entry = state.innermost;
+    Abandon(entry);
+    if (entry == last) break;
+  }
+}
+
+void OnFrameDiscarded(void* entry) {
+  for (Entry* each = state.innermost; each; each = each->outer)
+    if (each == entry) return AbandonUpTo(each);
+}
+
+// For hosts whose jumps do not unwind: on one stack, a frame further in than this one is dead.
+void AbandonDeadEntries(const void* frame) {
+  const NT_TIB& stack = *reinterpret_cast<NT_TIB*>(NtCurrentTeb());
+  while (state.innermost && !Interpreter::LostTo() && state.innermost->hostFrame < frame &&
+         state.innermost->hostFrame >= stack.StackLimit)
+    Abandon(state.innermost);
+}
+
+HRESULT CreateRubyFiber() {
+  if (!IsThreadAFiber() && !ConvertThreadToFiber(nullptr)) return E_OUTOFMEMORY;
+  constexpr SIZE_T kCommitted = 64 * 1024;
+  constexpr SIZE_T kReserved = 16 * 1024 * 1024;  // deep recursion of macros takes place here
+  state.rubyFiber = CreateFiberEx(kCommitted, kReserved, 0, RunFiber, nullptr);
+  if (!state.rubyFiber) return E_OUTOFMEMORY;
+  state.thread = GetCurrentThreadId();
+  return S_OK;
+}
+
+[[noreturn]] void RaiseFault() {
+  const EXCEPTION_RECORD& fault = state.fault;
+  RaiseException(fault.ExceptionCode, fault.ExceptionFlags & EXCEPTION_NONCONTINUABLE,
+                 fault.NumberParameters, fault.ExceptionInformation);
+  __builtin_trap();  // a handler that continues has nothing to go on with
+}
+
+}  // namespace
+
+bool Interpreter::HasStarted() { return state.rubyFiber != nullptr; }
+
+DWORD Interpreter::LostTo() { return state.fault.ExceptionCode; }
+
+HRESULT Interpreter::Start() {
+  if (LostTo()) return E_ABORT;
+  if (state.rubyFiber) {
+    if (GetCurrentThreadId() != state.thread) return RPC_E_WRONG_THREAD;
+    if (!state.started) return E_FAIL;
+    return IsThreadAFiber() || ConvertThreadToFiber(nullptr) ? S_OK : E_OUTOFMEMORY;
+  }
+  const HRESULT result = CreateRubyFiber();
+  if (FAILED(result)) return result;
+  SwitchToRuby(Message::kStart);
+  if (LostTo()) RaiseFault();
+  return state.started ? S_OK : E_FAIL;
+}
+
+HRESULT Interpreter::Enter(RubyTask* task) {
+  AbandonDeadEntries(&task);
+  if (LostTo()) return E_ABORT;
+  state.task = task;
+  state.hostFrame = &task;
+  SwitchToRuby(Message::kBegin);
+  for (;;) {
+    if (LostTo()) RaiseFault();
+    if (state.message == Message::kFinished) return S_OK;
+    Entry* const entry = state.innermost;
+    {
+      FrameWatch watch(OnFrameDiscarded, entry);
+      state.call->Run();
+    }
+    // A run that was nested into the call may have lost the interpreter; or a host with fibers of
+    // its own has left one there that is not done, and only the innermost can go on.
+    if (LostTo() || state.innermost != entry) return E_ABORT;
+    SwitchToRuby(Message::kResume);
+  }
+}
+
+void Interpreter::Interrupt(const void* owner) {
+  bool found = false;
+  AcquireSRWLockExclusive(&state.lock);
+  for (Entry* each = state.innermost; each && !found; each = each->outer) {
+    if (each->task->owner != owner) continue;
+    each->interrupted = true;
+    found = true;
+  }
+  ReleaseSRWLockExclusive(&state.lock);
+  if (found) Interrupter::Wake();
+}
+
+bool Interpreter::CallHost(HostCall& call) {
+  if (MustEnd()) return false;
+  state.call = &call;
+  Serve(Message::kCall);
+  return !MustEnd();
+}
+
+bool Interpreter::MustEnd() {
+  const Entry* const entry = state.innermost;
+  return !entry || entry->abandoned || entry->interrupted;
+}
+
+Interpreter::Urgency Interpreter::InterruptDue() {
+  const Entry* const entry = state.innermost;
+  if (!entry || !entry->interruptible || !MustEnd()) return Urgency::kNone;
+  return entry->leaving || entry->abandoned ? Urgency::kAfterGrace : Urgency::kNow;
+}
+
+void Interpreter::SetInterruptible(bool value) { state.innermost->interruptible = value; }
+
+void Interpreter::SetLeaving() { state.innermost->leaving = true; }
+
+bool Interpreter::IsMainThread() { return GetCurrentThreadId() == state.thread; }
+
+const void* Interpreter::Owner() { return state.innermost->task->owner; }

@@ -1,0 +1,81 @@
+// SPDX-License-Identifier: MIT
+// The one Ruby interpreter of the process. It lives on a fiber of the first thread that needs it: the
+// same thread as the host's code, but a stack of its own, so a host that leaves its frames by a jump
+// or a fault discards none of Ruby's.
+//
+//   host's stack                                interpreter's stack
+//   Enter(task)  ------------------------------>  task.Run()
+//     call.Run()  <-----------------------------    CallHost(call)
+//       ... perhaps Enter(another task)  ------>      another task.Run()
+//     returns  -------------------------------->    goes on
+//   returns  <----------------------------------  is done
+//
+// When the host discards the frame of a call, the pending CallHost answers false, the task unwinds
+// its Ruby code (`ensure` blocks run, but no further call is made) and is deleted.
+//
+// Threading: everything is called on the interpreter's thread, except Interrupt and HasStarted. "Host
+// side" functions are called on the host's stack, "Ruby side" ones on the interpreter's.
+// Errors: as given at each function. A fault inside the interpreter leaves it lost for good.
+#pragma once
+
+#include <windows.h>
+
+// A piece of work for the interpreter. Allocated with new; Enter says who deletes it.
+class RubyTask {
+ public:
+  explicit RubyTask(const void* taskOwner) : owner(taskOwner) {}
+  virtual ~RubyTask() = default;
+  RubyTask(const RubyTask&) = delete;
+  RubyTask& operator=(const RubyTask&) = delete;
+  // Ruby side. No Ruby exception may leave it.
+  virtual void Run() = 0;
+
+  const void* const owner;  // what Interrupt names; never used as an address
+};
+
+// A call out of the interpreter, made on the host's stack. It lives in a frame of the Ruby side.
+class HostCall {
+ public:
+  virtual void Run() = 0;
+
+ protected:
+  ~HostCall() = default;
+};
+
+class Interpreter {
+ public:
+  // Any thread. Once started the interpreter cannot be ended: its DLL stays in the process.
+  static bool HasStarted();
+
+  // Host side. Starts the interpreter when this is the first use. RPC_E_WRONG_THREAD: it lives on
+  // another thread. E_OUTOFMEMORY: a later try may start it. E_FAIL: it does not start. E_ABORT: lost.
+  static HRESULT Start();
+  // Host side, after a successful Start: runs the task and serves its calls. S_OK: it has run and is
+  // the caller's to delete; E_ABORT: it cannot go on, and is not the caller's any more. Raises the fault of an
+  // interpreter that gets lost, as a structured exception of the same code. If the caller's frame is
+  // discarded, the task is deleted.
+  static HRESULT Enter(RubyTask* task);
+  // Host side. The exception code that lost the interpreter; 0 while it is whole.
+  static DWORD LostTo();
+  // Any thread. Ends what runs for the owner: within a few milliseconds when it is in Ruby code, at
+  // the call's return when it is in a call of the host.
+  static void Interrupt(const void* owner);
+
+  // Ruby side. False: the host has discarded the call's frame or asks for the end; then, or when
+  // MustEnd answers true, the caller frees what it holds and calls Leave.
+  static bool CallHost(HostCall& call);
+  // Ruby side. Whether the innermost task is to end without making further calls.
+  static bool MustEnd();
+  // Ruby side. Whether the innermost task runs code that Interrupt may end now; false while the
+  // engine prepares or tidies. Begins as false with each task.
+  static void SetInterruptible(bool value);
+  // Ruby side. The innermost task has begun to unwind its Ruby code.
+  static void SetLeaving();
+  // Ruby side, any thread of Ruby's: whether what runs now is to be interrupted.
+  enum class Urgency { kNone, kNow, kAfterGrace };
+  static Urgency InterruptDue();
+  // Ruby side. Of the innermost task.
+  static const void* Owner();
+  // Ruby side, any thread of Ruby's. Whether this is the thread that may call the host.
+  static bool IsMainThread();
+};

@@ -1,0 +1,85 @@
+// SPDX-License-Identifier: MIT
+#include "Interrupter.h"
+
+#include "Interpreter.h"
+#include "RubyCall.h"
+// Last: it renames what the headers above use.
+#include <ruby.h>
+#include <ruby/debug.h>
+#include <ruby/thread.h>
+
+namespace {
+
+HANDLE wakeEvent = nullptr;  // made once, before the first macro
+VALUE interrupterThread = Qnil;
+VALUE mainThread = Qnil;
+
+constexpr DWORD kGrace = 500;  // milliseconds for `ensure` blocks
+
+void* WaitOutside(void* milliseconds) {
+  WaitForSingleObject(wakeEvent, *static_cast<DWORD*>(milliseconds));
+  return nullptr;
+}
+
+void EndWait(void*) { SetEvent(wakeEvent); }
+
+void Wait(DWORD milliseconds) {
+  rb_thread_call_without_gvl(WaitOutside, &milliseconds, EndWait, nullptr);
+}
+
+void OnEvent(rb_event_flag_t, VALUE, VALUE, ID, VALUE) {
+  if (!Interpreter::IsMainThread() || Interpreter::InterruptDue() == Interpreter::Urgency::kNone)
+    return;
+  rb_remove_event_hook(OnEvent);
+  LeaveTask();
+}
+
+VALUE Deliver(VALUE) {
+  rb_remove_event_hook(OnEvent);
+  rb_add_event_hook(OnEvent, RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL, Qnil);
+  return rb_funcall(mainThread, rb_intern("raise"), 1, StopClass());
+}
+
+VALUE Interrupt(void*) {
+  for (;;) {
+    Wait(INFINITE);
+    while (Interpreter::InterruptDue() != Interpreter::Urgency::kNone) {
+      if (Interpreter::InterruptDue() == Interpreter::Urgency::kAfterGrace) Wait(kGrace);
+      if (Interpreter::InterruptDue() == Interpreter::Urgency::kNone) break;
+      VALUE ignored;
+      Protect(Deliver, Qnil, ignored);
+      Wait(kGrace);
+    }
+  }
+}
+
+VALUE CheckInterrupts(VALUE) {
+  rb_thread_check_ints();
+  return Qnil;
+}
+
+}  // namespace
+
+void Interrupter::EnsureAlive() {
+  if (!wakeEvent) {
+    wakeEvent = CreateEventW(nullptr, FALSE, FALSE, nullptr);
+    mainThread = rb_thread_current();
+    rb_gc_register_address(&mainThread);
+    rb_gc_register_address(&interrupterThread);
+  }
+  if (interrupterThread != Qnil && RTEST(rb_funcall(interrupterThread, rb_intern("alive?"), 0)))
+    return;
+  interrupterThread = rb_thread_create(Interrupt, nullptr);
+  rb_funcall(rb_const_get(rb_cObject, rb_intern("ActiveScript")), rb_intern("interrupter="), 1,
+             interrupterThread);
+}
+
+void Interrupter::Settle() {
+  rb_remove_event_hook(OnEvent);
+  VALUE ignored;
+  Protect(CheckInterrupts, Qnil, ignored);
+}
+
+void Interrupter::Wake() {
+  if (wakeEvent) SetEvent(wakeEvent);
+}

@@ -1,0 +1,165 @@
+// SPDX-License-Identifier: MIT
+#include "MacroTask.h"
+
+#include <new>
+
+#include "HostProcess.h"
+#include "Interrupter.h"
+#include "RubyRuntime.h"
+// Last: they rename what the headers above use.
+#include "ComObject.h"
+#include "RubyCall.h"
+#include "Values.h"
+
+static_assert(sizeof(VALUE) == sizeof(unsigned long) && Qfalse == 0, "RubyHalf holds a value");
+
+MacroTask::~MacroTask() {
+  SysFreeString(text);
+  if (error) error->Release();
+  VariantClear(&value);
+}
+
+static MacroTask& From(VALUE data) { return *reinterpret_cast<MacroTask*>(data); }
+
+static VALUE StringOf(BSTR text, TextForm form) {
+  return StringFromHost(text, SysStringLen(text), form, TextOrigin::kSource);
+}
+
+// The context with all items that are new.
+VALUE MacroTask::PrepareBody(VALUE data) {
+  MacroTask& task = From(data);
+  Interrupter::EnsureAlive();
+  if (!task.half.context) {
+    const VALUE isByteHost = task.half.form == TextForm::kBytes ? Qtrue : Qfalse;
+    task.half.context = rb_funcall(ActiveScriptConst("Context"), rb_intern("new"), 1, isByteHost);
+    rb_gc_register_address(&task.half.context);
+  }
+  for (NamedItem* item = task.items; item; item = item->next) {
+    if (!item->dispatch) continue;
+    const VALUE name = StringOf(item->name, TextForm::kUtf16);
+    const VALUE object = NewComObject(item->dispatch, task.half.form, name);
+    item->dispatch = nullptr;
+    rb_funcall(task.half.context, rb_intern("add_item"), 2, name, object);
+  }
+  return rb_funcall(task.half.context, rb_intern("enter"), 0);
+}
+
+VALUE MacroTask::Compile() {
+  // A unit that is no byte shows that this text is not an 8-bit host's.
+  TextForm form = half.form;
+  for (UINT i = 0; i < SysStringLen(text); ++i)
+    if (text[i] > 0xFF) form = TextForm::kUtf16;
+  return rb_funcall(half.context, rb_intern("compile"), 3, StringOf(text, form),
+                    ULONG2NUM(firstLine + 1), persistent ? Qtrue : Qfalse);
+}
+
+VALUE MacroTask::CallFunction() {
+  const VALUE list = rb_ary_new();
+  for (UINT i = arguments->cArgs; i-- > 0;)
+    rb_ary_push(list, FromVariant(arguments->rgvarg[i], half.form));
+  return rb_funcall(half.context, rb_intern("call"), 2, StringOf(text, TextForm::kUtf16), list);
+}
+
+VALUE MacroTask::WorkBody(VALUE data) {
+  MacroTask& task = From(data);
+  switch (task.kind) {
+    case Kind::kCompile:
+      return task.Compile();
+    case Kind::kRun: {
+      const VALUE value = rb_funcall(task.half.context, rb_intern("run"), 0);
+      return task.wantsValue ? Passable(value, task.half.form) : Qnil;
+    }
+    case Kind::kCall:
+      return Passable(task.CallFunction(), task.half.form);
+    case Kind::kDefines:
+      return rb_funcall(task.half.context, rb_intern("defines?"), 1,
+                        StringOf(task.text, TextForm::kUtf16));
+    case Kind::kDiscard:
+      break;
+  }
+  return task.persistent ? rb_funcall(task.half.context, rb_intern("successor"), 0) : Qnil;
+}
+
+VALUE MacroTask::LeaveBody(VALUE data) {
+  return rb_funcall(From(data).half.context, rb_intern("leave"), 0);
+}
+
+void MacroTask::SetValue(VALUE passable) {
+  if (kind == Kind::kDefines) {
+    result = RTEST(passable) ? S_OK : S_FALSE;
+  } else if (kind == Kind::kDiscard) {
+    half.context = NIL_P(passable) ? 0 : passable;
+    if (!half.context) rb_gc_unregister_address(&half.context);
+    result = S_OK;
+  } else if (kind == Kind::kCompile) {
+    result = S_OK;
+  } else {
+    result = FillVariant(passable, half.form, value) ? S_OK : E_OUTOFMEMORY;
+  }
+}
+
+namespace {
+
+struct Description {
+  VALUE context;
+  VALUE exception;
+  TextForm form;
+  BSTR text;
+  ULONG line;
+  LONG column;
+  BSTR lineText;
+};
+
+BSTR TextOf(VALUE string, TextForm form) {
+  return TextToHost(RSTRING_PTR(string), static_cast<UINT>(RSTRING_LEN(string)), form);
+}
+
+}  // namespace
+
+VALUE MacroTask::DescribeBody(VALUE data) {
+  Description& description = *reinterpret_cast<Description*>(data);
+  const VALUE parts =
+      rb_funcall(description.context, rb_intern("describe"), 1, description.exception);
+  description.line = NUM2ULONG(rb_ary_entry(parts, 1));
+  description.column = NUM2LONG(rb_ary_entry(parts, 2));
+  description.text = TextOf(rb_ary_entry(parts, 0), description.form);
+  description.lineText = TextOf(rb_ary_entry(parts, 3), description.form);
+  return Qnil;
+}
+
+void MacroTask::SetError(VALUE exception) {
+  Description description = {half.context, exception, half.form, nullptr, 0, 0, nullptr};
+  VALUE ignored;
+  Protect(DescribeBody, reinterpret_cast<VALUE>(&description), ignored);
+  if (!description.text) description.text = SysAllocString(L"An error that cannot be described.");
+  error = new (std::nothrow) ScriptError(E_FAIL, description.text, description.line,
+                                         description.column, description.lineText);
+  result = error ? DISP_E_EXCEPTION : E_OUTOFMEMORY;
+}
+
+void MacroTask::Work() {
+  VALUE outcomeValue;
+  Interpreter::SetInterruptible(true);
+  const Outcome outcome = Protect(WorkBody, reinterpret_cast<VALUE>(this), outcomeValue);
+  Interpreter::SetInterruptible(false);
+  Interrupter::Settle();
+  if (outcome == Outcome::kDone) SetValue(outcomeValue);
+  if (outcome == Outcome::kRaised) SetError(outcomeValue);
+  if (outcome == Outcome::kLeft) result = E_ABORT;
+}
+
+void MacroTask::Run() {
+  HostProcess process;
+  process.Save();
+  ApplyRubyEnvironment();
+  VALUE ignored;
+  const Outcome prepared = Protect(PrepareBody, reinterpret_cast<VALUE>(this), ignored);
+  if (prepared == Outcome::kRaised) SetError(ignored);
+  if (prepared == Outcome::kDone) {
+    // The host's pointers are gone when a pending call is abandoned; nothing reads them then.
+    const unsigned long context = half.context;
+    Work();
+    if (context) Protect(LeaveBody, reinterpret_cast<VALUE>(this), ignored);
+  }
+  process.Restore();
+}

@@ -1,0 +1,72 @@
+// SPDX-License-Identifier: MIT
+// What a script engine has done in the interpreter: compile a text, run what is compiled, call a
+// macro's function. Around each one the engine's context is entered and left (see prelude.rb), and
+// the host's process state is put back (see HostProcess.h).
+//
+// Ownership: as RubyTask. What a task points to belongs to the engine and outlives the task, which
+// may go on after the host has jumped away; what it holds itself goes with it.
+// Errors: `result` and `error`. Threading: Run on the Ruby side, the rest on the host's.
+#pragma once
+
+#include <windows.h>
+// Needs windows.h before it.
+#include <oleauto.h>
+
+#include "Interpreter.h"
+#include "ScriptError.h"
+#include "TextCoding.h"
+
+// An object that the host publishes under a name.
+struct NamedItem {
+  BSTR name;
+  DWORD flags;
+  IDispatch* dispatch;  // a reference for the interpreter, until it has taken it; then null
+  bool requested;       // from the site
+  NamedItem* next;
+};
+
+// The Ruby half of an engine.
+struct RubyHalf {
+  unsigned long context = 0;  // a Ruby value, kept from collection; 0: none yet
+  TextForm form = TextForm::kUtf16;
+};
+
+class MacroTask final : public RubyTask {
+ public:
+  enum class Kind {
+    kCompile,  // `text`, for a later kRun
+    kRun,      // all that is compiled; sets `value`
+    kDefines,  // whether the macro has a function named `text`; S_OK or S_FALSE
+    kCall,     // the function named `text`, with `arguments`; sets `value`
+    kDiscard,  // the context; what was persistent is compiled for the next one
+  };
+
+  MacroTask(const void* engine, Kind taskKind, RubyHalf& rubyHalf, NamedItem* namedItems)
+      : RubyTask(engine), kind(taskKind), half(rubyHalf), items(namedItems) {}
+  ~MacroTask() override;
+  void Run() override;
+
+  const Kind kind;
+  RubyHalf& half;
+  NamedItem* const items;
+  BSTR text = nullptr;  // owned
+  ULONG firstLine = 0;  // of the text, from 0
+  bool persistent = false;
+  bool wantsValue = false;  // of kRun
+  const DISPPARAMS* arguments = nullptr;  // read before any macro code runs
+
+  HRESULT result = E_FAIL;
+  ScriptError* error = nullptr;  // owned; null when there is none
+  VARIANT value = {};            // owned
+
+ private:
+  static unsigned long PrepareBody(unsigned long task);
+  static unsigned long WorkBody(unsigned long task);
+  static unsigned long LeaveBody(unsigned long task);
+  static unsigned long DescribeBody(unsigned long data);
+  unsigned long Compile();
+  unsigned long CallFunction();
+  void Work();
+  void SetError(unsigned long exception);
+  void SetValue(unsigned long passable);
+};

@@ -1,0 +1,87 @@
+// SPDX-License-Identifier: MIT
+#include "Interpreter.h"
+// Last: it renames what the header above uses.
+#include "RubyCall.h"
+
+namespace {
+
+struct Guarded {
+  VALUE (*body)(VALUE);
+  VALUE argument;
+};
+
+struct SendArguments {
+  VALUE receiver;
+  const char* method;
+  int count;
+  const VALUE* arguments;
+};
+
+// Thrown to leave a task; also what its catch answers then.
+VALUE LeaveTag() {
+  static VALUE tag = Qnil;
+  if (tag == Qnil) {
+    tag = rb_str_new_cstr("the macro has been stopped");
+    rb_gc_register_mark_object(tag);
+  }
+  return tag;
+}
+
+// The fiber that the innermost Protect of the main thread is in.
+VALUE guardedFiber = Qnil;
+
+VALUE CallBody(VALUE, VALUE data, int, const VALUE*, VALUE) {
+  const Guarded& guarded = *reinterpret_cast<Guarded*>(data);
+  return guarded.body(guarded.argument);
+}
+
+VALUE Catch(VALUE data) {
+  if (Interpreter::IsMainThread()) guardedFiber = rb_fiber_current();
+  return rb_catch_obj(LeaveTag(), CallBody, data);
+}
+
+VALUE CallMethod(VALUE data) {
+  const SendArguments& call = *reinterpret_cast<SendArguments*>(data);
+  return rb_funcallv(call.receiver, rb_intern(call.method), call.count, call.arguments);
+}
+
+}  // namespace
+
+Outcome Protect(VALUE (*body)(VALUE), VALUE argument, VALUE& result) {
+  // Ruby's jumps do not restore the chain of exception handlers.
+  const unsigned long handlers = __readfsdword(0);
+  const VALUE outerFiber = guardedFiber;
+  Guarded guarded = {body, argument};
+  int state = 0;
+  result = rb_protect(Catch, reinterpret_cast<VALUE>(&guarded), &state);
+  __writefsdword(0, handlers);
+  if (Interpreter::IsMainThread()) guardedFiber = outerFiber;
+  if (state == 0) return result == LeaveTag() ? Outcome::kLeft : Outcome::kDone;
+  result = rb_errinfo();
+  rb_set_errinfo(Qnil);
+  const bool raised = RTEST(rb_obj_is_kind_of(result, rb_eException)) &&
+                      !RTEST(rb_obj_is_kind_of(result, StopClass()));
+  return raised ? Outcome::kRaised : Outcome::kLeft;
+}
+
+Outcome Send(VALUE receiver, const char* method, int count, const VALUE* arguments, VALUE& result) {
+  SendArguments call = {receiver, method, count, arguments};
+  return Protect(CallMethod, reinterpret_cast<VALUE>(&call), result);
+}
+
+// A fiber of the macro's own has no such tag: there an exception goes to the one that resumed it.
+void LeaveTask() {
+  Interpreter::SetLeaving();
+  if (rb_fiber_current() == guardedFiber) rb_throw_obj(LeaveTag(), LeaveTag());
+  rb_raise(StopClass(), "the macro has been stopped");
+}
+
+VALUE ActiveScriptConst(const char* name) {
+  const VALUE module = rb_const_get(rb_cObject, rb_intern("ActiveScript"));
+  return rb_const_get(module, rb_intern(name));
+}
+
+VALUE StopClass() {
+  static const VALUE stop = ActiveScriptConst("Stop");
+  return stop;
+}

@@ -1,0 +1,93 @@
+// SPDX-License-Identifier: MIT
+#include "RubyRuntime.h"
+
+#include <new>
+
+#include "HostProcess.h"
+#include "Interpreter.h"
+// Last: they rename what the headers above use.
+#include "ComObject.h"
+#include "RubyCall.h"
+#include "Values.h"
+
+namespace {
+
+constexpr char kPrelude[] = {
+#embed "prelude.rb"
+};
+
+// The state at the start; keeps the variables that CRuby has added.
+HostProcess& StartState() {
+  static HostProcess* const state = new (std::nothrow) HostProcess;  // deliberately never destroyed
+  return *state;
+}
+
+VALUE SystemMessage(VALUE, VALUE code) {
+  wchar_t text[512];
+  const DWORD units =
+      FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS, nullptr,
+                     static_cast<DWORD>(NUM2ULONG(code)), 0, text, 512, nullptr);
+  if (units == 0) return rb_utf8_str_new_cstr("failed");
+  return StringFromHost(text, units, TextForm::kUtf16, TextOrigin::kResult);
+}
+
+VALUE CanCall(VALUE) {
+  return Interpreter::IsMainThread() && !Interpreter::MustEnd() ? Qtrue : Qfalse;
+}
+
+VALUE Global(VALUE, VALUE name) { return rb_gv_get(rb_id2name(SYM2ID(name))); }
+
+VALUE SetGlobal(VALUE, VALUE name, VALUE value) {
+  return rb_gv_set(rb_id2name(SYM2ID(name)), value);
+}
+
+VALUE DefineModule(VALUE) {
+  const VALUE module = rb_define_module("ActiveScript");
+  rb_define_singleton_method(module, "system_message", SystemMessage, 1);
+  rb_define_singleton_method(module, "can_call?", CanCall, 0);
+  rb_define_singleton_method(module, "global", Global, 1);
+  rb_define_singleton_method(module, "set_global", SetGlobal, 2);
+  DefineComObject(module);
+  const VALUE binding = rb_const_get(rb_cObject, rb_intern("TOPLEVEL_BINDING"));
+  return rb_funcall(binding, rb_intern("eval"), 3, rb_utf8_str_new(kPrelude, sizeof kPrelude),
+                    rb_utf8_str_new_cstr("rubyscript/prelude.rb"), INT2FIX(1));
+}
+
+// With these options CRuby reads nothing of the host's command line and environment.
+bool StartInterpreter() {
+  static char name[] = "macro";
+  static char options[] = "--disable=gems,rubyopt";
+  static char execute[] = "-e";
+  static char nothing[] = "";
+  static char* arguments[] = {name, options, execute, nothing, nullptr};
+  int count = 4;
+  char** list = arguments;
+  ruby_sysinit(&count, &list);
+  RUBY_INIT_STACK;
+  if (ruby_setup() != 0) return false;
+  list = arguments;
+  void* const node = ruby_options(4, list);
+  int status = 0;
+  if (!ruby_executable_node(node, &status)) return false;
+  ruby_script(name);
+  return true;
+}
+
+}  // namespace
+
+bool StartRuby() {
+  HostProcess& state = StartState();
+  state.Save();
+  _putenv("RUBYLIB=");
+  bool started = StartInterpreter();
+  if (started) {
+    int failed = 0;
+    rb_protect(DefineModule, Qnil, &failed);
+    started = failed == 0;
+  }
+  state.KeepAdditions();
+  state.Restore();
+  return started;
+}
+
+void ApplyRubyEnvironment() { StartState().ApplyAdditions(); }

@@ -1,0 +1,430 @@
+// SPDX-License-Identifier: MIT
+#include "ScriptEngine.h"
+
+#include <oleauto.h>
+#include <stdio.h>
+#include <wchar.h>
+
+#include <new>
+
+#include "ComObject.h"
+#include "ScriptDispatch.h"
+#include "Server.h"
+
+// The 32-bit form of the parser's interface; libraries carry only the other one.
+static constexpr IID kActiveScriptParse = {
+    0xBB1A2AE2, 0xA4F9, 0x11CF, {0x8F, 0x20, 0x00, 0x80, 0x5F, 0x2C, 0xD0, 0x64}};
+
+// The name by which the 8-bit host is known.
+static constexpr wchar_t kByteHostItem[] = L"tarn";
+
+HRESULT CreateScriptEngine(REFIID riid, void** object) {
+  ScriptEngine* const engine = new (std::nothrow) ScriptEngine;
+  if (!engine) return E_OUTOFMEMORY;
+  const HRESULT result = engine->QueryInterface(riid, object);
+  engine->Release();
+  return result;
+}
+
+ScriptEngine::ScriptEngine() { AddServerReference(); }
+
+ScriptEngine::~ScriptEngine() {
+  Close();
+  ReleaseServerReference();
+}
+
+HRESULT ScriptEngine::QueryInterface(REFIID riid, void** object) {
+  if (!object) return E_POINTER;
+  *object = nullptr;
+  if (riid == IID_IUnknown || riid == __uuidof(IActiveScript))
+    *object = static_cast<IActiveScript*>(this);
+  else if (riid == kActiveScriptParse)
+    *object = static_cast<IActiveScriptParse*>(this);
+  else if (riid == IID_IObjectSafety)
+    *object = static_cast<IObjectSafety*>(this);
+  if (!*object) return E_NOINTERFACE;
+  AddRef();
+  return S_OK;
+}
+
+ULONG ScriptEngine::AddRef() { return static_cast<ULONG>(InterlockedIncrement(&references)); }
+
+ULONG ScriptEngine::Release() {
+  const LONG left = InterlockedDecrement(&references);
+  if (left == 0) {
+    references = 1;  // closing takes and gives references of its own
+    delete this;
+  }
+  return static_cast<ULONG>(left);
+}
+
+// --- Site and states -----------------------------------------------------------------------------
+
+// On its own thread, with a site, and not closed.
+bool ScriptEngine::IsUsable() const {
+  return thread == GetCurrentThreadId() && site && state != SCRIPTSTATE_CLOSED;
+}
+
+bool ScriptEngine::IsStarted() const {
+  return state == SCRIPTSTATE_STARTED || state == SCRIPTSTATE_CONNECTED ||
+         state == SCRIPTSTATE_DISCONNECTED;
+}
+
+HRESULT ScriptEngine::SetScriptSite(IActiveScriptSite* newSite) {
+  if (!newSite) return E_POINTER;
+  if (site || state == SCRIPTSTATE_CLOSED) return E_UNEXPECTED;
+  thread = GetCurrentThreadId();
+  site = newSite;
+  site->AddRef();
+  if (initialized) ChangeState(SCRIPTSTATE_INITIALIZED);
+  return S_OK;
+}
+
+HRESULT ScriptEngine::GetScriptSite(REFIID riid, void** object) {
+  if (!object) return E_POINTER;
+  *object = nullptr;
+  return site ? site->QueryInterface(riid, object) : S_FALSE;
+}
+
+HRESULT ScriptEngine::InitNew() {
+  if (initialized || state == SCRIPTSTATE_CLOSED) return E_UNEXPECTED;
+  initialized = true;
+  if (site) ChangeState(SCRIPTSTATE_INITIALIZED);
+  return S_OK;
+}
+
+void ScriptEngine::ChangeState(SCRIPTSTATE newState) {
+  if (state == newState) return;
+  state = newState;
+  if (site) site->OnStateChange(newState);
+}
+
+// Downwards the states are passed one by one, each with its notification.
+void ScriptEngine::LowerState(SCRIPTSTATE newState) {
+  if (state == SCRIPTSTATE_CONNECTED) ChangeState(SCRIPTSTATE_DISCONNECTED);
+  if (newState == SCRIPTSTATE_DISCONNECTED) return;
+  if (IsStarted()) {
+    ChangeState(SCRIPTSTATE_INITIALIZED);
+    if (newState == SCRIPTSTATE_INITIALIZED) Reset(false);
+  }
+  if (newState == SCRIPTSTATE_INITIALIZED) return;
+  Reset(true);
+  ChangeState(newState);
+  IActiveScriptSite* const oldSite = site;
+  site = nullptr;
+  if (oldSite) oldSite->Release();
+}
+
+HRESULT ScriptEngine::SetScriptState(SCRIPTSTATE newState) {
+  if (!IsUsable()) return E_UNEXPECTED;
+  switch (newState) {
+    case SCRIPTSTATE_STARTED:
+    case SCRIPTSTATE_CONNECTED: {
+      if (!initialized) return E_UNEXPECTED;
+      const bool first = !IsStarted();
+      const HRESULT requested = first ? RequestItems() : S_OK;
+      if (FAILED(requested)) return requested;
+      ChangeState(newState);
+      return first ? RunQueue(nullptr, nullptr) : S_OK;
+    }
+    case SCRIPTSTATE_DISCONNECTED:
+      if (!IsStarted()) return E_UNEXPECTED;
+      ChangeState(SCRIPTSTATE_DISCONNECTED);
+      return S_OK;
+    case SCRIPTSTATE_INITIALIZED:
+      if (!initialized || depth > 0) return E_UNEXPECTED;
+      LowerState(newState);
+      return S_OK;
+    case SCRIPTSTATE_UNINITIALIZED:
+      if (depth > 0) return E_UNEXPECTED;
+      LowerState(newState);
+      return S_OK;
+    case SCRIPTSTATE_CLOSED:
+      return Close();
+  }
+  return E_INVALIDARG;
+}
+
+HRESULT ScriptEngine::GetScriptState(SCRIPTSTATE* current) {
+  if (!current) return E_POINTER;
+  *current = state;
+  return S_OK;
+}
+
+// During a run the macro is ended first; the rest follows when it has come to its end.
+HRESULT ScriptEngine::Close() {
+  if (state == SCRIPTSTATE_CLOSED) return S_FALSE;
+  if (thread != 0 && thread != GetCurrentThreadId()) return E_UNEXPECTED;
+  if (depth > 0) {
+    closing = true;
+    Interpreter::Interrupt(this);
+    return S_OK;
+  }
+  AddRef();
+  LowerState(SCRIPTSTATE_CLOSED);
+  Release();
+  return S_OK;
+}
+
+// Lets go of the context and of the items; what is persistent stays unless `all`.
+void ScriptEngine::Reset(bool all) {
+  if (half.context && Interpreter::Start() == S_OK) {
+    MacroTask* const task = NewTask(MacroTask::Kind::kDiscard, nullptr);
+    if (task) {
+      task->persistent = !all;
+      if (Interpreter::Enter(task) == S_OK) delete task;
+    }
+  }
+  ReleaseObjectsOf(this);
+  ReleaseCollectedObjects();
+  NamedItem** link = &items;
+  while (NamedItem* const item = *link) {
+    if (item->dispatch) item->dispatch->Release();
+    item->dispatch = nullptr;
+    item->requested = false;
+    if (!all && (item->flags & SCRIPTITEM_ISPERSISTENT)) {
+      link = &item->next;
+      continue;
+    }
+    *link = item->next;
+    SysFreeString(item->name);
+    delete item;
+  }
+}
+
+// --- Items ---------------------------------------------------------------------------------------
+
+// It has to be the name of an instance variable.
+static bool IsIdentifier(LPCOLESTR name) {
+  const auto isLetter = [](wchar_t unit) {
+    return (unit | 0x20) >= 'a' && (unit | 0x20) <= 'z' ? true : unit == '_' || unit >= 0x80;
+  };
+  if (!isLetter(*name)) return false;
+  for (; *name; ++name)
+    if (!isLetter(*name) && !(*name >= '0' && *name <= '9')) return false;
+  return true;
+}
+
+const NamedItem* ScriptEngine::FindItem(LPCOLESTR name) const {
+  for (const NamedItem* item = items; item; item = item->next)
+    if (wcscmp(item->name, name) == 0) return item;
+  return nullptr;
+}
+
+HRESULT ScriptEngine::AddNamedItem(LPCOLESTR name, DWORD flags) {
+  if (!name) return E_POINTER;
+  if (!IsUsable()) return E_UNEXPECTED;
+  constexpr DWORD kKnownFlags = SCRIPTITEM_ALL_FLAGS;
+  if ((flags & ~kKnownFlags) || !IsIdentifier(name)) return E_INVALIDARG;
+  NamedItem* const item = new (std::nothrow) NamedItem{};
+  if (item) item->name = SysAllocString(name);
+  if (!item || !item->name) {
+    delete item;
+    return E_OUTOFMEMORY;
+  }
+  item->flags = flags;
+  NamedItem** end = &items;
+  while (*end) end = &(*end)->next;
+  *end = item;
+  return S_OK;
+}
+
+// Asks the site for the objects of all items that are new.
+HRESULT ScriptEngine::RequestItems() {
+  for (NamedItem* item = items; item; item = item->next) {
+    if (item->requested || (item->flags & SCRIPTITEM_CODEONLY)) continue;
+    IUnknown* unknown = nullptr;
+    HRESULT result = site->GetItemInfo(item->name, SCRIPTINFO_IUNKNOWN, &unknown, nullptr);
+    if (FAILED(result)) return result;
+    if (!unknown) return E_UNEXPECTED;
+    void* dispatch = nullptr;
+    result = unknown->QueryInterface(IID_IDispatch, &dispatch);
+    unknown->Release();
+    if (FAILED(result)) return result;
+    item->dispatch = static_cast<IDispatch*>(dispatch);
+    item->requested = true;
+  }
+  return S_OK;
+}
+
+HRESULT ScriptEngine::GetScriptDispatch(LPCOLESTR itemName, IDispatch** dispatch) {
+  if (!dispatch) return E_POINTER;
+  *dispatch = nullptr;
+  if (!IsUsable() || !IsStarted()) return E_UNEXPECTED;
+  if (itemName && *itemName && !FindItem(itemName)) return E_INVALIDARG;
+  *dispatch = new (std::nothrow) ScriptDispatch(this);
+  return *dispatch ? S_OK : E_OUTOFMEMORY;
+}
+
+// --- Code ----------------------------------------------------------------------------------------
+
+bool ScriptEngine::IsByteHost(LPCOLESTR code) const {
+  if (!FindItem(kByteHostItem)) return false;
+  for (; *code; ++code)
+    if (*code > 0xFF) return false;
+  return true;
+}
+
+MacroTask* ScriptEngine::NewTask(MacroTask::Kind kind, LPCOLESTR text) {
+  MacroTask* const task = new (std::nothrow) MacroTask(this, kind, half, items);
+  if (!task || !text) return task;
+  task->text = SysAllocString(text);
+  if (task->text) return task;
+  delete task;
+  return nullptr;
+}
+
+HRESULT ScriptEngine::ParseScriptText(LPCOLESTR code, LPCOLESTR itemName, IUnknown*, LPCOLESTR,
+                                      DWORD cookie, ULONG firstLine, DWORD flags, VARIANT* result,
+                                      EXCEPINFO* exception) {
+  if (result) VariantInit(result);
+  if (exception) *exception = {};
+  if (!code) return E_POINTER;
+  if (!IsUsable() || !initialized) return E_UNEXPECTED;
+  if (itemName && *itemName && !FindItem(itemName)) return E_INVALIDARG;
+  if (!textFormKnown) half.form = IsByteHost(code) ? TextForm::kBytes : TextForm::kUtf16;
+  textFormKnown = true;
+  MacroTask* const task = NewTask(MacroTask::Kind::kCompile, code);
+  if (!task) return E_OUTOFMEMORY;
+  sourceCookie = cookie;
+  task->firstLine = firstLine;
+  task->persistent = (flags & SCRIPTTEXT_ISPERSISTENT) != 0;
+  const HRESULT compiled = Perform(task, nullptr, exception);
+  if (FAILED(compiled) || !IsStarted()) return compiled;
+  const HRESULT requested = RequestItems();
+  const bool isExpression = (flags & SCRIPTTEXT_ISEXPRESSION) != 0;
+  return FAILED(requested) ? requested : RunQueue(isExpression ? result : nullptr, exception);
+}
+
+HRESULT ScriptEngine::RunQueue(VARIANT* result, EXCEPINFO* exception) {
+  MacroTask* const task = NewTask(MacroTask::Kind::kRun, nullptr);
+  if (task) task->wantsValue = result != nullptr;
+  return Perform(task, result, exception);
+}
+
+HRESULT ScriptEngine::Defines(LPCOLESTR name) {
+  if (!IsUsable() || !IsStarted()) return E_UNEXPECTED;
+  return Perform(NewTask(MacroTask::Kind::kDefines, name), nullptr, nullptr);
+}
+
+HRESULT ScriptEngine::CallFunction(LPCOLESTR name, const DISPPARAMS* arguments, VARIANT* result,
+                                   EXCEPINFO* exception) {
+  if (!IsUsable() || !IsStarted()) return E_UNEXPECTED;
+  MacroTask* const task = NewTask(MacroTask::Kind::kCall, name);
+  if (task) task->arguments = arguments;
+  return Perform(task, result, exception);
+}
+
+// Runs and deletes the task; what went wrong has gone to the site.
+HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* exception) {
+  if (!task) return E_OUTOFMEMORY;
+  const bool runsCode = task->kind == MacroTask::Kind::kRun || task->kind == MacroTask::Kind::kCall;
+  AddRef();
+  IActiveScriptSite* const informed = site;
+  informed->AddRef();
+  if (runsCode) informed->OnEnterScript();
+  HRESULT outcome = Enter(task);
+  if (outcome == S_OK) {
+    outcome = task->result;
+    ScriptError* const error = task->error;
+    task->error = nullptr;
+    if (result && SUCCEEDED(outcome)) {
+      *result = task->value;
+      task->value = {};
+    }
+    delete task;
+    if (error) outcome = Report(error, exception);
+  }
+  if (runsCode) informed->OnLeaveScript();
+  informed->Release();
+  if (depth == 0 && closing) Close();
+  Release();
+  return outcome;
+}
+
+// S_OK: the task has run. Otherwise it is gone, and the site knows the reason.
+HRESULT ScriptEngine::Enter(MacroTask* task) {
+  const HRESULT started = Interpreter::Start();
+  if (started == S_OK) {
+    ++depth;
+    const HRESULT entered = Interpreter::Enter(task);
+    --depth;
+    ReleaseCollectedObjects();
+    return entered;
+  }
+  delete task;
+  wchar_t text[256] = L"Ruby could not be started in this process.";
+  if (started == RPC_E_WRONG_THREAD)
+    swprintf(text, 256, L"Ruby macros run on the thread that ran the first one.");
+  if (Interpreter::LostTo())
+    swprintf(text, 256,
+             L"Ruby was lost to a fault (exception 0x%08lX) in an earlier macro. Start the program "
+             L"anew to run Ruby macros again.",
+             Interpreter::LostTo());
+  ScriptError* const error =
+      new (std::nothrow) ScriptError(started, SysAllocString(text), 0, 0, nullptr);
+  return error ? Report(error, nullptr) : started;
+}
+
+// Takes over the error.
+HRESULT ScriptEngine::Report(ScriptError* error, EXCEPINFO* exception) {
+  error->SetContext(sourceCookie);
+  const bool taken = site && SUCCEEDED(site->OnScriptError(error));
+  if (!taken) error->Fill(exception);
+  error->Release();
+  return taken ? SCRIPT_E_REPORTED : DISP_E_EXCEPTION;
+}
+
+// --- Threads -------------------------------------------------------------------------------------
+
+HRESULT ScriptEngine::GetCurrentScriptThreadID(SCRIPTTHREADID* id) {
+  if (!id) return E_POINTER;
+  *id = GetCurrentThreadId();
+  return S_OK;
+}
+
+HRESULT ScriptEngine::GetScriptThreadID(DWORD systemThread, SCRIPTTHREADID* id) {
+  if (!id) return E_POINTER;
+  *id = systemThread;
+  return S_OK;
+}
+
+// Of all the thread ids there are, an engine of one thread knows three names for one.
+static bool IsEngineThread(SCRIPTTHREADID id, DWORD thread) {
+  return id == SCRIPTTHREADID_BASE || id == SCRIPTTHREADID_ALL || id == thread ||
+         (id == SCRIPTTHREADID_CURRENT && thread == GetCurrentThreadId());
+}
+
+HRESULT ScriptEngine::GetScriptThreadState(SCRIPTTHREADID id, SCRIPTTHREADSTATE* current) {
+  if (!current) return E_POINTER;
+  *current = SCRIPTTHREADSTATE_NOTINSCRIPT;
+  if (!IsEngineThread(id, thread)) return E_INVALIDARG;
+  if (depth > 0) *current = SCRIPTTHREADSTATE_RUNNING;
+  return S_OK;
+}
+
+HRESULT ScriptEngine::InterruptScriptThread(SCRIPTTHREADID id, const EXCEPINFO*, DWORD) {
+  if (state == SCRIPTSTATE_CLOSED) return E_UNEXPECTED;
+  if (!IsEngineThread(id, thread)) return E_INVALIDARG;
+  Interpreter::Interrupt(this);
+  return S_OK;
+}
+
+// --- Safety --------------------------------------------------------------------------------------
+
+HRESULT ScriptEngine::GetInterfaceSafetyOptions(REFIID riid, DWORD* supported, DWORD* enabled) {
+  if (!supported || !enabled) return E_POINTER;
+  *supported = 0;
+  *enabled = 0;
+  void* object = nullptr;
+  if (FAILED(QueryInterface(riid, &object))) return E_NOINTERFACE;
+  static_cast<IUnknown*>(object)->Release();
+  return S_OK;
+}
+
+HRESULT ScriptEngine::SetInterfaceSafetyOptions(REFIID riid, DWORD mask, DWORD options) {
+  void* object = nullptr;
+  if (FAILED(QueryInterface(riid, &object))) return E_NOINTERFACE;
+  static_cast<IUnknown*>(object)->Release();
+  return mask & options ? E_FAIL : S_OK;
+}

@@ -1,0 +1,34 @@
+// SPDX-License-Identifier: MIT
+// Text between the host and Ruby. Inside, every text is UTF-8. What a host's UTF-16 units mean
+// depends on the host:
+//
+//   kUtf16   characters, as COM means it.
+//   kBytes   an 8-bit host behind a narrow bridge. It widens its macro files byte by byte, keeps the
+//            low byte of each unit that it is given, and widens what it answers in the ANSI code
+//            page. So a unit given to it is one byte of the UTF-8 text; what it answers becomes the
+//            bytes that the code page made the units from.
+//
+// Errors: no memory gives null or an empty text. Threading: any.
+#pragma once
+
+#include <windows.h>
+// Needs windows.h before it.
+#include <oleauto.h>
+
+enum class TextForm { kUtf16, kBytes };
+
+// What a text from the host is, for kBytes.
+enum class TextOrigin { kSource, kResult };
+
+// The most bytes that a UTF-16 unit takes inside.
+constexpr UINT kMostBytesPerUnit = 3;
+
+// The caller frees it with SysFreeString. For kUtf16 the text must be valid UTF-8.
+BSTR TextToHost(const char* text, UINT bytes, TextForm form);
+
+// Writes the text to `target`, which has room for kMostBytesPerUnit a unit; returns its bytes.
+UINT TextFromHost(const wchar_t* text, UINT units, TextForm form, TextOrigin origin, char* target);
+
+// The bytes that the code page made the units from, whatever it maps them to; as far as it keeps
+// them apart, which all single-byte code pages do. `target` as above; returns its bytes.
+UINT BytesFromAnsi(UINT codePage, const wchar_t* text, UINT units, char* target);
