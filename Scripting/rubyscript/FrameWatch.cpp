@@ -47,14 +47,12 @@ FaultBase::FaultBase(EXCEPTION_RECORD& target, void (*landing)())
 // Errors and the compilers' language-level exceptions; not messages to a debugger, nor guard pages.
 static bool IsFault(DWORD code) { return code >= 0xC0000000; }
 
-// The rest of the frame that holds the base is of no use any more: the landing takes its place.
 bool FaultBase::Take(const EXCEPTION_RECORD& exception, CONTEXT& state) {
   if (!active || !IsFault(exception.ExceptionCode)) return false;
   active = false;
   fault = exception;
-  constexpr uintptr_t kBelowFrame = 1024;  // keeps clear of this object and its neighbours
-  const uintptr_t stack = (reinterpret_cast<uintptr_t>(this) - kBelowFrame) & ~uintptr_t{15};
-  state.Esp = static_cast<DWORD>(stack - sizeof(void*));  // as after a call instruction
+  // As after a call instruction.
+  state.Esp = reinterpret_cast<DWORD>(landing + sizeof landing - sizeof(void*));
   state.Eip = reinterpret_cast<DWORD>(land);
   SetChainHead(&record);
   return true;

@@ -31,11 +31,12 @@ class FrameWatch {
 };
 
 // The outermost frame of the interpreter's stack. A fault that nothing above it handles is copied
-// to `fault`, and the thread goes on in `land`, on this frame's stack; all above it is lost. Also
-// takes faults on stacks that the interpreter made itself, whose chains are empty.
+// to `fault`, and the thread goes on in `land`, on a piece of this frame; all above it is never run
+// again, but stays as it was. Also takes faults on stacks that the interpreter made itself, whose
+// chains are empty.
 class FaultBase {
  public:
-  // One at a time in a process. `land` must not return.
+  // One in a process. `land` must not return.
   FaultBase(EXCEPTION_RECORD& fault, void (*land)());
   FaultBase(const FaultBase&) = delete;
   FaultBase& operator=(const FaultBase&) = delete;
@@ -58,4 +59,5 @@ class FaultBase {
   void (*land)();
   DWORD thread;
   bool active = true;
+  alignas(16) char landing[4096];  // the stack of `land`
 };

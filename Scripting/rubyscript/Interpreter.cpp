@@ -1,7 +1,10 @@
 // SPDX-License-Identifier: MIT
 #include "Interpreter.h"
 
+#include <signal.h>
+
 #include "FrameWatch.h"
+#include "HostProcess.h"
 #include "Interrupter.h"
 #include "RubyRuntime.h"
 
@@ -16,6 +19,7 @@ struct Entry {
   bool interrupted = false;
   bool interruptible = false;
   bool leaving = false;  // its Ruby code is being unwound
+  HostProcess process = {};
 };
 
 // What the side that switches tells the other one.
@@ -75,11 +79,21 @@ void SetInnermost(Entry* entry) {
   ReleaseSRWLockExclusive(&state.lock);
 }
 
+// CRuby calls abort() when it finds itself broken.
+void OnAbort(int) {
+  RaiseException(static_cast<DWORD>(STATUS_FATAL_APP_EXIT) | 0x80000000, 0, 0, nullptr);
+}
+
+// With the process as a macro may change it.
 void RunTask() {
   Entry entry = {state.task, state.innermost, state.hostFrame};
+  entry.process.Save();
+  ApplyRubyEnvironment();
+  signal(SIGABRT, OnAbort);
   SetInnermost(&entry);
   entry.task->Run();
   SetInnermost(entry.outer);
+  entry.process.Restore();
 }
 
 // Does what the host asks until it resumes the pending call. Without one it never returns.
@@ -155,7 +169,16 @@ HRESULT CreateRubyFiber() {
   return S_OK;
 }
 
+// Nobody else puts the host's state back: what ran is never run again.
+void RestoreHost() {
+  Entry* entry = state.innermost;
+  while (entry && entry->outer) entry = entry->outer;
+  if (entry) entry->process.Restore();
+  SetInnermost(nullptr);
+}
+
 [[noreturn]] void RaiseFault() {
+  RestoreHost();
   const EXCEPTION_RECORD& fault = state.fault;
   RaiseException(fault.ExceptionCode, fault.ExceptionFlags & EXCEPTION_NONCONTINUABLE,
                  fault.NumberParameters, fault.ExceptionInformation);
@@ -203,16 +226,25 @@ HRESULT Interpreter::Enter(RubyTask* task) {
   }
 }
 
+static Entry* FindEntry(const void* owner) {
+  Entry* entry = state.innermost;
+  while (entry && entry->task->owner != owner) entry = entry->outer;
+  return entry;
+}
+
 void Interpreter::Interrupt(const void* owner) {
-  bool found = false;
   AcquireSRWLockExclusive(&state.lock);
-  for (Entry* each = state.innermost; each && !found; each = each->outer) {
-    if (each->task->owner != owner) continue;
-    each->interrupted = true;
-    found = true;
-  }
+  Entry* const entry = FindEntry(owner);
+  if (entry) entry->interrupted = true;
   ReleaseSRWLockExclusive(&state.lock);
-  if (found) Interrupter::Wake();
+  if (entry) Interrupter::Wake();
+}
+
+bool Interpreter::IsRunning(const void* owner) {
+  AcquireSRWLockExclusive(&state.lock);
+  const bool running = FindEntry(owner) != nullptr;
+  ReleaseSRWLockExclusive(&state.lock);
+  return running;
 }
 
 bool Interpreter::CallHost(HostCall& call) {
@@ -226,6 +258,8 @@ bool Interpreter::MustEnd() {
   const Entry* const entry = state.innermost;
   return !entry || entry->abandoned || entry->interrupted;
 }
+
+bool Interpreter::IsAbandoned() { return state.innermost->abandoned; }
 
 Interpreter::Urgency Interpreter::InterruptDue() {
   const Entry* const entry = state.innermost;

@@ -10,7 +10,7 @@
 //     returns  -------------------------------->    goes on
 //   returns  <----------------------------------  is done
 //
-// When the host discards the frame of a call, the pending CallHost answers false, the task unwinds
+// Around each task the host's process state is put back (see HostProcess.h). When the host discards the frame of a call, the pending CallHost answers false, the task unwinds
 // its Ruby code (`ensure` blocks run, but no further call is made) and is deleted.
 //
 // Threading: everything is called on the interpreter's thread, except Interrupt and HasStarted. "Host
@@ -60,12 +60,16 @@ class Interpreter {
   // Any thread. Ends what runs for the owner: within a few milliseconds when it is in Ruby code, at
   // the call's return when it is in a call of the host.
   static void Interrupt(const void* owner);
+  // Any thread. Whether a task of the owner is under way, perhaps in a call of the host.
+  static bool IsRunning(const void* owner);
 
   // Ruby side. False: the host has discarded the call's frame or asks for the end; then, or when
   // MustEnd answers true, the caller frees what it holds and calls Leave.
   static bool CallHost(HostCall& call);
   // Ruby side. Whether the innermost task is to end without making further calls.
   static bool MustEnd();
+  // Ruby side. Whether the host has discarded the innermost task's frame.
+  static bool IsAbandoned();
   // Ruby side. Whether the innermost task runs code that Interrupt may end now; false while the
   // engine prepares or tidies. Begins as false with each task.
   static void SetInterruptible(bool value);

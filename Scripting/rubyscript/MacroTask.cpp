@@ -3,9 +3,7 @@
 
 #include <new>
 
-#include "HostProcess.h"
 #include "Interrupter.h"
-#include "RubyRuntime.h"
 // Last: they rename what the headers above use.
 #include "ComObject.h"
 #include "RubyCall.h"
@@ -49,8 +47,8 @@ VALUE MacroTask::Compile() {
   TextForm form = half.form;
   for (UINT i = 0; i < SysStringLen(text); ++i)
     if (text[i] > 0xFF) form = TextForm::kUtf16;
-  return rb_funcall(half.context, rb_intern("compile"), 3, StringOf(text, form),
-                    ULONG2NUM(firstLine + 1), persistent ? Qtrue : Qfalse);
+  return rb_funcall(half.context, rb_intern("compile"), 4, StringOf(text, form),
+                    ULONG2NUM(firstLine + 1), ULONG2NUM(cookie), persistent ? Qtrue : Qfalse);
 }
 
 VALUE MacroTask::CallFunction() {
@@ -77,20 +75,26 @@ VALUE MacroTask::WorkBody(VALUE data) {
     case Kind::kDiscard:
       break;
   }
-  return task.persistent ? rb_funcall(task.half.context, rb_intern("successor"), 0) : Qnil;
+  return Qnil;
 }
 
 VALUE MacroTask::LeaveBody(VALUE data) {
   return rb_funcall(From(data).half.context, rb_intern("leave"), 0);
 }
 
+VALUE MacroTask::DiscardBody(VALUE data) {
+  RubyHalf& half = From(data).half;
+  half.context = From(data).persistent ? rb_funcall(half.context, rb_intern("successor"), 0) : Qnil;
+  if (NIL_P(half.context)) {
+    rb_gc_unregister_address(&half.context);
+    half.context = 0;
+  }
+  return Qnil;
+}
+
 void MacroTask::SetValue(VALUE passable) {
   if (kind == Kind::kDefines) {
     result = RTEST(passable) ? S_OK : S_FALSE;
-  } else if (kind == Kind::kDiscard) {
-    half.context = NIL_P(passable) ? 0 : passable;
-    if (!half.context) rb_gc_unregister_address(&half.context);
-    result = S_OK;
   } else if (kind == Kind::kCompile) {
     result = S_OK;
   } else {
@@ -108,6 +112,7 @@ struct Description {
   ULONG line;
   LONG column;
   BSTR lineText;
+  DWORD cookie;
 };
 
 BSTR TextOf(VALUE string, TextForm form) {
@@ -122,18 +127,20 @@ VALUE MacroTask::DescribeBody(VALUE data) {
       rb_funcall(description.context, rb_intern("describe"), 1, description.exception);
   description.line = NUM2ULONG(rb_ary_entry(parts, 1));
   description.column = NUM2LONG(rb_ary_entry(parts, 2));
+  description.cookie = NUM2ULONG(rb_ary_entry(parts, 4));
   description.text = TextOf(rb_ary_entry(parts, 0), description.form);
   description.lineText = TextOf(rb_ary_entry(parts, 3), description.form);
   return Qnil;
 }
 
 void MacroTask::SetError(VALUE exception) {
-  Description description = {half.context, exception, half.form, nullptr, 0, 0, nullptr};
+  Description description = {half.context, exception, half.form, nullptr, 0, 0, nullptr, 0};
   VALUE ignored;
   Protect(DescribeBody, reinterpret_cast<VALUE>(&description), ignored);
   if (!description.text) description.text = SysAllocString(L"An error that cannot be described.");
-  error = new (std::nothrow) ScriptError(E_FAIL, description.text, description.line,
-                                         description.column, description.lineText);
+  error =
+      new (std::nothrow) ScriptError(E_FAIL, description.text, description.line, description.column,
+                                     description.lineText, description.cookie);
   result = error ? DISP_E_EXCEPTION : E_OUTOFMEMORY;
 }
 
@@ -149,17 +156,18 @@ void MacroTask::Work() {
 }
 
 void MacroTask::Run() {
-  HostProcess process;
-  process.Save();
-  ApplyRubyEnvironment();
   VALUE ignored;
-  const Outcome prepared = Protect(PrepareBody, reinterpret_cast<VALUE>(this), ignored);
-  if (prepared == Outcome::kRaised) SetError(ignored);
-  if (prepared == Outcome::kDone) {
-    // The host's pointers are gone when a pending call is abandoned; nothing reads them then.
-    const unsigned long context = half.context;
-    Work();
-    if (context) Protect(LeaveBody, reinterpret_cast<VALUE>(this), ignored);
+  const VALUE self = reinterpret_cast<VALUE>(this);
+  if (kind == Kind::kDiscard) {
+    if (half.context) Protect(DiscardBody, self, ignored);
+    result = S_OK;
+    return;
   }
-  process.Restore();
+  const Outcome prepared = Protect(PrepareBody, self, ignored);
+  if (prepared == Outcome::kRaised) SetError(ignored);
+  if (prepared != Outcome::kDone) return;
+  Work();
+  Protect(LeaveBody, self, ignored);
+  // Nobody may ever close this engine.
+  if (Interpreter::IsAbandoned()) Protect(DiscardBody, self, ignored);
 }

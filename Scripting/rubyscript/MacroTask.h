@@ -51,8 +51,9 @@ class MacroTask final : public RubyTask {
   NamedItem* const items;
   BSTR text = nullptr;  // owned
   ULONG firstLine = 0;  // of the text, from 0
+  DWORD cookie = 0;     // the host's own name for the text
   bool persistent = false;
-  bool wantsValue = false;  // of kRun
+  bool wantsValue = false;                // of kRun
   const DISPPARAMS* arguments = nullptr;  // read before any macro code runs
 
   HRESULT result = E_FAIL;
@@ -63,6 +64,7 @@ class MacroTask final : public RubyTask {
   static unsigned long PrepareBody(unsigned long task);
   static unsigned long WorkBody(unsigned long task);
   static unsigned long LeaveBody(unsigned long task);
+  static unsigned long DiscardBody(unsigned long task);
   static unsigned long DescribeBody(unsigned long data);
   unsigned long Compile();
   unsigned long CallFunction();

@@ -19,17 +19,22 @@ static constexpr IID kActiveScriptParse = {
 static constexpr wchar_t kByteHostItem[] = L"tarn";
 
 HRESULT CreateScriptEngine(REFIID riid, void** object) {
-  ScriptEngine* const engine = new (std::nothrow) ScriptEngine;
-  if (!engine) return E_OUTOFMEMORY;
+  RubyHalf* const half = new (std::nothrow) RubyHalf;
+  ScriptEngine* const engine = half ? new (std::nothrow) ScriptEngine(half) : nullptr;
+  if (!engine) {
+    delete half;
+    return E_OUTOFMEMORY;
+  }
   const HRESULT result = engine->QueryInterface(riid, object);
   engine->Release();
   return result;
 }
 
-ScriptEngine::ScriptEngine() { AddServerReference(); }
+ScriptEngine::ScriptEngine(RubyHalf* rubyHalf) : half(rubyHalf) { AddServerReference(); }
 
 ScriptEngine::~ScriptEngine() {
   Close();
+  if (!half->context) delete half;
   ReleaseServerReference();
 }
 
@@ -132,11 +137,11 @@ HRESULT ScriptEngine::SetScriptState(SCRIPTSTATE newState) {
       ChangeState(SCRIPTSTATE_DISCONNECTED);
       return S_OK;
     case SCRIPTSTATE_INITIALIZED:
-      if (!initialized || depth > 0) return E_UNEXPECTED;
+      if (!initialized || Interpreter::IsRunning(this)) return E_UNEXPECTED;
       LowerState(newState);
       return S_OK;
     case SCRIPTSTATE_UNINITIALIZED:
-      if (depth > 0) return E_UNEXPECTED;
+      if (Interpreter::IsRunning(this)) return E_UNEXPECTED;
       LowerState(newState);
       return S_OK;
     case SCRIPTSTATE_CLOSED:
@@ -155,7 +160,7 @@ HRESULT ScriptEngine::GetScriptState(SCRIPTSTATE* current) {
 HRESULT ScriptEngine::Close() {
   if (state == SCRIPTSTATE_CLOSED) return S_FALSE;
   if (thread != 0 && thread != GetCurrentThreadId()) return E_UNEXPECTED;
-  if (depth > 0) {
+  if (Interpreter::IsRunning(this)) {
     closing = true;
     Interpreter::Interrupt(this);
     return S_OK;
@@ -168,7 +173,7 @@ HRESULT ScriptEngine::Close() {
 
 // Lets go of the context and of the items; what is persistent stays unless `all`.
 void ScriptEngine::Reset(bool all) {
-  if (half.context && Interpreter::Start() == S_OK) {
+  if (half->context && Interpreter::Start() == S_OK) {
     MacroTask* const task = NewTask(MacroTask::Kind::kDiscard, nullptr);
     if (task) {
       task->persistent = !all;
@@ -266,7 +271,7 @@ bool ScriptEngine::IsByteHost(LPCOLESTR code) const {
 }
 
 MacroTask* ScriptEngine::NewTask(MacroTask::Kind kind, LPCOLESTR text) {
-  MacroTask* const task = new (std::nothrow) MacroTask(this, kind, half, items);
+  MacroTask* const task = new (std::nothrow) MacroTask(this, kind, *half, items);
   if (!task || !text) return task;
   task->text = SysAllocString(text);
   if (task->text) return task;
@@ -282,12 +287,12 @@ HRESULT ScriptEngine::ParseScriptText(LPCOLESTR code, LPCOLESTR itemName, IUnkno
   if (!code) return E_POINTER;
   if (!IsUsable() || !initialized) return E_UNEXPECTED;
   if (itemName && *itemName && !FindItem(itemName)) return E_INVALIDARG;
-  if (!textFormKnown) half.form = IsByteHost(code) ? TextForm::kBytes : TextForm::kUtf16;
+  if (!textFormKnown) half->form = IsByteHost(code) ? TextForm::kBytes : TextForm::kUtf16;
   textFormKnown = true;
   MacroTask* const task = NewTask(MacroTask::Kind::kCompile, code);
   if (!task) return E_OUTOFMEMORY;
-  sourceCookie = cookie;
   task->firstLine = firstLine;
+  task->cookie = cookie;
   task->persistent = (flags & SCRIPTTEXT_ISPERSISTENT) != 0;
   const HRESULT compiled = Perform(task, nullptr, exception);
   if (FAILED(compiled) || !IsStarted()) return compiled;
@@ -323,7 +328,11 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
   IActiveScriptSite* const informed = site;
   informed->AddRef();
   if (runsCode) informed->OnEnterScript();
-  HRESULT outcome = Enter(task);
+  HRESULT outcome = E_ABORT;
+  if (state == SCRIPTSTATE_CLOSED)
+    delete task;  // the site has closed the engine
+  else
+    outcome = Enter(task);
   if (outcome == S_OK) {
     outcome = task->result;
     ScriptError* const error = task->error;
@@ -337,7 +346,7 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
   }
   if (runsCode) informed->OnLeaveScript();
   informed->Release();
-  if (depth == 0 && closing) Close();
+  if (closing && !Interpreter::IsRunning(this)) Close();
   Release();
   return outcome;
 }
@@ -346,9 +355,7 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
 HRESULT ScriptEngine::Enter(MacroTask* task) {
   const HRESULT started = Interpreter::Start();
   if (started == S_OK) {
-    ++depth;
     const HRESULT entered = Interpreter::Enter(task);
-    --depth;
     ReleaseCollectedObjects();
     return entered;
   }
@@ -362,13 +369,12 @@ HRESULT ScriptEngine::Enter(MacroTask* task) {
              L"anew to run Ruby macros again.",
              Interpreter::LostTo());
   ScriptError* const error =
-      new (std::nothrow) ScriptError(started, SysAllocString(text), 0, 0, nullptr);
+      new (std::nothrow) ScriptError(started, SysAllocString(text), 0, 0, nullptr, 0);
   return error ? Report(error, nullptr) : started;
 }
 
 // Takes over the error.
 HRESULT ScriptEngine::Report(ScriptError* error, EXCEPINFO* exception) {
-  error->SetContext(sourceCookie);
   const bool taken = site && SUCCEEDED(site->OnScriptError(error));
   if (!taken) error->Fill(exception);
   error->Release();
@@ -399,7 +405,7 @@ HRESULT ScriptEngine::GetScriptThreadState(SCRIPTTHREADID id, SCRIPTTHREADSTATE*
   if (!current) return E_POINTER;
   *current = SCRIPTTHREADSTATE_NOTINSCRIPT;
   if (!IsEngineThread(id, thread)) return E_INVALIDARG;
-  if (depth > 0) *current = SCRIPTTHREADSTATE_RUNNING;
+  if (Interpreter::IsRunning(this)) *current = SCRIPTTHREADSTATE_RUNNING;
   return S_OK;
 }
 

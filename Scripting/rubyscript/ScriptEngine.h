@@ -26,7 +26,7 @@ HRESULT CreateScriptEngine(REFIID riid, void** object);
 
 class ScriptEngine final : public IActiveScript, public IActiveScriptParse, public IObjectSafety {
  public:
-  ScriptEngine();
+  explicit ScriptEngine(RubyHalf* half);  // takes it over
   ScriptEngine(const ScriptEngine&) = delete;
   ScriptEngine& operator=(const ScriptEngine&) = delete;
 
@@ -90,9 +90,7 @@ class ScriptEngine final : public IActiveScript, public IActiveScriptParse, publ
   SCRIPTSTATE state = SCRIPTSTATE_UNINITIALIZED;
   bool initialized = false;  // InitNew has been called
   bool textFormKnown = false;
-  int depth = 0;         // of tasks that run: the host's functions nest them
-  bool closing = false;  // as soon as the last of them has ended
+  bool closing = false;  // as soon as no task of it is under way
   NamedItem* items = nullptr;
-  RubyHalf half;
-  DWORD sourceCookie = 0;  // of the latest text
+  RubyHalf* const half;  // outlives an engine that cannot enter the interpreter any more
 };

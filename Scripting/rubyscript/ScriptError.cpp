@@ -4,12 +4,13 @@
 #include <oleauto.h>
 
 ScriptError::ScriptError(HRESULT errorCode, BSTR text, ULONG errorLine, LONG errorColumn,
-                         BSTR textOfLine)
+                         BSTR textOfLine, DWORD cookie)
     : code(errorCode),
       description(text),
       line(errorLine),
       column(errorColumn),
-      lineText(textOfLine) {}
+      lineText(textOfLine),
+      context(cookie) {}
 
 ScriptError::~ScriptError() {
   SysFreeString(description);

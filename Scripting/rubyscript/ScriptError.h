@@ -11,10 +11,11 @@
 
 class ScriptError final : public IActiveScriptError {
  public:
-  // Line and column count from 0. Takes over both texts; null counts as empty.
-  ScriptError(HRESULT code, BSTR description, ULONG line, LONG column, BSTR lineText);
+  // Line and column count from 0. Takes over both texts; null counts as empty. The context is the
+  // cookie that came with the source.
+  ScriptError(HRESULT code, BSTR description, ULONG line, LONG column, BSTR lineText,
+              DWORD context);
 
-  void SetContext(DWORD value) { context = value; }  // the cookie that came with the source
   // Null: no information. Fills fresh strings, which the caller frees.
   void Fill(EXCEPINFO* exception) const;
 
@@ -35,5 +36,5 @@ class ScriptError final : public IActiveScriptError {
   const ULONG line;
   const LONG column;
   const BSTR lineText;
-  DWORD context = 0;
+  const DWORD context;
 };

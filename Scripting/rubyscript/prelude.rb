@@ -113,7 +113,7 @@ module ActiveScript
 
     def write(*texts)
       texts.map!(&:to_s)
-      texts.each { |text| @pending << text.b }
+      texts.each { |text| @pending << as_utf8(text).b }
       # A stopped macro's last words have nowhere to go; a thread's wait for the main thread.
       pass_on if ActiveScript.can_call?
       texts.sum(&:bytesize)
@@ -132,6 +132,14 @@ module ActiveScript
     end
 
     private
+
+    PLAIN = [Encoding::UTF_8, Encoding::US_ASCII, Encoding::BINARY].freeze
+    private_constant :PLAIN
+
+    def as_utf8(text)
+      return text if PLAIN.include?(text.encoding) || !@context.messenger
+      text.encode(Encoding::UTF_8, invalid: :replace, undef: :replace)
+    end
 
     def pass_on
       messenger = @context.messenger
@@ -172,7 +180,7 @@ module ActiveScript
   # its global variables. They exist while the context is entered and are put aside otherwise, so
   # Ruby's own top level serves all of them, one at a time.
   class Context
-    Source = Struct.new(:lines, :first_line)
+    Source = Struct.new(:lines, :first_line, :cookie)
     FEATURES = $LOADED_FEATURES
     PATH = $LOAD_PATH.dup.freeze
 
@@ -182,6 +190,14 @@ module ActiveScript
     class << self
       def current = ENTERED.last
       attr_accessor :baseline
+
+      # What CRuby adds to messages. Loaded when there is one: it takes longer than all the rest.
+      def load_hints
+        require "error_highlight"
+        require "did_you_mean"
+      rescue LoadError
+        nil
+      end
     end
 
     attr_reader :byte_host # whether texts go to it as bytes
@@ -215,11 +231,12 @@ module ActiveScript
       @messenger || nil
     end
 
-    # For the next run. Persistent code also runs in the context's successor.
-    def compile(source, first_line, persistent)
+    # For the next run. Persistent code also runs in the context's successor. The cookie is the host's
+    # own name for the text.
+    def compile(source, first_line, cookie, persistent)
       name = @sources.empty? ? "macro" : "macro#{@sources.size + 1}"
       source = source.b.delete_prefix("\xEF\xBB\xBF".b).force_encoding(Encoding::UTF_8)
-      @sources[name] = Source.new(source.b.split(/\r\n|[\r\n]/n), first_line)
+      @sources[name] = Source.new(source.b.split(/\r\n|[\r\n]/n), first_line, cookie)
       @data = source[/^__END__\r?\n(.*)/m, 1] if source.valid_encoding? && source.include?("__END__")
       RubyVM.keep_script_lines = true
       code = RubyVM::InstructionSequence.compile(source, name, nil, first_line)
@@ -276,8 +293,12 @@ module ActiveScript
 
     # Names that the host may call: what the macro has defined at its top level.
     def defines?(name)
-      MAIN.respond_to?(name, true) && !Context.baseline.methods.key?(name.to_sym) &&
-        !Kernel.private_method_defined?(name)
+      name = name.to_sym
+      baseline = Context.baseline
+      MAIN.respond_to?(name, true) && !Kernel.method_defined?(name) &&
+        !Kernel.private_method_defined?(name) && !BasicObject.private_method_defined?(name) &&
+        !BasicObject.method_defined?(name) && !baseline.methods.key?(name) &&
+        !baseline.singleton_methods.key?(name)
     end
 
     def inherit(sources, codes)
@@ -291,16 +312,20 @@ module ActiveScript
       block
     end
 
-    # What the host is told of an error: description, line and column from 0, the line's text.
+    # What the host is told of an error: description, line and column from 0, the line's text, the
+    # cookie of its source.
     def describe(error)
+      Context.load_hints if NameError === error || KeyError === error
       name, line, column = syntax_position(error) || run_time_position(error)
       text = line_text(name, line)
-      [description(error), line ? line - 1 : 0, column_in(text, column), text.to_s]
+      [description(error), line ? line - 1 : 0, column_in(text, column), text.to_s,
+       @sources[name]&.cookie.to_i]
     end
 
     # --- Putting the world aside -----------------------------------------------------------------
 
     def suspend
+      $VERBOSE = nil # set again from the baseline
       take_constants
       @methods = take_methods(Object, Context.baseline.methods)
       @singleton_methods = take_methods(MAIN.singleton_class, Context.baseline.singleton_methods)
@@ -312,12 +337,14 @@ module ActiveScript
     end
 
     def resume
+      verbose, $VERBOSE = $VERBOSE, nil
       @constants.each { |name, value| Object.const_set(name, value) }
       @constants = {}
       give_methods(Object, @methods)
       give_methods(MAIN.singleton_class, @singleton_methods)
       @variables.each { |name, value| MAIN.instance_variable_set(name, value) }
       @variables = {}
+      $VERBOSE = verbose
       @globals.each { |name, value| ActiveScript.set_global(name, value) }
       FEATURES.concat(@features)
       $stdout = @output unless @globals.key?(:$stdout)
@@ -416,7 +443,7 @@ module ActiveScript
     # In bytes. CRuby can tell where the node of a frame begins.
     def column_of(error, location)
       node = RubyVM::AbstractSyntaxTree.of(location, keep_script_lines: true)
-      spot = ErrorHighlight::Spotter.new(node, point_type: :name).spot if NameError === error
+      spot = ErrorHighlight.spot(node, point_type: :name, name: error.name) if NameError === error
       return spot[:first_column] if spot && spot[:first_lineno] == location.lineno
       node.first_lineno == location.lineno ? node.first_column : 0
     rescue StandardError
@@ -439,7 +466,8 @@ module ActiveScript
       message = error.class.name.to_s if message.empty?
       first, rest = message.split("\n", 2)
       frames = Array(error.backtrace).select { |each| @sources.key?(each[/\A[^:]*/]) }
-                                     .map { |each| each.sub("`<compiled>'", "`<main>'") }
+                                     .reject { |each| each.end_with?("in `method_missing'") }
+                                     .map { |each| each.sub("<compiled>'", "<main>'") }
       text = SyntaxError === error ? message : ["#{first} (#{error.class})", rest].compact.join("\n")
       [text, *frames.first(20).map { |frame| "\tfrom #{frame}" }].join("\n")
     end

@@ -21,7 +21,7 @@ void Trace(RawHost*, const char* format, const char* text) {
 void THISCALL SetFixCRLF(RawHost*, char on) { Log("fix CRLF " + std::to_string(on)); }
 void THISCALL SetFixDelimiter(RawHost*, char on) { Log("fix delimiter " + std::to_string(on)); }
 unsigned THISCALL FunctionId(RawHost*, const char* name) {
-  return name == "f"s ? 7 : name == "g"s ? 0 : 2000;
+  return name == "f"s ? 7 : name == "g"s ? 0 : name == "write"s ? 9 : 2000;
 }
 void* THISCALL WindowHandle(RawHost*) { return reinterpret_cast<void*>(0x1234); }
 void THISCALL CallFunction(RawHost* host, unsigned id) {

@@ -32,7 +32,7 @@ std::vector<void*> Table(Functions*... functions) {
 inline void THISCALL Unused() { Log("an unused slot was called"); }
 
 // Its address is the host interface's: the table comes first. It knows two macro functions, f and
-// g, by the numbers 7 and 0.
+// g, by the numbers 7 and 0, and the write of keyboard macros, 9.
 struct RawHost {
   RawHost();
   ~RawHost();
