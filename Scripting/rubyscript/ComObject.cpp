@@ -68,7 +68,7 @@ struct Invocation final : HostCall {
   HRESULT outcome = E_FAIL;
 
   void Run() override {
-    dispatch->AddRef();  // the call may make the engine let go of it
+    ReleaseCollectedObjects();
     const bool wantsResult = (flags & DISPATCH_PROPERTYGET) != 0;
     UINT badArgument = 0;
     outcome = dispatch->Invoke(id, IID_NULL, LOCALE_USER_DEFAULT, flags, &parameters,
@@ -76,7 +76,16 @@ struct Invocation final : HostCall {
     if (outcome == DISP_E_EXCEPTION && exception.pfnDeferredFillIn)
       exception.pfnDeferredFillIn(&exception);
     if (SUCCEEDED(outcome) && result.vt == VT_UNKNOWN && result.punkVal) TakeDispatch();
-    dispatch->Release();
+    if (!Interpreter::MustEnd()) return;
+    VariantClear(&result);  // nobody takes it any more
+    FreeException();
+  }
+
+  void FreeException() {
+    SysFreeString(exception.bstrDescription);
+    SysFreeString(exception.bstrSource);
+    SysFreeString(exception.bstrHelpFile);
+    exception = {};
   }
 
   // An object that has no IDispatch stays what it is.
@@ -113,11 +122,10 @@ VALUE BstrToString(BSTR text, TextForm form) {
   EXCEPINFO& exception = call.exception;
   const VALUE description = BstrToString(exception.bstrDescription, wrapped.form);
   const VALUE source = BstrToString(exception.bstrSource, wrapped.form);
-  SysFreeString(exception.bstrDescription);
-  SysFreeString(exception.bstrSource);
-  SysFreeString(exception.bstrHelpFile);
   const bool coded = call.outcome == DISP_E_EXCEPTION && FAILED(exception.scode);
-  RaiseFailure(wrapped, name, coded ? exception.scode : call.outcome, description, source);
+  const HRESULT code = coded ? exception.scode : call.outcome;
+  call.FreeException();
+  RaiseFailure(wrapped, name, code, description, source);
 }
 
 // A call on a thread of the macro's own, or on an object whose engine is closed.
@@ -248,6 +256,7 @@ VALUE MethodMissing(int count, VALUE* arguments, VALUE self) {
   bool isSetter = false;
   const long length = NameLength(name, isSetter);
   if (length == 0) return rb_call_super(count, arguments);
+  if (isSetter) rb_check_arity(count, 2, UNLIMITED_ARGUMENTS);  // the value, behind any indexes
   CheckCallable(wrapped);
   VALUE id = rb_hash_lookup(wrapped.ids, symbol);
   if (NIL_P(id)) {

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // `ActiveScript::ComObject`: an IDispatch as a Ruby object. Its methods and properties are found by
-// name when they are called; see prelude.rb for what else it answers.
+// name when they are called; see prelude/host_objects.rb for what else it answers.
 //
 // Ownership: each object holds one reference, which is given back on the host's side, after the
 // object has been collected or its context has been closed.

@@ -154,6 +154,8 @@ void HostProcess::ApplyAdditions() const {
 void HostProcess::Save() {
   Forget();
   errorMode = GetErrorMode();
+  fileMask = _umask(0);
+  _umask(fileMask);
   const char* const name = setlocale(LC_ALL, nullptr);
   locale = name ? _strdup(name) : nullptr;
   for (int i = 0; i < kSignalCount; ++i) handlers[i] = SignalHandler(kSignals[i]);
@@ -166,6 +168,7 @@ void HostProcess::Save() {
 void HostProcess::Restore() const {
   if (!saved) return;
   SetErrorMode(errorMode);
+  _umask(fileMask);
   if (locale) setlocale(LC_ALL, locale);
   for (int i = 0; i < kSignalCount; ++i)
     if (handlers[i] != SIG_ERR) signal(kSignals[i], handlers[i]);

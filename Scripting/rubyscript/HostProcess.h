@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The process-wide state that belongs to the host and that CRuby or a script may change: a snapshot
 // of it is taken before a run and put back after it. It covers the locale, the signal handlers and
-// the modes of the standard streams of msvcrt, the error mode, the current directory and the
+// the modes of the standard streams and the file mask of msvcrt, the error mode, the current directory and the
 // environment. The floating-point control words are switched elsewhere, with the fibers.
 //
 // The variables that CRuby adds to the environment when it starts (HOME and the like) are for
@@ -54,6 +54,7 @@ class HostProcess {
 
   bool saved = false;
   unsigned errorMode = 0;
+  int fileMask = 0;
   char* locale = nullptr;
   __p_sig_fn_t handlers[kSignalCount] = {};  // SIG_ERR: unknown
   int modes[kStreams] = {};                  // -1: closed

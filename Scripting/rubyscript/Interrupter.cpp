@@ -77,7 +77,9 @@ void Interrupter::EnsureAlive() {
 void Interrupter::Settle() {
   rb_remove_event_hook(OnEvent);
   VALUE ignored;
-  Protect(CheckInterrupts, Qnil, ignored);
+  constexpr int kMostPending = 1000;  // a thread of the macro's may have raised some as well
+  for (int i = 0; i < kMostPending; ++i)
+    if (Protect(CheckInterrupts, Qnil, ignored) == Outcome::kDone) break;
 }
 
 void Interrupter::Wake() {

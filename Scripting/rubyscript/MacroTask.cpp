@@ -84,6 +84,7 @@ VALUE MacroTask::LeaveBody(VALUE data) {
 
 VALUE MacroTask::DiscardBody(VALUE data) {
   RubyHalf& half = From(data).half;
+  rb_funcall(half.context, rb_intern("close"), 0);
   half.context = From(data).persistent ? rb_funcall(half.context, rb_intern("successor"), 0) : Qnil;
   if (NIL_P(half.context)) {
     rb_gc_unregister_address(&half.context);
@@ -133,10 +134,14 @@ VALUE MacroTask::DescribeBody(VALUE data) {
   return Qnil;
 }
 
+// Asks the exception, which may run the macro's own code: Ruby's exceptions have methods.
 void MacroTask::SetError(VALUE exception) {
   Description description = {half.context, exception, half.form, nullptr, 0, 0, nullptr, 0};
   VALUE ignored;
-  Protect(DescribeBody, reinterpret_cast<VALUE>(&description), ignored);
+  if (Protect(DescribeBody, reinterpret_cast<VALUE>(&description), ignored) == Outcome::kLeft) {
+    result = E_ABORT;
+    return;
+  }
   if (!description.text) description.text = SysAllocString(L"An error that cannot be described.");
   error =
       new (std::nothrow) ScriptError(E_FAIL, description.text, description.line, description.column,
@@ -146,13 +151,15 @@ void MacroTask::SetError(VALUE exception) {
 
 void MacroTask::Work() {
   VALUE outcomeValue;
+  result = E_ABORT;
   Interpreter::SetInterruptible(true);
-  const Outcome outcome = Protect(WorkBody, reinterpret_cast<VALUE>(this), outcomeValue);
+  if (!Interpreter::MustEnd()) {  // else it was interrupted before it began
+    const Outcome outcome = Protect(WorkBody, reinterpret_cast<VALUE>(this), outcomeValue);
+    if (outcome == Outcome::kDone) SetValue(outcomeValue);
+    if (outcome == Outcome::kRaised) SetError(outcomeValue);
+  }
   Interpreter::SetInterruptible(false);
   Interrupter::Settle();
-  if (outcome == Outcome::kDone) SetValue(outcomeValue);
-  if (outcome == Outcome::kRaised) SetError(outcomeValue);
-  if (outcome == Outcome::kLeft) result = E_ABORT;
 }
 
 void MacroTask::Run() {

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // What a script engine has done in the interpreter: compile a text, run what is compiled, call a
-// macro's function. Around each one the engine's context is entered and left (see prelude.rb), and
+// macro's function. Around each one the engine's context is entered and left (see prelude/context.rb), and
 // the host's process state is put back (see HostProcess.h).
 //
 // Ownership: as RubyTask. What a task points to belongs to the engine and outlives the task, which
@@ -41,17 +41,17 @@ class MacroTask final : public RubyTask {
     kDiscard,  // the context; what was persistent is compiled for the next one
   };
 
-  MacroTask(const void* engine, Kind taskKind, RubyHalf& rubyHalf, NamedItem* namedItems)
+  MacroTask(const void* engine, Kind taskKind, RubyHalf& rubyHalf, NamedItem* const& namedItems)
       : RubyTask(engine), kind(taskKind), half(rubyHalf), items(namedItems) {}
   ~MacroTask() override;
   void Run() override;
 
   const Kind kind;
   RubyHalf& half;
-  NamedItem* const items;
-  BSTR text = nullptr;  // owned
-  ULONG firstLine = 0;  // of the text, from 0
-  DWORD cookie = 0;     // the host's own name for the text
+  NamedItem* const& items;  // the engine's list
+  BSTR text = nullptr;      // owned
+  ULONG firstLine = 0;      // of the text, from 0
+  DWORD cookie = 0;         // the host's own name for the text
   bool persistent = false;
   bool wantsValue = false;                // of kRun
   const DISPPARAMS* arguments = nullptr;  // read before any macro code runs

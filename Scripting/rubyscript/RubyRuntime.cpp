@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: MIT
 #include "RubyRuntime.h"
 
+#include <fcntl.h>
+#include <io.h>
+
 #include <new>
 
 #include "HostProcess.h"
@@ -12,8 +15,36 @@
 
 namespace {
 
-constexpr char kPrelude[] = {
-#embed "prelude.rb"
+// The engine's Ruby part, in the order in which its files need each other.
+constexpr char kHostObjects[] = {
+#embed "prelude/host_objects.rb"
+};
+constexpr char kHostOutput[] = {
+#embed "prelude/host_output.rb"
+};
+constexpr char kContext[] = {
+#embed "prelude/context.rb"
+};
+constexpr char kGuest[] = {
+#embed "prelude/guest.rb"
+};
+constexpr char kWorld[] = {
+#embed "prelude/world.rb"
+};
+
+struct PreludeFile {
+  const char* name;
+  const char* text;
+  long bytes;
+};
+
+// The last one takes stock of what there is before any macro.
+constexpr PreludeFile kPrelude[] = {
+    {"rubyscript/host_objects.rb", kHostObjects, sizeof kHostObjects},
+    {"rubyscript/host_output.rb", kHostOutput, sizeof kHostOutput},
+    {"rubyscript/guest.rb", kGuest, sizeof kGuest},
+    {"rubyscript/context.rb", kContext, sizeof kContext},
+    {"rubyscript/world.rb", kWorld, sizeof kWorld},
 };
 
 // The state at the start; keeps the variables that CRuby has added.
@@ -35,6 +66,12 @@ VALUE CanCall(VALUE) {
   return Interpreter::IsMainThread() && !Interpreter::MustEnd() ? Qtrue : Qfalse;
 }
 
+VALUE LowestDescriptor(VALUE) {
+  const int descriptor = _open("NUL", _O_RDONLY);
+  if (descriptor >= 0) _close(descriptor);
+  return INT2FIX(descriptor);
+}
+
 VALUE Global(VALUE, VALUE name) { return rb_gv_get(rb_id2name(SYM2ID(name))); }
 
 VALUE SetGlobal(VALUE, VALUE name, VALUE value) {
@@ -45,12 +82,15 @@ VALUE DefineModule(VALUE) {
   const VALUE module = rb_define_module("ActiveScript");
   rb_define_singleton_method(module, "system_message", SystemMessage, 1);
   rb_define_singleton_method(module, "can_call?", CanCall, 0);
+  rb_define_singleton_method(module, "lowest_descriptor", LowestDescriptor, 0);
   rb_define_singleton_method(module, "global", Global, 1);
   rb_define_singleton_method(module, "set_global", SetGlobal, 2);
   DefineComObject(module);
   const VALUE binding = rb_const_get(rb_cObject, rb_intern("TOPLEVEL_BINDING"));
-  return rb_funcall(binding, rb_intern("eval"), 3, rb_utf8_str_new(kPrelude, sizeof kPrelude),
-                    rb_utf8_str_new_cstr("rubyscript/prelude.rb"), INT2FIX(1));
+  for (const PreludeFile& file : kPrelude)
+    rb_funcall(binding, rb_intern("eval"), 3, rb_utf8_str_new(file.text, file.bytes),
+               rb_utf8_str_new_cstr(file.name), INT2FIX(1));
+  return Qnil;
 }
 
 // With these options CRuby reads nothing of the host's command line and environment.

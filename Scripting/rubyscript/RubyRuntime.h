@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // Starts CRuby inside a process that is not its own: without a command line, rubygems or the
 // environment's options, and with the host's process state as it was (see HostProcess.h). Defines
-// the engine's module `ActiveScript`, native part and prelude.rb.
+// the engine's module `ActiveScript`, native part and prelude/.
 //
 // Threading: Ruby side (see Interpreter.h).
 #pragma once

@@ -8,6 +8,7 @@
 #include <new>
 
 #include "ComObject.h"
+#include "FrameWatch.h"
 #include "ScriptDispatch.h"
 #include "Server.h"
 
@@ -63,11 +64,41 @@ ULONG ScriptEngine::Release() {
   return static_cast<ULONG>(left);
 }
 
+// --- Calls ---------------------------------------------------------------------------------------
+
+// A call of the host that may call it back: keeps engine and site alive, also from a host that lets
+// go of them meanwhile, and gives both back when its frame is discarded.
+class ScriptEngine::Call {
+ public:
+  explicit Call(ScriptEngine* called) : engine(called), site(called->site), watch(End, this) {
+    engine->AddRef();
+    if (site) site->AddRef();
+    ++engine->calls;
+  }
+  ~Call() {
+    if (engine->calls == 1 && engine->closing) engine->FinishClose();
+    End(this);
+  }
+
+ private:
+  static void End(void* context) {
+    Call& call = *static_cast<Call*>(context);
+    --call.engine->calls;
+    if (call.site) call.site->Release();
+    call.engine->Release();
+  }
+
+  ScriptEngine* const engine;
+  IActiveScriptSite* const site;
+  FrameWatch watch;
+};
+
 // --- Site and states -----------------------------------------------------------------------------
 
-// On its own thread, with a site, and not closed.
+// On its own thread, with a site, and neither closed nor about to be. To be asked again after every
+// call out.
 bool ScriptEngine::IsUsable() const {
-  return thread == GetCurrentThreadId() && site && state != SCRIPTSTATE_CLOSED;
+  return thread == GetCurrentThreadId() && site && state != SCRIPTSTATE_CLOSED && !closing;
 }
 
 bool ScriptEngine::IsStarted() const {
@@ -81,6 +112,7 @@ HRESULT ScriptEngine::SetScriptSite(IActiveScriptSite* newSite) {
   thread = GetCurrentThreadId();
   site = newSite;
   site->AddRef();
+  const Call call(this);
   if (initialized) ChangeState(SCRIPTSTATE_INITIALIZED);
   return S_OK;
 }
@@ -93,6 +125,7 @@ HRESULT ScriptEngine::GetScriptSite(REFIID riid, void** object) {
 
 HRESULT ScriptEngine::InitNew() {
   if (initialized || state == SCRIPTSTATE_CLOSED) return E_UNEXPECTED;
+  const Call call(this);
   initialized = true;
   if (site) ChangeState(SCRIPTSTATE_INITIALIZED);
   return S_OK;
@@ -122,26 +155,19 @@ void ScriptEngine::LowerState(SCRIPTSTATE newState) {
 
 HRESULT ScriptEngine::SetScriptState(SCRIPTSTATE newState) {
   if (!IsUsable()) return E_UNEXPECTED;
+  const bool nested = calls > 0;
+  const Call call(this);
   switch (newState) {
     case SCRIPTSTATE_STARTED:
-    case SCRIPTSTATE_CONNECTED: {
-      if (!initialized) return E_UNEXPECTED;
-      const bool first = !IsStarted();
-      const HRESULT requested = first ? RequestItems() : S_OK;
-      if (FAILED(requested)) return requested;
-      ChangeState(newState);
-      return first ? RunQueue(nullptr, nullptr) : S_OK;
-    }
+    case SCRIPTSTATE_CONNECTED:
+      return initialized ? Start(newState) : E_UNEXPECTED;
     case SCRIPTSTATE_DISCONNECTED:
       if (!IsStarted()) return E_UNEXPECTED;
       ChangeState(SCRIPTSTATE_DISCONNECTED);
       return S_OK;
     case SCRIPTSTATE_INITIALIZED:
-      if (!initialized || Interpreter::IsRunning(this)) return E_UNEXPECTED;
-      LowerState(newState);
-      return S_OK;
     case SCRIPTSTATE_UNINITIALIZED:
-      if (Interpreter::IsRunning(this)) return E_UNEXPECTED;
+      if (nested || (newState == SCRIPTSTATE_INITIALIZED && !initialized)) return E_UNEXPECTED;
       LowerState(newState);
       return S_OK;
     case SCRIPTSTATE_CLOSED:
@@ -150,25 +176,38 @@ HRESULT ScriptEngine::SetScriptState(SCRIPTSTATE newState) {
   return E_INVALIDARG;
 }
 
+HRESULT ScriptEngine::Start(SCRIPTSTATE newState) {
+  const bool first = !IsStarted();
+  if (first) {
+    const HRESULT requested = RequestItems();
+    if (FAILED(requested)) return requested;
+  }
+  ChangeState(newState);
+  if (!first) return S_OK;
+  return IsUsable() ? RunQueue(nullptr, nullptr) : E_ABORT;
+}
+
 HRESULT ScriptEngine::GetScriptState(SCRIPTSTATE* current) {
   if (!current) return E_POINTER;
   *current = state;
   return S_OK;
 }
 
-// During a run the macro is ended first; the rest follows when it has come to its end.
+// Called back by the engine, the host has what runs ended first; the rest follows at its end.
 HRESULT ScriptEngine::Close() {
-  if (state == SCRIPTSTATE_CLOSED) return S_FALSE;
+  if (state == SCRIPTSTATE_CLOSED || closing) return S_FALSE;
   if (thread != 0 && thread != GetCurrentThreadId()) return E_UNEXPECTED;
-  if (Interpreter::IsRunning(this)) {
-    closing = true;
+  closing = true;
+  if (calls > 0)
     Interpreter::Interrupt(this);
-    return S_OK;
-  }
-  AddRef();
-  LowerState(SCRIPTSTATE_CLOSED);
-  Release();
+  else
+    const Call call(this);  // whose end closes
   return S_OK;
+}
+
+void ScriptEngine::FinishClose() {
+  LowerState(SCRIPTSTATE_CLOSED);
+  closing = false;
 }
 
 // Lets go of the context and of the items; what is persistent stays unless `all`.
@@ -180,8 +219,10 @@ void ScriptEngine::Reset(bool all) {
       if (Interpreter::Enter(task) == S_OK) delete task;
     }
   }
-  ReleaseObjectsOf(this);
-  ReleaseCollectedObjects();
+  if (Interpreter::IsMainThread() && !Interpreter::LostTo()) {
+    ReleaseObjectsOf(this);
+    ReleaseCollectedObjects();
+  }
   NamedItem** link = &items;
   while (NamedItem* const item = *link) {
     if (item->dispatch) item->dispatch->Release();
@@ -237,6 +278,7 @@ HRESULT ScriptEngine::AddNamedItem(LPCOLESTR name, DWORD flags) {
 // Asks the site for the objects of all items that are new.
 HRESULT ScriptEngine::RequestItems() {
   for (NamedItem* item = items; item; item = item->next) {
+    if (!IsUsable()) return E_ABORT;
     if (item->requested || (item->flags & SCRIPTITEM_CODEONLY)) continue;
     IUnknown* unknown = nullptr;
     HRESULT result = site->GetItemInfo(item->name, SCRIPTINFO_IUNKNOWN, &unknown, nullptr);
@@ -249,7 +291,7 @@ HRESULT ScriptEngine::RequestItems() {
     item->dispatch = static_cast<IDispatch*>(dispatch);
     item->requested = true;
   }
-  return S_OK;
+  return IsUsable() ? S_OK : E_ABORT;
 }
 
 HRESULT ScriptEngine::GetScriptDispatch(LPCOLESTR itemName, IDispatch** dispatch) {
@@ -287,6 +329,7 @@ HRESULT ScriptEngine::ParseScriptText(LPCOLESTR code, LPCOLESTR itemName, IUnkno
   if (!code) return E_POINTER;
   if (!IsUsable() || !initialized) return E_UNEXPECTED;
   if (itemName && *itemName && !FindItem(itemName)) return E_INVALIDARG;
+  const Call call(this);
   if (!textFormKnown) half->form = IsByteHost(code) ? TextForm::kBytes : TextForm::kUtf16;
   textFormKnown = true;
   MacroTask* const task = NewTask(MacroTask::Kind::kCompile, code);
@@ -309,30 +352,29 @@ HRESULT ScriptEngine::RunQueue(VARIANT* result, EXCEPINFO* exception) {
 
 HRESULT ScriptEngine::Defines(LPCOLESTR name) {
   if (!IsUsable() || !IsStarted()) return E_UNEXPECTED;
+  const Call call(this);
   return Perform(NewTask(MacroTask::Kind::kDefines, name), nullptr, nullptr);
 }
 
 HRESULT ScriptEngine::CallFunction(LPCOLESTR name, const DISPPARAMS* arguments, VARIANT* result,
                                    EXCEPINFO* exception) {
   if (!IsUsable() || !IsStarted()) return E_UNEXPECTED;
+  const Call call(this);
   MacroTask* const task = NewTask(MacroTask::Kind::kCall, name);
   if (task) task->arguments = arguments;
   return Perform(task, result, exception);
 }
 
-// Runs and deletes the task; what went wrong has gone to the site.
+// Runs and deletes the task, in a Call; what went wrong has gone to the site.
 HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* exception) {
   if (!task) return E_OUTOFMEMORY;
   const bool runsCode = task->kind == MacroTask::Kind::kRun || task->kind == MacroTask::Kind::kCall;
-  AddRef();
-  IActiveScriptSite* const informed = site;
-  informed->AddRef();
-  if (runsCode) informed->OnEnterScript();
+  if (runsCode) site->OnEnterScript();
   HRESULT outcome = E_ABORT;
-  if (state == SCRIPTSTATE_CLOSED)
-    delete task;  // the site has closed the engine
-  else
+  if (IsUsable())
     outcome = Enter(task);
+  else
+    delete task;
   if (outcome == S_OK) {
     outcome = task->result;
     ScriptError* const error = task->error;
@@ -344,10 +386,7 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
     delete task;
     if (error) outcome = Report(error, exception);
   }
-  if (runsCode) informed->OnLeaveScript();
-  informed->Release();
-  if (closing && !Interpreter::IsRunning(this)) Close();
-  Release();
+  if (runsCode) site->OnLeaveScript();
   return outcome;
 }
 

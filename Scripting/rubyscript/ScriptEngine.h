@@ -9,6 +9,9 @@
 // Ownership: COM's. It holds the site from SetScriptSite to Close.
 // Errors: HRESULTs as Active Scripting documents them. A script's own errors go to the site's
 // OnScriptError; where the site takes one, the call answers SCRIPT_E_REPORTED.
+// The host may call the engine back from what the engine calls; it may also leave its frames then by
+// a jump or a fault, and need not come back. Closing waits for the outermost call to end, resetting is
+// refused until then.
 // Threading: the thread of SetScriptSite; others get E_UNEXPECTED. AddRef, Release, GetScriptState,
 // InterruptScriptThread and the questions about threads may come from any thread.
 //
@@ -70,11 +73,13 @@ class ScriptEngine final : public IActiveScript, public IActiveScriptParse, publ
 
  private:
   ~ScriptEngine();
+  class Call;
   bool IsUsable() const;
   bool IsStarted() const;
   const NamedItem* FindItem(LPCOLESTR name) const;
   bool IsByteHost(LPCOLESTR code) const;
   HRESULT RequestItems();
+  HRESULT Start(SCRIPTSTATE newState);
   MacroTask* NewTask(MacroTask::Kind kind, LPCOLESTR text);
   HRESULT Perform(MacroTask* task, VARIANT* result, EXCEPINFO* exception);
   HRESULT Enter(MacroTask* task);
@@ -83,6 +88,7 @@ class ScriptEngine final : public IActiveScript, public IActiveScriptParse, publ
   void ChangeState(SCRIPTSTATE newState);
   void LowerState(SCRIPTSTATE newState);
   void Reset(bool all);
+  void FinishClose();
 
   LONG references = 1;
   IActiveScriptSite* site = nullptr;
@@ -90,7 +96,8 @@ class ScriptEngine final : public IActiveScript, public IActiveScriptParse, publ
   SCRIPTSTATE state = SCRIPTSTATE_UNINITIALIZED;
   bool initialized = false;  // InitNew has been called
   bool textFormKnown = false;
-  bool closing = false;  // as soon as no task of it is under way
+  int calls = 0;         // of the host that are under way and may call it back
+  bool closing = false;  // as soon as the last of them has ended
   NamedItem* items = nullptr;
   RubyHalf* const half;  // outlives an engine that cannot enter the interpreter any more
 };

@@ -269,11 +269,15 @@ VALUE FromField(VARTYPE type, const void* value, TextForm form) {
       return Fraction(LL2NUM(static_cast<const CY*>(value)->int64), INT2FIX(10000));
     case VT_BSTR:
       return FromBstr(*static_cast<const BSTR*>(value), form);
+    case VT_UNKNOWN:
+      if (!*static_cast<IUnknown* const*>(value)) return Qnil;
+      break;
     case VT_DISPATCH:
       return FromDispatch(*static_cast<IDispatch* const*>(value), form);
     default:
-      rb_raise(rb_eTypeError, "value of type %d from a COM object has no Ruby form", type);
+      break;
   }
+  rb_raise(rb_eTypeError, "value of type %d from a COM object has no Ruby form", type);
 }
 
 }  // namespace

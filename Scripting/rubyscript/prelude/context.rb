@@ -1,0 +1,243 @@
+# SPDX-License-Identifier: MIT
+# The Ruby half of a script engine.
+
+module ActiveScript
+  # What one script engine compiles and runs, in a world of its own: entered around everything it
+  # does. Contexts nest when a function of the host runs another macro.
+  class Context
+    Source = Struct.new(:lines, :first_line, :cookie)
+
+    ENTERED = [] # innermost last
+    private_constant :ENTERED
+
+    class << self
+      def current = ENTERED.last
+
+      # What CRuby adds to messages. Loaded when there is one: it takes longer than all the rest.
+      def load_hints
+        require "error_highlight"
+        require "did_you_mean"
+      rescue LoadError
+        nil
+      end
+    end
+
+    attr_reader :byte_host # whether texts go to it as bytes
+
+    def initialize(byte_host)
+      @byte_host = byte_host
+      @items = {}
+      @sources = {}
+      @queue = []
+      @persistent = []
+      @exit_blocks = []
+      @left_open = []
+      @output = HostOutput.new(self, STDOUT)
+      @error_output = HostOutput.new(self, STDERR)
+      @world = World.new({ "$stdout": @output, "$stderr": @error_output })
+    end
+
+    def add_item(name, object)
+      @items[name] = object
+      variable = :"@#{name}"
+      equal?(Context.current) ? MAIN.instance_variable_set(variable, object) : @world.add_variable(variable, object)
+    end
+
+    # The first item that has a function `message`; nil without one.
+    def messenger
+      @messenger = @items.values.find { |item| item.respond_to?(:message) } if @messenger.nil?
+      @messenger ||= false
+      @messenger || nil
+    end
+
+    # For the next run. Persistent code also runs in the context's successor. The cookie is the host's
+    # own name for the text.
+    def compile(source, first_line, cookie, persistent)
+      name = @sources.empty? ? "macro" : "macro#{@sources.size + 1}"
+      source = source.b.delete_prefix("\xEF\xBB\xBF".b).force_encoding(Encoding::UTF_8)
+      @sources[name] = Source.new(source.b.split(/\r\n|[\r\n]/n), first_line, cookie)
+      @data = source[/^__END__\r?\n(.*)/m, 1] if source.valid_encoding? && source.include?("__END__")
+      RubyVM.keep_script_lines = true
+      code = RubyVM::InstructionSequence.compile(source, name, nil, first_line)
+      @queue.push(code)
+      @persistent.push(code) if persistent
+      nil
+    ensure
+      RubyVM.keep_script_lines = false
+    end
+
+    # What a thread of the macro's raises here waits until it is done.
+    def enter = Thread.handle_interrupt(Object => :never) { begin_part }
+    def leave = Thread.handle_interrupt(Object => :never) { end_part }
+
+    def put_aside = @world.put_aside
+    def put_back = @world.put_back
+
+    # Threads that are not the macro's to see.
+    def foreign_threads = @threads - [Thread.main]
+
+    # Runs what is compiled; the value of the last code. A macro that ends by `exit` has succeeded.
+    def run
+      codes, @queue = @queue, []
+      result = nil
+      Object.const_set(:DATA, StringIO.new(@data)) if @data && !Object.const_defined?(:DATA)
+      error = attempt { codes.each { |code| result = code.eval } }
+      while (block = @exit_blocks.pop)
+        error = attempt(&block) || error
+      end
+      @output.finish
+      @error_output.finish
+      raise error if error && !(SystemExit === error && error.success?)
+      result
+    end
+
+    def call(name, arguments)
+      MAIN.__send__(name, *arguments)
+    ensure
+      @output.finish if ActiveScript.can_call?
+    end
+
+    # Files that the macro has left open would stay locked.
+    def close
+      @left_open.each { |file| file.close unless file.closed? }
+    rescue IOError, SystemCallError
+      nil
+    end
+
+    # What goes on after the engine has been reset; nil when nothing does.
+    def successor
+      Context.new(@byte_host).tap { |context| context.inherit(@sources, @persistent) } unless @persistent.empty?
+    end
+
+    # Whether the host may call the name: what the macro has defined at its top level.
+    def defines?(name)
+      name = name.to_sym
+      known = World.baseline
+      MAIN.respond_to?(name, true) && !known.methods.key?(name) && !known.singleton_methods.key?(name) &&
+        [Kernel, BasicObject].none? { |owner| owner.method_defined?(name) || owner.private_method_defined?(name) }
+    end
+
+    def inherit(sources, codes)
+      @sources = sources
+      @queue = codes.dup
+      @persistent = codes
+    end
+
+    def at_exit(block)
+      @exit_blocks.push(block)
+      block
+    end
+
+    # What the host is told of an error: description, line and column from 0, the line's text, the
+    # cookie of its source.
+    def describe(error)
+      Context.load_hints if NameError === error || KeyError === error
+      name, line, column = syntax_position(error) || run_time_position(error)
+      text = line_text(name, line)
+      [description(error), line ? line - 1 : 0, column_in(text, column), text.to_s,
+       @sources[name]&.cookie.to_i]
+    end
+
+    private
+
+    def begin_part
+      outer = ENTERED.last
+      ENTERED.push(self)
+      return if outer.equal?(self)
+      outer&.put_aside
+      @threads = ALL_THREADS.call
+      @descriptor = ActiveScript.lowest_descriptor
+      @files = outer ? open_files : []
+      @world.put_back
+    end
+
+    def end_part
+      ENTERED.pop
+      outer = ENTERED.last
+      return if outer.equal?(self)
+      (ALL_THREADS.call - @threads).each { |thread| thread.kill.join(1) }
+      flush_files
+      put_aside
+      outer&.put_back
+    end
+
+    def attempt
+      yield
+      nil
+    rescue Stop
+      raise
+    rescue Exception => error
+      error
+    end
+
+    def open_files = ObjectSpace.each_object(IO).reject(&:closed?)
+
+    # What Ruby does when its process ends. The search is only made when a file has been left open.
+    def flush_files
+      STDOUT.flush
+      return if ActiveScript.lowest_descriptor == @descriptor
+      @left_open |= open_files - @files - [STDIN, STDOUT, STDERR]
+      @left_open.reject(&:closed?).each(&:flush)
+    rescue IOError, SystemCallError
+      nil # not writable, or the other end is gone
+    end
+
+    # --- Errors --------------------------------------------------------------------------------
+
+    # "macro:LINE: ..." and, in the next two lines, a piece of the line and a mark below its place.
+    def syntax_position(error)
+      return unless SyntaxError === error
+      head, piece, mark = error.message.b.split("\n", 3)
+      name, line = /\A(macro\d*):(\d+):/n.match(head)&.captures
+      name = name&.dup&.force_encoding(Encoding::UTF_8)
+      return unless @sources.key?(name)
+      [name, line.to_i, marked_column(line_text(name, line.to_i).to_s.b, piece.to_s, mark.to_s)]
+    end
+
+    # In bytes. CRuby shows long lines cut, with three dots.
+    def marked_column(line, piece, mark)
+      place = mark.index("^") or return 0
+      cut = mark.start_with?("...") ? 3 : 0
+      (line.index(piece[cut..].delete_suffix("...")) || 0) + place - cut
+    end
+
+    def run_time_position(error)
+      location = error.backtrace_locations&.find { |each| @sources.key?(each.path) }
+      return [location.path, location.lineno, column_of(error, location)] if location
+      frame = Array(error.backtrace).find { |each| @sources.key?(each[/\A[^:]*/]) }
+      frame ? [frame[/\A[^:]*/], frame[/:(\d+)/, 1].to_i, 0] : [nil, nil, 0]
+    end
+
+    # In bytes. CRuby can tell where the node of a frame begins.
+    def column_of(error, location)
+      node = RubyVM::AbstractSyntaxTree.of(location, keep_script_lines: true)
+      spot = ErrorHighlight.spot(node, point_type: :name, name: error.name) if NameError === error
+      return spot[:first_column] if spot && spot[:first_lineno] == location.lineno
+      node.first_lineno == location.lineno ? node.first_column : 0
+    rescue StandardError
+      0
+    end
+
+    def line_text(name, line)
+      source = @sources[name]
+      text = source.lines[line - source.first_line] if source && line >= source.first_line
+      text&.dup&.force_encoding(Encoding::UTF_8)
+    end
+
+    # In characters.
+    def column_in(text, bytes)
+      text && bytes <= text.bytesize ? text.byteslice(0, bytes).length : 0
+    end
+
+    def description(error)
+      message = error.message.to_s
+      message = error.class.name.to_s if message.empty?
+      first, rest = message.split("\n", 2)
+      frames = Array(error.backtrace).select { |each| @sources.key?(each[/\A[^:]*/]) }
+                                     .reject { |each| each.end_with?("in `method_missing'") }
+                                     .map { |each| each.sub("<compiled>'", "<main>'") }
+      text = SyntaxError === error ? message : ["#{first} (#{error.class})", rest].compact.join("\n")
+      [text, *frames.first(20).map { |frame| "\tfrom #{frame}" }].join("\n")
+    end
+  end
+end

@@ -1,0 +1,38 @@
+# SPDX-License-Identifier: MIT
+# What a macro must not do to the process it is a guest of.
+
+module ActiveScript
+  ALL_THREADS = Thread.method(:list)
+  private_constant :ALL_THREADS
+
+  # The engine's own thread, and those of a macro that waits for this one, are nobody's to join or kill.
+  module ThreadList
+    def list = super - [ActiveScript.interrupter] - (Context.current&.foreign_threads || [])
+  end
+  Thread.singleton_class.prepend(ThreadList)
+
+  # The process is the host's: what would end or replace it ends the macro at most.
+  module Guest
+    def at_exit(&block)
+      raise ArgumentError, "called without block" unless block
+      Context.current.at_exit(block)
+    end
+
+    def exit!(status = false) = ::Kernel.exit(status)
+
+    def exec(*)
+      raise NotImplementedError, "exec would replace the host's process; use system or spawn"
+    end
+  end
+  Kernel.prepend(Guest)
+  Kernel.singleton_class.prepend(Guest)
+  Process.singleton_class.prepend(Guest)
+
+  module GuestProcess
+    def kill(signal, *processes)
+      return super unless processes.any? { |id| id == ::Process.pid || id.zero? }
+      raise SignalException, ::Integer === signal ? signal : signal.to_s.delete_prefix("SIG")
+    end
+  end
+  Process.singleton_class.prepend(GuestProcess)
+end

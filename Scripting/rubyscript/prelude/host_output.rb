@@ -1,0 +1,92 @@
+# SPDX-License-Identifier: MIT
+# Where the output of a macro goes.
+
+require "stringio"
+
+module ActiveScript
+  # $stdout and $stderr of a macro: whole lines go to the host's function `message`, or straight to
+  # the process's own stream when the host has none.
+  class HostOutput < StringIO
+    LIMIT = 511 # bytes of a text that an 8-bit host takes whole
+
+    def initialize(context, stream)
+      super(+"")
+      @context = context
+      @stream = stream
+      @pending = String.new(encoding: Encoding::BINARY)
+    end
+
+    def write(*texts)
+      texts.map!(&:to_s)
+      texts.each { |text| @pending << as_utf8(text).b }
+      # A stopped macro's last words have nowhere to go; a thread's wait for the main thread.
+      pass_on if ActiveScript.can_call?
+      texts.sum(&:bytesize)
+    end
+
+    def syswrite(text) = write(text)
+    def write_nonblock(text, **) = write(text)
+
+    def putc(character)
+      write(String === character ? character[0] : (character.to_int & 0xFF).chr)
+      character
+    end
+
+    def flush = self
+    def sync = true
+    def tty? = false
+    alias isatty tty?
+
+    # Also the last line, when it has no end.
+    def finish
+      return if @pending.empty?
+      @pending << "\n" if @context.messenger
+      pass_on
+    end
+
+    private
+
+    PLAIN = [Encoding::UTF_8, Encoding::US_ASCII, Encoding::BINARY].freeze
+    private_constant :PLAIN
+
+    def as_utf8(text)
+      return text if PLAIN.include?(text.encoding) || !@context.messenger
+      text.encode(Encoding::UTF_8, invalid: :replace, undef: :replace)
+    end
+
+    def pass_on
+      return if @pending.empty?
+      messenger = @context.messenger
+      length = messenger ? (@pending.rindex("\n") || -1) + 1 : @pending.bytesize
+      return if length.zero?
+      text = @pending.slice!(0, length)
+      messenger ? show(messenger, text.chomp) : write_through(text)
+    end
+
+    def show(messenger, text)
+      text.force_encoding(Encoding::UTF_8)
+      return messenger.message(text.scrub) unless @context.byte_host
+      text = text.b.gsub("\0", "\u2400".b)
+      loop do
+        piece = text.slice!(0, cut(text))
+        messenger.message(piece.force_encoding(Encoding::UTF_8))
+        break if text.empty?
+      end
+    end
+
+    # Never inside a character.
+    def cut(text)
+      length = LIMIT
+      length -= 1 while length > LIMIT - 4 && text.getbyte(length)&.then { |byte| byte & 0xC0 == 0x80 }
+      length
+    end
+
+    # A program with windows has no such stream.
+    def write_through(text)
+      @stream.write(text)
+      @stream.flush
+    rescue IOError, SystemCallError
+      nil
+    end
+  end
+end
