@@ -14,7 +14,7 @@ count() { # count FOLDER
 }
 
 code=0
-for folder in Core Scripting Tools Tests; do
+for folder in Core Scripting Tools Benchmarks Tests; do
   lines=$(count "$folder")
   printf '%-10s%6d\n' "$folder" "$lines"
   [ "$folder" = Tests ] || code=$((code + lines))

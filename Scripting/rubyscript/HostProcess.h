@@ -50,6 +50,7 @@ class HostProcess {
   static constexpr int kStreams = 3;  // standard input, output and error: descriptors 0 to 2
 
   void Forget();
+  void RestoreDirectory() const;
   void RestoreEnvironment() const;
 
   bool saved = false;

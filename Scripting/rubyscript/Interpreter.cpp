@@ -88,7 +88,6 @@ void OnAbort(int) {
 void RunTask() {
   Entry entry = {state.task, state.innermost, state.hostFrame};
   entry.process.Save();
-  ApplyRubyEnvironment();
   signal(SIGABRT, OnAbort);
   SetInnermost(&entry);
   entry.task->Run();

@@ -27,16 +27,34 @@ void Wait(DWORD milliseconds) {
   rb_thread_call_without_gvl(WaitOutside, &milliseconds, EndWait, nullptr);
 }
 
-void OnEvent(rb_event_flag_t, VALUE, VALUE, ID, VALUE) {
+VALUE CheckInterrupts(VALUE) {
+  rb_thread_check_ints();
+  return Qnil;
+}
+
+void OnEvent(VALUE, rb_trace_arg_t* event) {
   if (!Interpreter::IsMainThread() || Interpreter::InterruptDue() == Interpreter::Urgency::kNone)
     return;
-  rb_remove_event_hook(OnEvent);
+  if (rb_tracearg_event_flag(event) == RUBY_EVENT_RAISE) {
+    if (rb_obj_class(rb_tracearg_raised_exception(event)) != StopClass()) return;
+  } else {
+    VALUE ignored;
+    Protect(CheckInterrupts, Qnil, ignored);  // the exception is not needed any more
+  }
+  Interrupter::RemoveHook();
   LeaveTask();
 }
 
+// A hook with this flag has parameters of its own.
+rb_event_hook_func_t Hook() {
+  return reinterpret_cast<rb_event_hook_func_t>(reinterpret_cast<void*>(OnEvent));
+}
+
 VALUE Deliver(VALUE) {
-  rb_remove_event_hook(OnEvent);
-  rb_add_event_hook(OnEvent, RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL, Qnil);
+  constexpr rb_event_flag_t kEvents =
+      RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL | RUBY_EVENT_RAISE;
+  Interrupter::RemoveHook();
+  rb_add_event_hook2(Hook(), kEvents, Qnil, RUBY_EVENT_HOOK_FLAG_RAW_ARG);
   return rb_funcall(mainThread, rb_intern("raise"), 1, StopClass());
 }
 
@@ -51,11 +69,6 @@ VALUE Interrupt(void*) {
       Wait(kGrace);
     }
   }
-}
-
-VALUE CheckInterrupts(VALUE) {
-  rb_thread_check_ints();
-  return Qnil;
 }
 
 }  // namespace
@@ -74,8 +87,10 @@ void Interrupter::EnsureAlive() {
              interrupterThread);
 }
 
+void Interrupter::RemoveHook() { rb_remove_event_hook(Hook()); }
+
 void Interrupter::Settle() {
-  rb_remove_event_hook(OnEvent);
+  RemoveHook();
   VALUE ignored;
   constexpr int kMostPending = 1000;  // a thread of the macro's may have raised some as well
   for (int i = 0; i < kMostPending; ++i)

@@ -4,6 +4,7 @@
 #include <new>
 
 #include "Interrupter.h"
+#include "RubyRuntime.h"
 // Last: they rename what the headers above use.
 #include "ComObject.h"
 #include "RubyCall.h"
@@ -156,7 +157,10 @@ void MacroTask::Work() {
   if (!Interpreter::MustEnd()) {  // else it was interrupted before it began
     const Outcome outcome = Protect(WorkBody, reinterpret_cast<VALUE>(this), outcomeValue);
     if (outcome == Outcome::kDone) SetValue(outcomeValue);
-    if (outcome == Outcome::kRaised) SetError(outcomeValue);
+    if (outcome == Outcome::kRaised) {
+      Interrupter::Settle();  // threads of the macro's may have raised more
+      if (!Interpreter::MustEnd()) SetError(outcomeValue);
+    }
   }
   Interpreter::SetInterruptible(false);
   Interrupter::Settle();
@@ -170,6 +174,7 @@ void MacroTask::Run() {
     result = S_OK;
     return;
   }
+  if (kind != Kind::kCompile) ApplyRubyEnvironment();
   const Outcome prepared = Protect(PrepareBody, self, ignored);
   if (prepared == Outcome::kRaised) SetError(ignored);
   if (prepared != Outcome::kDone) return;

@@ -59,9 +59,10 @@ Outcome Protect(VALUE (*body)(VALUE), VALUE argument, VALUE& result) {
   if (state == 0) return result == LeaveTag() ? Outcome::kLeft : Outcome::kDone;
   result = rb_errinfo();
   rb_set_errinfo(Qnil);
-  const bool raised = RTEST(rb_obj_is_kind_of(result, rb_eException)) &&
-                      !RTEST(rb_obj_is_kind_of(result, StopClass()));
-  return raised ? Outcome::kRaised : Outcome::kLeft;
+  // A throw to a catch of an outer macro leaves an object that is not for Ruby code.
+  if (!RB_TYPE_P(result, T_OBJECT))
+    result = rb_exc_new_cstr(rb_eLocalJumpError, "jump out of the macro");
+  return RTEST(rb_obj_is_kind_of(result, StopClass())) ? Outcome::kLeft : Outcome::kRaised;
 }
 
 Outcome Send(VALUE receiver, const char* method, int count, const VALUE* arguments, VALUE& result) {

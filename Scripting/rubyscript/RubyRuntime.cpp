@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "RubyRuntime.h"
 
-#include <fcntl.h>
 #include <io.h>
 
 #include <new>
@@ -67,8 +66,8 @@ VALUE CanCall(VALUE) {
 }
 
 VALUE LowestDescriptor(VALUE) {
-  const int descriptor = _open("NUL", _O_RDONLY);
-  if (descriptor >= 0) _close(descriptor);
+  int descriptor = 0;
+  while (_get_osfhandle(descriptor) != -1) ++descriptor;
   return INT2FIX(descriptor);
 }
 

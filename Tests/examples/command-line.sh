@@ -27,12 +27,14 @@ expect() {
   [ "$code" -eq 0 ] || [ ! -s out ] || fail "$* ($source): printed although it failed"
 }
 
-# expect_js CODE TEXT SOURCE: as above, for a macro over input.txt.
-expect_js() {
-  source=$3
-  printf '%s\n' "$source" > macro.js
-  expect "$1" "$2" macro.js input.txt
+# expect_js CODE TEXT SOURCE, expect_rbs likewise: as above, for a macro over input.txt.
+expect_source() {
+  source=$4
+  printf '%s\n' "$source" > "macro.$1"
+  expect "$2" "$3" "macro.$1" input.txt
 }
+expect_js() { expect_source js "$@"; }
+expect_rbs() { expect_source rbs "$@"; }
 
 # The command line
 printf 'text\n' > input.txt
@@ -93,10 +95,32 @@ expect_same 'tarn.line_count();'
 printf '%01023d\n%0511d' 1 2 > input.txt
 expect_same 'tarn.get_line(1); tarn.set_line(2, tarn.get_line(2));'
 
+# To Ruby a text is bytes: every line passes there and back, unless it is too long or has a zero byte
+copy_lines='1.upto(@tarn.line_count) { |line| @tarn.set_line(line, @tarn.get_line(line)) }'
+i=1
+while [ $i -lt 256 ]; do printf "\\$(printf %03o $i)"; i=$((i + 1)); done > input.txt
+expect_rbs 0 '' "$copy_lines"
+cmp input.txt out || fail "a macro in Ruby changes bytes"
+printf '%01024d\n' 0 > input.txt
+expect_rbs 1 'get_line: line 1 has 1024 characters' "$copy_lines"
+printf 'a\0b\n' > input.txt
+expect_rbs 1 'get_line: line 1 has a zero byte' "$copy_lines"
+: > input.txt
+
 # Paths outside the code page
 mkdir 'Ordner ä 日本'
 echo 'tarn.message("found");' > 'Ordner ä 日本/ä 日本.js'
 expect 0 'found' 'Ordner ä 日本/ä 日本.js' input.txt
+
+# The Ruby engine is the one beside macrorun, wherever that is
+echo 'require "date"; @tarn.message("found " + Date::MONTHNAMES[5])' > macro.rbs
+cp "$macrorun" "$(dirname "$macrorun")/scriptruby.dll" 'Ordner ä 日本/'
+in_build_folder=$macrorun
+macrorun='Ordner ä 日本/macrorun.exe'
+expect 1 "Error creating 'RubyScript'" macro.rbs
+cp -r "$(dirname "$in_build_folder")/ruby" 'Ordner ä 日本/'
+expect 0 'found May' macro.rbs
+macrorun=$in_build_folder
 
 # Nothing is left in the temporary folder, and a macro is stopped with Ctrl+C
 mkdir temporary

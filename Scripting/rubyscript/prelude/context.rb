@@ -23,6 +23,7 @@ module ActiveScript
     end
 
     attr_reader :byte_host # whether texts go to it as bytes
+    attr_reader :fiber     # the one that the macro was started in
 
     def initialize(byte_host)
       @byte_host = byte_host
@@ -146,6 +147,7 @@ module ActiveScript
       return if outer.equal?(self)
       outer&.put_aside
       @threads = ALL_THREADS.call
+      @fiber = Fiber.current
       @descriptor = ActiveScript.lowest_descriptor
       @files = outer ? open_files : []
       @world.put_back
@@ -187,7 +189,7 @@ module ActiveScript
     # "macro:LINE: ..." and, in the next two lines, a piece of the line and a mark below its place.
     def syntax_position(error)
       return unless SyntaxError === error
-      head, piece, mark = error.message.b.split("\n", 3)
+      head, piece, mark = message_of(error).b.split("\n", 3)
       name, line = /\A(macro\d*):(\d+):/n.match(head)&.captures
       name = name&.dup&.force_encoding(Encoding::UTF_8)
       return unless @sources.key?(name)
@@ -229,8 +231,17 @@ module ActiveScript
       text && bytes <= text.bytesize ? text.byteslice(0, bytes).length : 0
     end
 
+    # The macro's own classes of exceptions may fail in any of these.
+    def message_of(error)
+      error.message.to_s
+    rescue Stop
+      raise
+    rescue Exception
+      ""
+    end
+
     def description(error)
-      message = error.message.to_s
+      message = message_of(error)
       message = error.class.name.to_s if message.empty?
       first, rest = message.split("\n", 2)
       frames = Array(error.backtrace).select { |each| @sources.key?(each[/\A[^:]*/]) }

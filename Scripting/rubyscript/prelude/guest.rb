@@ -11,6 +11,27 @@ module ActiveScript
   end
   Thread.singleton_class.prepend(ThreadList)
 
+  # The top-level object is one for all macros.
+  def MAIN.freeze = self
+
+  # A macro that is started inside a fiber of another one must not yield for it.
+  module GuestFiber
+    def yield(*)
+      return super unless ::Fiber.current.equal?(Context.current&.fiber)
+      raise FiberError, "can't yield from root fiber"
+    end
+  end
+  Fiber.singleton_class.prepend(GuestFiber)
+
+  # The process's own streams stay open and where they are.
+  [STDIN, STDOUT, STDERR].each do |stream|
+    def stream.close = nil
+
+    def stream.reopen(*)
+      raise NotImplementedError, "the stream is the host's; assign to $stdin, $stdout or $stderr instead"
+    end
+  end
+
   # The process is the host's: what would end or replace it ends the macro at most.
   module Guest
     def at_exit(&block)

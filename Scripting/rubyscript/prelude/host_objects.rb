@@ -2,6 +2,8 @@
 # What passes between a macro and its host: dates, the host's objects, their errors.
 
 module ActiveScript
+  MAIN = TOPLEVEL_BINDING.receiver
+
   # Ends an interrupted macro where it cannot be left otherwise. No macro should rescue it.
   class Stop < Exception; end
 

@@ -2,8 +2,6 @@
 # What keeps macros apart at the one top level that Ruby has.
 
 module ActiveScript
-  MAIN = TOPLEVEL_BINDING.receiver
-
   # What every macro begins with. Libraries that macros load are added to it: they stay.
   class Baseline
     # Belong to a frame or a thread, or cannot be set, or show something else under another name.
@@ -28,10 +26,17 @@ module ActiveScript
 
     def fixed?(global) = @fixed.key?(global)
 
-    # Whether a definition came from a library and not from a macro. Those in C have no place.
-    def library?(location)
-      path, = location
-      path.nil? || path.start_with?(@folder)
+    # Whether the place of a definition is in a library.
+    def library?(location) = location.first.start_with?(@folder)
+
+    # A constant of a library in C has no place; a module of a library may have been opened by the macro
+    # first.
+    def library_constant?(location, value)
+      return true if location.empty? || library?(location)
+      return false unless Module === value
+      methods = World.method_names(value).map { |name| value.instance_method(name) } +
+                value.singleton_methods(false).map { |name| value.method(name) }
+      methods.any? { |method| method.source_location&.then { |place| library?(place) } }
     end
 
     private
@@ -59,7 +64,8 @@ module ActiveScript
 
       def settings
         { verbose: $VERBOSE, external: Encoding.default_external, internal: Encoding.default_internal,
-          deprecated: Warning[:deprecated], experimental: Warning[:experimental], gc_disabled: false }
+          deprecated: Warning[:deprecated], experimental: Warning[:experimental], line_number: $.,
+          abort: Thread.abort_on_exception, report: Thread.report_on_exception, gc_disabled: false }
       end
 
       def apply(settings)
@@ -67,6 +73,9 @@ module ActiveScript
         Encoding.default_internal = settings[:internal]
         Warning[:deprecated] = settings[:deprecated]
         Warning[:experimental] = settings[:experimental]
+        $. = settings[:line_number]
+        Thread.abort_on_exception = settings[:abort]
+        Thread.report_on_exception = settings[:report]
         settings[:gc_disabled] ? GC.disable : GC.enable
         $VERBOSE = settings[:verbose]
       end
@@ -124,7 +133,8 @@ module ActiveScript
       known = baseline.constants
       Object.constants(false).each do |name|
         next if known.key?(name)
-        next known[name] = true if Object.autoload?(name) || baseline.library?(Object.const_source_location(name))
+        value = Object.const_get(name) unless Object.autoload?(name)
+        next known[name] = true if baseline.library_constant?(Object.const_source_location(name), value)
         @constants[name] = Object.__send__(:remove_const, name)
       end
     end
@@ -133,7 +143,7 @@ module ActiveScript
       World.method_names(owner).filter_map do |name|
         next if known.key?(name)
         method = owner.instance_method(name)
-        location = method.source_location
+        location = method.source_location # an alias of a method in C has none
         next known[name] = nil if location && baseline.library?(location)
         entry = [method, visibility(owner, name)]
         owner.__send__(:remove_method, name)
