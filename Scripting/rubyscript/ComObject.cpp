@@ -141,6 +141,7 @@ void CheckCallable(const Wrapped& wrapped) {
 long NameLength(VALUE symbolName, bool& isSetter) {
   const char* const text = RSTRING_PTR(symbolName);
   const long length = RSTRING_LEN(symbolName);
+  if (length == 0) return 0;
   const unsigned char first = static_cast<unsigned char>(text[0]);
   const unsigned char last = static_cast<unsigned char>(text[length - 1]);
   isSetter = last == '=';
@@ -240,6 +241,7 @@ VALUE InvokeWith(const Wrapped& wrapped, VALUE name, DISPID id, WORD flags, int 
   VALUE buffer = Qnil;
   VALUE* const passable = ALLOCV_N(VALUE, buffer, count + 1);
   for (int i = 0; i < count; ++i) passable[i] = Passable(arguments[i], wrapped.form);
+  CheckCallable(wrapped);  // conversions may have run anything
   const VALUE result = Invoke(wrapped, name, id, flags, count, passable);
   ALLOCV_END(buffer);
   return result;

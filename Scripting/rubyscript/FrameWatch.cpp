@@ -34,14 +34,17 @@ EXCEPTION_DISPOSITION FrameWatch::Handle(EXCEPTION_RECORD* exception, void* fram
 
 static FaultBase* base = nullptr;
 
-FaultBase::FaultBase(EXCEPTION_RECORD& target, void (*landing)())
+FaultBase::FaultBase(EXCEPTION_RECORD& target, void (*landing)(), IsThreadFault isFault,
+                     void (*threadEnd)())
     : record{static_cast<Record*>(ChainHead()), Handle},
       fault(target),
       land(landing),
+      isThreadFault(isFault),
+      endThread(threadEnd),
       thread(GetCurrentThreadId()) {
   base = this;
   SetChainHead(&record);
-  AddVectoredExceptionHandler(FALSE, HandleEmptyChain);
+  AddVectoredExceptionHandler(FALSE, HandleUnasked);
 }
 
 // Errors and the compilers' language-level exceptions; not messages to a debugger, nor guard pages.
@@ -64,8 +67,20 @@ EXCEPTION_DISPOSITION FaultBase::Handle(EXCEPTION_RECORD* exception, void*, CONT
   return base->Take(*exception, *context) ? ExceptionContinueExecution : ExceptionContinueSearch;
 }
 
+// Goes on below the faulting frame, as after a call instruction. One that faults again just ends.
+void FaultBase::RedirectThread(const EXCEPTION_RECORD& exception, CONTEXT& state) {
+  if (threadFault.ExceptionCode) ExitThread(0);
+  threadFault = exception;
+  state.Esp = (state.Esp & ~DWORD{15}) - sizeof(void*);
+  state.Eip = reinterpret_cast<DWORD>(endThread);
+}
+
 // The interpreter's own fibers begin with an empty chain, so no record would be asked.
-LONG FaultBase::HandleEmptyChain(EXCEPTION_POINTERS* exception) {
+LONG FaultBase::HandleUnasked(EXCEPTION_POINTERS* exception) {
+  if (base->isThreadFault(*exception->ExceptionRecord)) {
+    base->RedirectThread(*exception->ExceptionRecord, *exception->ContextRecord);
+    return EXCEPTION_CONTINUE_EXECUTION;
+  }
   if (GetCurrentThreadId() != base->thread || ChainHead() != kEmptyChain)
     return EXCEPTION_CONTINUE_SEARCH;
   return base->Take(*exception->ExceptionRecord, *exception->ContextRecord)

@@ -36,18 +36,26 @@ class FrameWatch {
 // chains are empty.
 class FaultBase {
  public:
+  // Asked of every exception on any thread; true: a fault of another thread that the interpreter has
+  // made. That thread then goes on in `endThread`, which must not return.
+  using IsThreadFault = bool (*)(const EXCEPTION_RECORD& fault);
+
   // One in a process. `land` must not return.
-  FaultBase(EXCEPTION_RECORD& fault, void (*land)());
+  FaultBase(EXCEPTION_RECORD& fault, void (*land)(), IsThreadFault isThreadFault,
+            void (*endThread)());
   FaultBase(const FaultBase&) = delete;
   FaultBase& operator=(const FaultBase&) = delete;
 
   // Whether the thread runs on the interpreter's side; outside of it nothing is taken.
   void SetActive(bool value) { active = value; }
+  // Of another thread; its code is 0 while there was none.
+  const EXCEPTION_RECORD& ThreadFault() const { return threadFault; }
 
  private:
   static EXCEPTION_DISPOSITION __cdecl Handle(EXCEPTION_RECORD* record, void* frame,
                                               CONTEXT* context, void* dispatcher);
-  static LONG CALLBACK HandleEmptyChain(EXCEPTION_POINTERS* exception);
+  static LONG CALLBACK HandleUnasked(EXCEPTION_POINTERS* exception);
+  void RedirectThread(const EXCEPTION_RECORD& record, CONTEXT& context);
   bool Take(const EXCEPTION_RECORD& record, CONTEXT& context);
 
   struct Record {
@@ -56,7 +64,10 @@ class FaultBase {
   };
   Record record;
   EXCEPTION_RECORD& fault;
+  EXCEPTION_RECORD threadFault = {};
   void (*land)();
+  IsThreadFault isThreadFault;
+  void (*endThread)();
   DWORD thread;
   bool active = true;
   alignas(16) char landing[4096];  // the stack of `land`

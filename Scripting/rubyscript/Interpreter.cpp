@@ -109,8 +109,21 @@ void Serve(Message answer) {
   for (;;) SwitchToFiber(state.hostFiber);
 }
 
+// A fault in the interpreter's own code on one of its other threads.
+bool IsFaultOfRubyThread(const EXCEPTION_RECORD& fault) {
+  return fault.ExceptionCode >= 0xC0000000 && !Interpreter::IsMainThread() && IsRubyThread() &&
+         IsRubyCode(fault.ExceptionAddress);
+}
+
+// It loses the interpreter as one on the main thread does, as soon as that has come to the task's end.
+[[noreturn]] void EndFaultyThread() {
+  state.fault = state.faultBase->ThreadFault();
+  Interrupter::StopMainThread();
+  EndRubyThread();
+}
+
 void CALLBACK RunFiber(void*) {
-  FaultBase base(state.fault, Land);
+  FaultBase base(state.fault, Land, IsFaultOfRubyThread, EndFaultyThread);
   state.faultBase = &base;
   SetFloatControl(kRubyFloatControl);
   state.started = StartRuby();
@@ -234,7 +247,9 @@ static Entry* FindEntry(const void* owner) {
 void Interpreter::Interrupt(const void* owner) {
   AcquireSRWLockExclusive(&state.lock);
   Entry* const entry = FindEntry(owner);
-  if (entry) entry->interrupted = true;
+  // What runs inside of it ends first.
+  for (Entry* each = state.innermost; entry && each != entry->outer; each = each->outer)
+    each->interrupted = true;
   ReleaseSRWLockExclusive(&state.lock);
   if (entry) Interrupter::Wake();
 }

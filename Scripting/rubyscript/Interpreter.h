@@ -13,7 +13,7 @@
 // Around each task the host's process state is put back (see HostProcess.h). When the host discards the frame of a call, the pending CallHost answers false, the task unwinds
 // its Ruby code (`ensure` blocks run, but no further call is made) and is deleted.
 //
-// Threading: everything is called on the interpreter's thread, except Interrupt and HasStarted. "Host
+// Threading: everything is called on the interpreter's thread, except Interrupt, IsRunning and HasStarted. "Host
 // side" functions are called on the host's stack, "Ruby side" ones on the interpreter's.
 // Errors: as given at each function. A fault inside the interpreter leaves it lost for good.
 #pragma once
@@ -57,7 +57,7 @@ class Interpreter {
   static HRESULT Enter(RubyTask* task);
   // Host side. The exception code that lost the interpreter; 0 while it is whole.
   static DWORD LostTo();
-  // Any thread. Ends what runs for the owner: within a few milliseconds when it is in Ruby code, at
+  // Any thread. Ends what runs for the owner, and what is nested into it: within a few milliseconds when it is in Ruby code, at
   // the call's return when it is in a call of the host.
   static void Interrupt(const void* owner);
   // Any thread. Whether a task of the owner is under way, perhaps in a call of the host.

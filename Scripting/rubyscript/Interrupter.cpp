@@ -50,12 +50,16 @@ rb_event_hook_func_t Hook() {
   return reinterpret_cast<rb_event_hook_func_t>(reinterpret_cast<void*>(OnEvent));
 }
 
+VALUE RaiseOnMainThread(VALUE) {
+  return rb_funcall(mainThread, rb_intern("raise"), 1, StopClass());
+}
+
 VALUE Deliver(VALUE) {
   constexpr rb_event_flag_t kEvents =
       RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL | RUBY_EVENT_RAISE;
   Interrupter::RemoveHook();
   rb_add_event_hook2(Hook(), kEvents, Qnil, RUBY_EVENT_HOOK_FLAG_RAW_ARG);
-  return rb_funcall(mainThread, rb_intern("raise"), 1, StopClass());
+  return RaiseOnMainThread(Qnil);
 }
 
 VALUE Interrupt(void*) {
@@ -88,6 +92,11 @@ void Interrupter::EnsureAlive() {
 }
 
 void Interrupter::RemoveHook() { rb_remove_event_hook(Hook()); }
+
+void Interrupter::StopMainThread() {
+  VALUE ignored;
+  Protect(RaiseOnMainThread, Qnil, ignored);
+}
 
 void Interrupter::Settle() {
   RemoveHook();

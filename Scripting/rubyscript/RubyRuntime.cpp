@@ -130,3 +130,18 @@ bool StartRuby() {
 }
 
 void ApplyRubyEnvironment() { StartState().ApplyAdditions(); }
+
+bool IsRubyThread() { return ruby_native_thread_p() != 0; }
+
+bool IsRubyCode(const void* address) {
+  constexpr DWORD kByAddress =
+      GET_MODULE_HANDLE_EX_FLAG_FROM_ADDRESS | GET_MODULE_HANDLE_EX_FLAG_UNCHANGED_REFCOUNT;
+  HMODULE owner = nullptr;
+  return !GetModuleHandleExW(kByAddress, static_cast<const wchar_t*>(address), &owner) ||
+         owner == GetModuleHandleW(L"msvcrt-ruby310.dll");
+}
+
+void EndRubyThread() {
+  rb_thread_kill(rb_thread_current());
+  ExitThread(0);
+}

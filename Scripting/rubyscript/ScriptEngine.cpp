@@ -154,6 +154,7 @@ void ScriptEngine::LowerState(SCRIPTSTATE newState) {
 }
 
 HRESULT ScriptEngine::SetScriptState(SCRIPTSTATE newState) {
+  if (newState == state && (IsUsable() || state == SCRIPTSTATE_CLOSED)) return S_FALSE;
   if (!IsUsable()) return E_UNEXPECTED;
   const bool nested = calls > 0;
   const Call call(this);
@@ -223,6 +224,7 @@ void ScriptEngine::Reset(bool all) {
     ReleaseObjectsOf(this);
     ReleaseCollectedObjects();
   }
+  if (all) textFormKnown = false;
   NamedItem** link = &items;
   while (NamedItem* const item = *link) {
     if (item->dispatch) item->dispatch->Release();
@@ -305,13 +307,6 @@ HRESULT ScriptEngine::GetScriptDispatch(LPCOLESTR itemName, IDispatch** dispatch
 
 // --- Code ----------------------------------------------------------------------------------------
 
-bool ScriptEngine::IsByteHost(LPCOLESTR code) const {
-  if (!FindItem(kByteHostItem)) return false;
-  for (; *code; ++code)
-    if (*code > 0xFF) return false;
-  return true;
-}
-
 MacroTask* ScriptEngine::NewTask(MacroTask::Kind kind, LPCOLESTR text) {
   MacroTask* const task = new (std::nothrow) MacroTask(this, kind, *half, items);
   if (!task || !text) return task;
@@ -330,7 +325,8 @@ HRESULT ScriptEngine::ParseScriptText(LPCOLESTR code, LPCOLESTR itemName, IUnkno
   if (!IsUsable() || !initialized) return E_UNEXPECTED;
   if (itemName && *itemName && !FindItem(itemName)) return E_INVALIDARG;
   const Call call(this);
-  if (!textFormKnown) half->form = IsByteHost(code) ? TextForm::kBytes : TextForm::kUtf16;
+  if (!textFormKnown)
+    half->form = FindItem(kByteHostItem) && IsByteText(code) ? TextForm::kBytes : TextForm::kUtf16;
   textFormKnown = true;
   MacroTask* const task = NewTask(MacroTask::Kind::kCompile, code);
   if (!task) return E_OUTOFMEMORY;
@@ -372,7 +368,7 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
   if (runsCode) site->OnEnterScript();
   HRESULT outcome = E_ABORT;
   if (IsUsable())
-    outcome = Enter(task);
+    outcome = Enter(task, exception);
   else
     delete task;
   if (outcome == S_OK) {
@@ -390,8 +386,8 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
   return outcome;
 }
 
-// S_OK: the task has run. Otherwise it is gone, and the site knows the reason.
-HRESULT ScriptEngine::Enter(MacroTask* task) {
+// S_OK: the task has run. Otherwise it is gone; that Ruby is not to be had, the site is told.
+HRESULT ScriptEngine::Enter(MacroTask* task, EXCEPINFO* exception) {
   const HRESULT started = Interpreter::Start();
   if (started == S_OK) {
     const HRESULT entered = Interpreter::Enter(task);
@@ -409,7 +405,7 @@ HRESULT ScriptEngine::Enter(MacroTask* task) {
              Interpreter::LostTo());
   ScriptError* const error =
       new (std::nothrow) ScriptError(started, SysAllocString(text), 0, 0, nullptr, 0);
-  return error ? Report(error, nullptr) : started;
+  return error ? Report(error, exception) : started;
 }
 
 // Takes over the error.

@@ -3,8 +3,8 @@
 // states, the named items and the site; everything in Ruby is a MacroTask.
 //
 // Named items appear as instance variables of the macro's top-level object: the item "tarn" is
-// `@tarn`. A host whose items include "tarn" and whose first text has no unit above U+00FF is taken
-// for the 8-bit host that it then is (see TextCoding.h).
+// `@tarn`. A host whose items include "tarn" and whose first text can be bytes of UTF-8 is taken for
+// the 8-bit host that it then is (see TextCoding.h).
 //
 // Ownership: COM's. It holds the site from SetScriptSite to Close.
 // Errors: HRESULTs as Active Scripting documents them. A script's own errors go to the site's
@@ -77,12 +77,11 @@ class ScriptEngine final : public IActiveScript, public IActiveScriptParse, publ
   bool IsUsable() const;
   bool IsStarted() const;
   const NamedItem* FindItem(LPCOLESTR name) const;
-  bool IsByteHost(LPCOLESTR code) const;
   HRESULT RequestItems();
   HRESULT Start(SCRIPTSTATE newState);
   MacroTask* NewTask(MacroTask::Kind kind, LPCOLESTR text);
   HRESULT Perform(MacroTask* task, VARIANT* result, EXCEPINFO* exception);
-  HRESULT Enter(MacroTask* task);
+  HRESULT Enter(MacroTask* task, EXCEPINFO* exception);
   HRESULT Report(ScriptError* error, EXCEPINFO* exception);
   HRESULT RunQueue(VARIANT* result, EXCEPINFO* exception);
   void ChangeState(SCRIPTSTATE newState);

@@ -8,7 +8,7 @@
 //            page. So a unit given to it is one byte of the UTF-8 text; what it answers becomes the
 //            bytes that the code page made the units from.
 //
-// Errors: no memory gives null or an empty text. Threading: any.
+// Errors: no memory gives null or an empty text. Threading: the interpreter's thread.
 #pragma once
 
 #include <windows.h>
@@ -32,3 +32,8 @@ UINT TextFromHost(const wchar_t* text, UINT units, TextForm form, TextOrigin ori
 // The bytes that the code page made the units from, whatever it maps them to; as far as it keeps
 // them apart, which all single-byte code pages do. `target` as above; returns its bytes.
 UINT BytesFromAnsi(UINT codePage, const wchar_t* text, UINT units, char* target);
+
+// Whether a macro's text can be an 8-bit host's: each unit a byte, the bytes UTF-8 or in an encoding
+// that the text itself names in a comment. A macro in the ANSI code page is not: as characters, it
+// serves an 8-bit host as it does an ordinary one.
+bool IsByteText(const wchar_t* text);

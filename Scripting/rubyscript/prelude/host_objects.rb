@@ -84,11 +84,14 @@ module ActiveScript
        to_enum yield_self !~ =~].each { |name| undef_method name }
 
     # Ruby's own questions about conversions are not for the host.
-    ASKED_BY_RUBY = /\A(to_|deconstruct|marshal_|_dump|coerce\z|exception\z|call\z)/
+    ASKED_BY_RUBY = %i[
+      to_a to_ary to_c to_f to_h to_hash to_i to_int to_io to_open to_path to_proc to_r to_regexp to_str to_sym
+      coerce deconstruct deconstruct_keys exception marshal_dump _dump
+    ].freeze
     private_constant :ASKED_BY_RUBY
 
     def respond_to_missing?(name, _include_all)
-      !ASKED_BY_RUBY.match?(name) && __knows(name)
+      !ASKED_BY_RUBY.include?(name) && __knows(name)
     end
 
     def inspect = "#<ActiveScript::ComObject#{" #{__name}" if __name}>"

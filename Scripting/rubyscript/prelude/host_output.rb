@@ -7,7 +7,8 @@ module ActiveScript
   # $stdout and $stderr of a macro: whole lines go to the host's function `message`, or straight to
   # the process's own stream when the host has none.
   class HostOutput < StringIO
-    LIMIT = 511 # bytes of a text that an 8-bit host takes whole
+    # Bytes of a text that an 8-bit host surely takes whole: its own limit is one more.
+    LIMIT = 511
 
     def initialize(context, stream)
       super(+"")
