@@ -327,6 +327,7 @@ VALUE NewComObject(IDispatch* dispatch, TextForm form, VALUE name) {
   live = wrapped;
   const VALUE object = TypedData_Wrap_Struct(comObjectClass, &kType, wrapped);
   wrapped->ids = rb_hash_new();
+  RB_GC_GUARD(name);
   return object;
 }
 

@@ -34,7 +34,7 @@ struct FloatControl {
 constexpr FloatControl kRubyFloatControl = {0x037F, 0x1F80};  // extended precision, all masked
 
 struct State {
-  DWORD thread = 0;
+  LONG thread = 0;  // the first that asked
   void* rubyFiber = nullptr;
   void* hostFiber = nullptr;  // of the latest switch; a host may use fibers itself
   bool started = false;
@@ -177,7 +177,6 @@ HRESULT CreateRubyFiber() {
   constexpr SIZE_T kReserved = 16 * 1024 * 1024;  // deep recursion of macros takes place here
   state.rubyFiber = CreateFiberEx(kCommitted, kReserved, 0, RunFiber, nullptr);
   if (!state.rubyFiber) return E_OUTOFMEMORY;
-  state.thread = GetCurrentThreadId();
   return S_OK;
 }
 
@@ -205,8 +204,10 @@ DWORD Interpreter::LostTo() { return state.fault.ExceptionCode; }
 
 HRESULT Interpreter::Start() {
   if (LostTo()) return E_ABORT;
+  const LONG caller = static_cast<LONG>(GetCurrentThreadId());
+  const LONG owner = InterlockedCompareExchange(&state.thread, caller, 0);
+  if (owner != 0 && owner != caller) return RPC_E_WRONG_THREAD;
   if (state.rubyFiber) {
-    if (GetCurrentThreadId() != state.thread) return RPC_E_WRONG_THREAD;
     if (!state.started) return E_FAIL;
     return IsThreadAFiber() || ConvertThreadToFiber(nullptr) ? S_OK : E_OUTOFMEMORY;
   }
@@ -285,6 +286,6 @@ void Interpreter::SetInterruptible(bool value) { state.innermost->interruptible 
 
 void Interpreter::SetLeaving() { state.innermost->leaving = true; }
 
-bool Interpreter::IsMainThread() { return GetCurrentThreadId() == state.thread; }
+bool Interpreter::IsMainThread() { return static_cast<LONG>(GetCurrentThreadId()) == state.thread; }
 
 const void* Interpreter::Owner() { return state.innermost->task->owner; }

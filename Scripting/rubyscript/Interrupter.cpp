@@ -36,7 +36,8 @@ void OnEvent(VALUE, rb_trace_arg_t* event) {
   if (!Interpreter::IsMainThread() || Interpreter::InterruptDue() == Interpreter::Urgency::kNone)
     return;
   if (rb_tracearg_event_flag(event) == RUBY_EVENT_RAISE) {
-    if (rb_obj_class(rb_tracearg_raised_exception(event)) != StopClass()) return;
+    const bool isStop = rb_obj_class(rb_tracearg_raised_exception(event)) == StopClass();
+    if (!isStop || !IsOnGuardedFiber()) return;
   } else {
     VALUE ignored;
     Protect(CheckInterrupts, Qnil, ignored);  // the exception is not needed any more
@@ -54,11 +55,13 @@ VALUE RaiseOnMainThread(VALUE) {
   return rb_funcall(mainThread, rb_intern("raise"), 1, StopClass());
 }
 
-VALUE Deliver(VALUE) {
-  constexpr rb_event_flag_t kEvents =
-      RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL | RUBY_EVENT_RAISE;
+void SetHook(rb_event_flag_t events) {
   Interrupter::RemoveHook();
-  rb_add_event_hook2(Hook(), kEvents, Qnil, RUBY_EVENT_HOOK_FLAG_RAW_ARG);
+  rb_add_event_hook2(Hook(), events, Qnil, RUBY_EVENT_HOOK_FLAG_RAW_ARG);
+}
+
+VALUE Deliver(VALUE) {
+  SetHook(RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL | RUBY_EVENT_RAISE);
   return RaiseOnMainThread(Qnil);
 }
 
@@ -80,6 +83,7 @@ VALUE Interrupt(void*) {
 void Interrupter::EnsureAlive() {
   if (!wakeEvent) {
     wakeEvent = CreateEventW(nullptr, FALSE, FALSE, nullptr);
+    if (!wakeEvent) return;  // tried again by the next macro
     mainThread = rb_thread_current();
     rb_gc_register_address(&mainThread);
     rb_gc_register_address(&interrupterThread);
@@ -92,6 +96,8 @@ void Interrupter::EnsureAlive() {
 }
 
 void Interrupter::RemoveHook() { rb_remove_event_hook(Hook()); }
+
+void Interrupter::LeaveAtResumer() { SetHook(RUBY_EVENT_RAISE); }
 
 void Interrupter::StopMainThread() {
   VALUE ignored;

@@ -13,6 +13,8 @@ class Interrupter {
   // Ruby side, behind interruptible code: takes back what was under way when the code ended.
   static void Settle();
   static void RemoveHook();
+  // Ruby side: when the exception comes out of the present fiber, the task is left there.
+  static void LeaveAtResumer();
   // Ruby side, another thread of Ruby's: raises the exception, without the rest.
   static void StopMainThread();
   // Any thread. Looks at Interpreter::InterruptDue as soon as Ruby code runs.

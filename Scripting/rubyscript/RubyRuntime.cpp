@@ -46,11 +46,8 @@ constexpr PreludeFile kPrelude[] = {
     {"rubyscript/world.rb", kWorld, sizeof kWorld},
 };
 
-// The state at the start; keeps the variables that CRuby has added.
-HostProcess& StartState() {
-  static HostProcess* const state = new (std::nothrow) HostProcess;  // deliberately never destroyed
-  return *state;
-}
+// The state at the start; keeps the variables that CRuby has added. Never destroyed. Null: no memory.
+HostProcess* startState = nullptr;
 
 VALUE SystemMessage(VALUE, VALUE code) {
   wchar_t text[512];
@@ -71,6 +68,23 @@ VALUE LowestDescriptor(VALUE) {
   return INT2FIX(descriptor);
 }
 
+// Where the thread keeps the object that is `self` at the top level of the next code. CRuby has it
+// changed by `load` alone; it is found by its value, which no other field of the thread has.
+VALUE* TopSelfSlot() {
+  static VALUE* slot = nullptr;
+  if (slot) return slot;
+  constexpr int kFields = 32;  // of which it is about the tenth
+  const VALUE main =
+      rb_funcall(rb_const_get(rb_cObject, rb_intern("TOPLEVEL_BINDING")), rb_intern("receiver"), 0);
+  VALUE* const fields = static_cast<VALUE*>(RTYPEDDATA_DATA(rb_thread_current()));
+  for (int i = 0; i < kFields && !slot; ++i)
+    if (fields[i] == main) slot = &fields[i];
+  if (!slot) rb_raise(rb_eNotImpError, "this CRuby keeps its top-level object elsewhere");
+  return slot;
+}
+
+VALUE SetTopSelf(VALUE, VALUE object) { return *TopSelfSlot() = object; }
+
 VALUE Global(VALUE, VALUE name) { return rb_gv_get(rb_id2name(SYM2ID(name))); }
 
 VALUE SetGlobal(VALUE, VALUE name, VALUE value) {
@@ -82,6 +96,7 @@ VALUE DefineModule(VALUE) {
   rb_define_singleton_method(module, "system_message", SystemMessage, 1);
   rb_define_singleton_method(module, "can_call?", CanCall, 0);
   rb_define_singleton_method(module, "lowest_descriptor", LowestDescriptor, 0);
+  rb_define_singleton_method(module, "top_self=", SetTopSelf, 1);
   rb_define_singleton_method(module, "global", Global, 1);
   rb_define_singleton_method(module, "set_global", SetGlobal, 2);
   DefineComObject(module);
@@ -115,8 +130,9 @@ bool StartInterpreter() {
 }  // namespace
 
 bool StartRuby() {
-  HostProcess& state = StartState();
-  state.Save();
+  startState = new (std::nothrow) HostProcess;
+  if (!startState) return false;
+  startState->Save();
   _putenv("RUBYLIB=");
   bool started = StartInterpreter();
   if (started) {
@@ -124,12 +140,12 @@ bool StartRuby() {
     rb_protect(DefineModule, Qnil, &failed);
     started = failed == 0;
   }
-  state.KeepAdditions();
-  state.Restore();
+  startState->KeepAdditions();
+  startState->Restore();
   return started;
 }
 
-void ApplyRubyEnvironment() { StartState().ApplyAdditions(); }
+void ApplyRubyEnvironment() { startState->ApplyAdditions(); }
 
 bool IsRubyThread() { return ruby_native_thread_p() != 0; }
 

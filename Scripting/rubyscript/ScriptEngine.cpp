@@ -34,7 +34,6 @@ HRESULT CreateScriptEngine(REFIID riid, void** object) {
 ScriptEngine::ScriptEngine(RubyHalf* rubyHalf) : half(rubyHalf) { AddServerReference(); }
 
 ScriptEngine::~ScriptEngine() {
-  Close();
   if (!half->context) delete half;
   ReleaseServerReference();
 }
@@ -59,7 +58,8 @@ ULONG ScriptEngine::Release() {
   const LONG left = InterlockedDecrement(&references);
   if (left == 0) {
     references = 1;  // closing takes and gives references of its own
-    delete this;
+    // From another thread it cannot be closed: it stays behind, deliberately, with all it holds.
+    if (Close() != E_UNEXPECTED) delete this;
   }
   return static_cast<ULONG>(left);
 }

@@ -12,14 +12,7 @@ module ActiveScript
 
     class << self
       def current = ENTERED.last
-
-      # What CRuby adds to messages. Loaded when there is one: it takes longer than all the rest.
-      def load_hints
-        require "error_highlight"
-        require "did_you_mean"
-      rescue LoadError
-        nil
-      end
+      attr_accessor :mute_host
     end
 
     attr_reader :byte_host # whether texts go to it as bytes
@@ -40,15 +33,16 @@ module ActiveScript
 
     def add_item(name, object)
       @items[name] = object
-      variable = :"@#{name}"
-      equal?(Context.current) ? MAIN.instance_variable_set(variable, object) : @world.add_variable(variable, object)
+      @world.main.instance_variable_set(:"@#{name}", object)
     end
 
-    # The first item that has a function `message`; nil without one.
+    # The first item that has a function `message`; nil without one. An 8-bit host tells its user of
+    # names it does not know, so it is asked once in the process.
     def messenger
-      @messenger = @items.values.find { |item| item.respond_to?(:message) } if @messenger.nil?
-      @messenger ||= false
-      @messenger || nil
+      return @messenger if defined?(@messenger)
+      @messenger = @items.values.find { |item| item.respond_to?(:message) } unless byte_host && Context.mute_host
+      Context.mute_host = true if byte_host && !@messenger
+      @messenger
     end
 
     # For the next run. Persistent code also runs in the context's successor. The cookie is the host's
@@ -81,19 +75,23 @@ module ActiveScript
     def run
       codes, @queue = @queue, []
       result = nil
+      nested, @running = @running, true
+      @outer_frames = ENTERED.size > 1 ? caller.size : 0
       Object.const_set(:DATA, StringIO.new(@data)) if @data && !Object.const_defined?(:DATA)
       error = attempt { codes.each { |code| result = code.eval } }
-      while (block = @exit_blocks.pop)
+      while !nested && (block = @exit_blocks.pop)
         error = attempt(&block) || error
       end
       @output.finish
       @error_output.finish
       raise error if error && !(SystemExit === error && error.success?)
       result
+    ensure
+      @running = nested
     end
 
     def call(name, arguments)
-      MAIN.__send__(name, *arguments)
+      @world.main.__send__(name, *arguments)
     ensure
       @output.finish if ActiveScript.can_call?
     end
@@ -112,10 +110,10 @@ module ActiveScript
 
     # Whether the host may call the name: what the macro has defined at its top level.
     def defines?(name)
-      name = name.to_sym
-      known = World.baseline
-      MAIN.respond_to?(name, true) && !known.methods.key?(name) && !known.singleton_methods.key?(name) &&
-        [Kernel, BasicObject].none? { |owner| owner.method_defined?(name) || owner.private_method_defined?(name) }
+      own = @world.main.method(name)
+      own.source_location&.then { |path, _| @sources.key?(path) } || false
+    rescue NameError
+      false
     end
 
     def inherit(sources, codes)
@@ -132,7 +130,6 @@ module ActiveScript
     # What the host is told of an error: description, line and column from 0, the line's text, the
     # cookie of its source.
     def describe(error)
-      Context.load_hints if NameError === error || KeyError === error
       name, line, column = syntax_position(error) || run_time_position(error)
       text = line_text(name, line)
       [description(error), line ? line - 1 : 0, column_in(text, column), text.to_s,
@@ -204,19 +201,20 @@ module ActiveScript
     end
 
     def run_time_position(error)
-      location = error.backtrace_locations&.find { |each| @sources.key?(each.path) }
+      location = own_frames(error.backtrace_locations.to_a).find { |each| @sources.key?(each.path) }
       return [location.path, location.lineno, column_of(error, location)] if location
-      frame = Array(error.backtrace).find { |each| @sources.key?(each[/\A[^:]*/]) }
+      frame = own_frames(Array(error.backtrace)).find { |each| @sources.key?(each[/\A[^:]*/]) }
       frame ? [frame[/\A[^:]*/], frame[/:(\d+)/, 1].to_i, 0] : [nil, nil, 0]
     end
 
-    # In bytes. CRuby can tell where the node of a frame begins.
+    # In bytes. The library's part that is loaded changes no message. CRuby can tell where the node of a frame begins.
     def column_of(error, location)
       node = RubyVM::AbstractSyntaxTree.of(location, keep_script_lines: true)
+      require "error_highlight/base"
       spot = ErrorHighlight.spot(node, point_type: :name, name: error.name) if NameError === error
       return spot[:first_column] if spot && spot[:first_lineno] == location.lineno
       node.first_lineno == location.lineno ? node.first_column : 0
-    rescue StandardError
+    rescue StandardError, LoadError
       0
     end
 
@@ -231,20 +229,29 @@ module ActiveScript
       text && bytes <= text.bytesize ? text.byteslice(0, bytes).length : 0
     end
 
-    # The macro's own classes of exceptions may fail in any of these.
+    # The macro's own classes of exceptions may fail here, and their texts be in any encoding.
     def message_of(error)
-      error.message.to_s
+      message = error.message.to_s
+      return message.scrub if message.encoding == Encoding::UTF_8
+      return message.b.force_encoding(Encoding::UTF_8).scrub if message.encoding == Encoding::BINARY
+      message.encode(Encoding::UTF_8, invalid: :replace, undef: :replace)
     rescue Stop
       raise
     rescue Exception
       ""
     end
 
+    # Below them stand those of a macro that waits for this one, whose texts have the same names.
+    def own_frames(frames)
+      own = frames.size - @outer_frames.to_i
+      own.positive? ? frames.first(own) : frames
+    end
+
     def description(error)
       message = message_of(error)
       message = error.class.name.to_s if message.empty?
       first, rest = message.split("\n", 2)
-      frames = Array(error.backtrace).select { |each| @sources.key?(each[/\A[^:]*/]) }
+      frames = own_frames(Array(error.backtrace)).select { |each| @sources.key?(each[/\A[^:]*/]) }
                                      .reject { |each| each.end_with?("in `method_missing'") }
                                      .map { |each| each.sub("<compiled>'", "<main>'") }
       text = SyntaxError === error ? message : ["#{first} (#{error.class})", rest].compact.join("\n")

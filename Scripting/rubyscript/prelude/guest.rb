@@ -11,9 +11,6 @@ module ActiveScript
   end
   Thread.singleton_class.prepend(ThreadList)
 
-  # The top-level object is one for all macros.
-  def MAIN.freeze = self
-
   # A macro that is started inside a fiber of another one must not yield for it.
   module GuestFiber
     def yield(*)

@@ -8,13 +8,12 @@ module ActiveScript
     SPECIAL = /\A\$([~_!@&`'+1-9?$<>.":*=]\z|-[pladFKivw]|FILENAME|KCODE|LOAD|PROGRAM_NAME|VERBOSE)/
     private_constant :SPECIAL
 
-    attr_reader :constants, :methods, :singleton_methods, :globals, :settings, :lists, :features, :locals
+    attr_reader :constants, :methods, :globals, :settings, :lists, :features, :locals
 
     def initialize
       @folder = File.dirname($LOAD_PATH.grep(%r{/ruby/\d[^/]*\z}).first)
-      @constants = Object.constants(false).to_h { |name| [name, true] }
+      @constants = Object.constants(false).to_h { |name| [name, World.constant(name)] }
       @methods = World.method_names(Object).to_h { |name| [name, true] }
-      @singleton_methods = World.method_names(MAIN.singleton_class).to_h { |name| [name, true] }
       @settings = World.settings
       @lists = World::LISTS.map(&:dup)
       @features = $LOADED_FEATURES.to_h { |path| [path, true] }
@@ -51,8 +50,9 @@ module ActiveScript
     end
   end
 
-  # A macro's share of the top level: its methods, constants, variables and settings. It is in place
-  # while the macro runs and put aside when it does not.
+  # A macro's share of the top level: an object of its own and the methods, constants, variables and
+  # settings that belong to Ruby as a whole. It is in place while the macro runs and put aside when it
+  # does not.
   class World
     LISTS = [ARGV, $LOAD_PATH].freeze
     FEATURES = $LOADED_FEATURES
@@ -61,6 +61,9 @@ module ActiveScript
       attr_accessor :baseline
 
       def method_names(owner) = owner.instance_methods(false) + owner.private_instance_methods(false)
+
+      # nil for one that is still to be loaded.
+      def constant(name) = Object.autoload?(name) ? nil : Object.const_get(name)
 
       def settings
         { verbose: $VERBOSE, external: Encoding.default_external, internal: Encoding.default_internal,
@@ -83,41 +86,38 @@ module ActiveScript
 
     # The globals are the first ones the macro sees changed.
     def initialize(globals)
+      @main = MAIN.clone
       @globals = globals
       @constants = {}
       @methods = []
-      @singleton_methods = []
-      @variables = {}
       @settings = baseline.settings
       @lists = baseline.lists
       @features = []
       @locals = {}
     end
 
-    def add_variable(name, value) = @variables[name] = value
+    attr_reader :main # the top-level object
 
     def put_aside
+      GC.stress = false
       set_trace_func(nil)
       @settings = World.settings.merge(gc_disabled: GC.enable)
       $VERBOSE = nil # redefining is what follows
       take_constants
-      @methods = take_methods(Object, baseline.methods)
-      @singleton_methods = take_methods(MAIN.singleton_class, baseline.singleton_methods)
-      MAIN.instance_variables.each { |name| @variables[name] = MAIN.remove_instance_variable(name) }
+      take_methods
       take_globals
       take_lists
       take_locals
       World.apply(baseline.settings)
+      ActiveScript.top_self = MAIN
     end
 
     def put_back
+      ActiveScript.top_self = @main
       $VERBOSE = nil
       @constants.each { |name, value| Object.const_set(name, value) }
       @constants = {}
-      give_methods(Object, @methods)
-      give_methods(MAIN.singleton_class, @singleton_methods)
-      @variables.each { |name, value| MAIN.instance_variable_set(name, value) }
-      @variables = {}
+      give_methods
       @globals.each { |name, value| ActiveScript.set_global(name, value) }
       LISTS.zip(@lists) { |list, content| list.replace(content) unless list == content }
       FEATURES.concat(@features)
@@ -132,34 +132,46 @@ module ActiveScript
     def take_constants
       known = baseline.constants
       Object.constants(false).each do |name|
-        next if known.key?(name)
-        value = Object.const_get(name) unless Object.autoload?(name)
-        next known[name] = true if baseline.library_constant?(Object.const_source_location(name), value)
+        value = World.constant(name)
+        next restore_constant(name, value, known) if known.key?(name)
+        next known[name] = value if baseline.library_constant?(Object.const_source_location(name), value)
         @constants[name] = Object.__send__(:remove_const, name)
       end
     end
 
-    def take_methods(owner, known)
-      World.method_names(owner).filter_map do |name|
-        next if known.key?(name)
-        method = owner.instance_method(name)
+    # One that everybody has may have been loaded by now, or been given another value by the macro.
+    def restore_constant(name, value, known)
+      original = known[name]
+      return known[name] = value if original.nil?
+      return if value.equal?(original)
+      Object.__send__(:remove_const, name)
+      Object.const_set(name, original)
+    end
+
+    def take_methods
+      @methods = World.method_names(Object).filter_map do |name|
+        next if baseline.methods.key?(name)
+        method = Object.instance_method(name)
         location = method.source_location # an alias of a method in C has none
-        next known[name] = nil if location && baseline.library?(location)
-        entry = [method, visibility(owner, name)]
-        owner.__send__(:remove_method, name)
+        if location && baseline.library?(location)
+          baseline.methods[name] = true
+          next
+        end
+        entry = [method, visibility(name)]
+        Object.__send__(:remove_method, name)
         entry
       end
     end
 
-    def visibility(owner, name)
-      return :private if owner.private_method_defined?(name)
-      owner.protected_method_defined?(name) ? :protected : :public
+    def visibility(name)
+      return :private if Object.private_method_defined?(name)
+      Object.protected_method_defined?(name) ? :protected : :public
     end
 
-    def give_methods(owner, entries)
-      entries.each do |method, visibility|
-        owner.define_method(method.name, method)
-        owner.__send__(visibility, method.name)
+    def give_methods
+      @methods.each do |method, visibility|
+        Object.define_method(method.name, method)
+        Object.__send__(visibility, method.name)
       end
     end
 
