@@ -10,11 +10,20 @@
 
 namespace {
 
+// A fault by the rules of the host's guard: an error, of a customer's own.
+constexpr DWORD kUnstoppable = 0xE0525542;
+
 HANDLE wakeEvent = nullptr;  // made once, before the first macro
 VALUE interrupterThread = Qnil;
 VALUE mainThread = Qnil;
 
 constexpr DWORD kGrace = 500;  // milliseconds for `ensure` blocks
+
+// When the exception has been of no use, as in a loop whose `ensure` block ends in `next`, the code is
+// left at each of its lines; when that has been of no use so many times, the interpreter is given up.
+constexpr int kMostLeaves = 1000;
+int deliveries = 0;
+int leaves = 0;
 
 void* WaitOutside(void* milliseconds) {
   WaitForSingleObject(wakeEvent, *static_cast<DWORD*>(milliseconds));
@@ -32,36 +41,22 @@ VALUE CheckInterrupts(VALUE) {
   return Qnil;
 }
 
-void OnEvent(VALUE, rb_trace_arg_t* event) {
+void OnEvent(rb_event_flag_t, VALUE, VALUE, ID, VALUE) {
   if (!Interpreter::IsMainThread() || Interpreter::InterruptDue() == Interpreter::Urgency::kNone)
     return;
-  if (rb_tracearg_event_flag(event) == RUBY_EVENT_RAISE) {
-    const bool isStop = rb_obj_class(rb_tracearg_raised_exception(event)) == StopClass();
-    if (!isStop || !IsOnGuardedFiber()) return;
-  } else {
-    VALUE ignored;
-    Protect(CheckInterrupts, Qnil, ignored);  // the exception is not needed any more
-  }
-  Interrupter::RemoveHook();
+  if (++leaves > kMostLeaves) RaiseException(kUnstoppable, 0, 0, nullptr);
+  VALUE ignored;
+  Protect(CheckInterrupts, Qnil, ignored);  // the exception is not needed any more
   LeaveTask();
-}
-
-// A hook with this flag has parameters of its own.
-rb_event_hook_func_t Hook() {
-  return reinterpret_cast<rb_event_hook_func_t>(reinterpret_cast<void*>(OnEvent));
 }
 
 VALUE RaiseOnMainThread(VALUE) {
   return rb_funcall(mainThread, rb_intern("raise"), 1, StopClass());
 }
 
-void SetHook(rb_event_flag_t events) {
-  Interrupter::RemoveHook();
-  rb_add_event_hook2(Hook(), events, Qnil, RUBY_EVENT_HOOK_FLAG_RAW_ARG);
-}
-
 VALUE Deliver(VALUE) {
-  SetHook(RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL | RUBY_EVENT_RAISE);
+  if (++deliveries == 2)
+    rb_add_event_hook(OnEvent, RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL, Qnil);
   return RaiseOnMainThread(Qnil);
 }
 
@@ -95,17 +90,15 @@ void Interrupter::EnsureAlive() {
              interrupterThread);
 }
 
-void Interrupter::RemoveHook() { rb_remove_event_hook(Hook()); }
-
-void Interrupter::LeaveAtResumer() { SetHook(RUBY_EVENT_RAISE); }
-
 void Interrupter::StopMainThread() {
   VALUE ignored;
   Protect(RaiseOnMainThread, Qnil, ignored);
 }
 
 void Interrupter::Settle() {
-  RemoveHook();
+  rb_remove_event_hook(OnEvent);
+  deliveries = 0;
+  leaves = 0;
   VALUE ignored;
   constexpr int kMostPending = 1000;  // a thread of the macro's may have raised some as well
   for (int i = 0; i < kMostPending; ++i)

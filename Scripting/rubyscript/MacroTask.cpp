@@ -164,6 +164,7 @@ void MacroTask::Work() {
   }
   Interpreter::SetInterruptible(false);
   Interrupter::Settle();
+  if (Interpreter::MustEnd()) result = E_ABORT;  // also of a macro that has come to its end
 }
 
 void MacroTask::Run() {

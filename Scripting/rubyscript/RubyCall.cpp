@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "Interpreter.h"
-#include "Interrupter.h"
-// Last: it renames what the headers above use.
+// Last: it renames what the header above uses.
 #include "RubyCall.h"
 
 namespace {
@@ -71,14 +70,12 @@ Outcome Send(VALUE receiver, const char* method, int count, const VALUE* argumen
   return Protect(CallMethod, reinterpret_cast<VALUE>(&call), result);
 }
 
+// A fiber of the macro's own has no such tag: there the exception goes to the one that resumed it.
 void LeaveTask() {
   Interpreter::SetLeaving();
-  if (IsOnGuardedFiber()) rb_throw_obj(LeaveTag(), LeaveTag());
-  Interrupter::LeaveAtResumer();
+  if (rb_fiber_current() == guardedFiber) rb_throw_obj(LeaveTag(), LeaveTag());
   rb_raise(StopClass(), "the macro has been stopped");
 }
-
-bool IsOnGuardedFiber() { return rb_fiber_current() == guardedFiber; }
 
 VALUE ActiveScriptConst(const char* name) {
   const VALUE module = rb_const_get(rb_cObject, rb_intern("ActiveScript"));

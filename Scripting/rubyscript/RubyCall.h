@@ -21,10 +21,6 @@ Outcome Send(VALUE receiver, const char* method, int count, const VALUE* argumen
 // Leaves the innermost task: its `ensure` blocks run, no `rescue` takes it.
 [[noreturn]] void LeaveTask();
 
-// Whether the main thread is in the fiber that the innermost Protect is in, so that it can be left at
-// once; in others an exception has to go to the one that resumed it.
-bool IsOnGuardedFiber();
-
 // A constant of the engine's own module `ActiveScript`.
 VALUE ActiveScriptConst(const char* name);
 // `ActiveScript::Stop`, what an interrupted macro ends with where it cannot be left otherwise.

@@ -2,6 +2,13 @@
 # What a macro must not do to the process it is a guest of.
 
 module ActiveScript
+  # A macro that is to end is not held up by `rescue Exception`.
+  module Unrescuable
+    def ===(error) = !(Stop === error) && super
+  end
+  Exception.singleton_class.prepend(Unrescuable)
+  def Stop.===(error) = equal?(error.class)
+
   ALL_THREADS = Thread.method(:list)
   private_constant :ALL_THREADS
 

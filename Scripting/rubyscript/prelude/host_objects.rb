@@ -86,7 +86,7 @@ module ActiveScript
     # Ruby's own questions about conversions are not for the host.
     ASKED_BY_RUBY = %i[
       to_a to_ary to_c to_f to_h to_hash to_i to_int to_io to_open to_path to_proc to_r to_regexp to_str to_sym
-      coerce deconstruct deconstruct_keys exception marshal_dump _dump
+      coerce deconstruct deconstruct_keys exception marshal_dump _dump _dump_data
     ].freeze
     private_constant :ASKED_BY_RUBY
 
