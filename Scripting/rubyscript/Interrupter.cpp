@@ -22,6 +22,7 @@ constexpr DWORD kGrace = 500;  // milliseconds for `ensure` blocks
 // When the exception has been of no use, as in a loop whose `ensure` block ends in `next`, the code is
 // left at each of its lines; when that has been of no use so many times, the interpreter is given up.
 constexpr int kMostLeaves = 1000;
+bool delivering = false;
 int deliveries = 0;
 int leaves = 0;
 
@@ -38,6 +39,11 @@ void Wait(DWORD milliseconds) {
 
 VALUE CheckInterrupts(VALUE) {
   rb_thread_check_ints();
+  return Qnil;
+}
+
+VALUE LetOthersRun(VALUE) {
+  rb_thread_schedule();  // checks for interrupts, too
   return Qnil;
 }
 
@@ -60,14 +66,20 @@ VALUE Deliver(VALUE) {
   return RaiseOnMainThread(Qnil);
 }
 
+// Threads may switch between the look and the exception; Settle lets this come to its end first.
+void DeliverIfDue() {
+  delivering = true;
+  VALUE ignored;
+  if (Interpreter::InterruptDue() != Interpreter::Urgency::kNone) Protect(Deliver, Qnil, ignored);
+  delivering = false;
+}
+
 VALUE Interrupt(void*) {
   for (;;) {
     Wait(INFINITE);
     while (Interpreter::InterruptDue() != Interpreter::Urgency::kNone) {
       if (Interpreter::InterruptDue() == Interpreter::Urgency::kAfterGrace) Wait(kGrace);
-      if (Interpreter::InterruptDue() == Interpreter::Urgency::kNone) break;
-      VALUE ignored;
-      Protect(Deliver, Qnil, ignored);
+      DeliverIfDue();
       Wait(kGrace);
     }
   }
@@ -100,9 +112,11 @@ void Interrupter::Settle() {
   deliveries = 0;
   leaves = 0;
   VALUE ignored;
-  constexpr int kMostPending = 1000;  // a thread of the macro's may have raised some as well
-  for (int i = 0; i < kMostPending; ++i)
-    if (Protect(CheckInterrupts, Qnil, ignored) == Outcome::kDone) break;
+  constexpr int kMostTries = 1000;  // threads of the macro's may have raised something as well
+  for (int i = 0; i < kMostTries; ++i) {
+    const auto check = delivering ? LetOthersRun : CheckInterrupts;
+    if (Protect(check, Qnil, ignored) == Outcome::kDone && !delivering) break;
+  }
 }
 
 void Interrupter::Wake() {

@@ -94,6 +94,7 @@ module ActiveScript
       @lists = baseline.lists
       @features = []
       @locals = {}
+      @thread_variables = {}
     end
 
     attr_reader :main # the top-level object
@@ -122,6 +123,7 @@ module ActiveScript
       LISTS.zip(@lists) { |list, content| list.replace(content) unless list == content }
       FEATURES.concat(@features)
       @locals.each { |name, value| Thread.current[name] = value }
+      @thread_variables.each { |name, value| Thread.current.thread_variable_set(name, value) }
       World.apply(@settings)
     end
 
@@ -201,7 +203,9 @@ module ActiveScript
     def take_locals
       @locals = (Thread.current.keys - baseline.locals).to_h { |name| [name, Thread.current[name]] }
       @locals.each_key { |name| Thread.current[name] = nil }
-      Thread.current.thread_variables.each { |name| Thread.current.thread_variable_set(name, nil) }
+      names = Thread.current.thread_variables
+      @thread_variables = names.to_h { |name| [name, Thread.current.thread_variable_get(name)] }
+      names.each { |name| Thread.current.thread_variable_set(name, nil) }
     end
   end
 
