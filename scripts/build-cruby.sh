@@ -1,13 +1,13 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: MIT
-# Cross-builds CRuby for 32-bit Windows from Debian's source package, for the Ruby engine that is to
-# come, and prints the folder that holds it:
+# Cross-builds CRuby for 32-bit Windows from Debian's source package, for the Ruby engine, and prints
+# the folder that holds it:
 #   include/   headers for embedding (ruby.h, ruby/config.h)
 #   lib/       libmsvcrt-ruby310.dll.a
 #   ruby/      what a Windows machine needs: bin, lib/ruby/3.1.0, licenses. It works wherever it is copied.
 #   samples/   the package's own test/ruby, sample and benchmark, and tool/lib, which the tests need
 # The folder is in a cache outside the build folder and appears in one rename, so it is whole or not
-# there. Changing this file makes another one. Call it before taking the build lock: it takes that itself.
+# there. Changing a command here makes another one. Call it before taking the build lock: it takes that itself.
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
@@ -30,7 +30,7 @@ UNUSABLE=(
 )
 
 CACHE=${SCRIPTRUBY_CACHE:-$HOME/.cache/scriptruby}
-RECIPE=$(sha256sum <"${BASH_SOURCE[0]}")
+RECIPE=$(grep -v '^ *#' "${BASH_SOURCE[0]}" | sha256sum)
 NAME=cruby-$VERSION-${RECIPE:0:12}
 RESULT=$CACHE/$NAME
 
