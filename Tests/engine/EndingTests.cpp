@@ -1,0 +1,222 @@
+// SPDX-License-Identifier: MIT
+// Runs that do not end by themselves: the host leaves its function by a jump or a fault, or another
+// thread interrupts the macro. The next one is as if nothing had been.
+#include "EngineHost.h"
+
+#include <setjmp.h>
+
+#include <algorithm>
+#include <deque>
+#include <map>
+#include <thread>
+
+namespace {
+
+enum class Leave { kJump, kFault };
+
+jmp_buf targets[4];  // by depth
+
+void LeaveTo(int depth, Leave leave) {
+  if (leave == Leave::kJump) longjmp(targets[depth], 1);
+  *reinterpret_cast<volatile int*>(8) = 1;
+}
+
+// Runs what is parsed until a function leaves; whether one has.
+bool StartAndLeave(Host& host, Leave leave, int depth = 0) {
+  if (leave == Leave::kFault) return Guarded([&] { host.Start(); }) == EXCEPTION_ACCESS_VIOLATION;
+  if (setjmp(targets[depth])) return true;
+  host.Start();
+  return false;
+}
+
+// A trail that outlives the macro that leaves it.
+const std::string kMark =
+    "def mark(x) = (Comparable.instance_variable_get(:@trail) || "
+    "Comparable.instance_variable_set(:@trail, [])) << x\n";
+std::string Trail() {
+  Host host;
+  return host.Inspect(
+      "Comparable.instance_variable_get(:@trail).tap { Comparable.instance_variable_set(:@trail, "
+      "nil) }");
+}
+
+int Count() {
+  const char* const count = std::getenv("SCRIPTRUBY_TEST_FAULTS");
+  return count ? std::atoi(count) : 1000;
+}
+
+}  // namespace
+
+// The outcome is the trail that is left, by a jump as by a fault.
+TEST(Ending, HostLeaves) {
+  DWORD longest = 0;
+  CheckTranscript("stops.txt", [&](const std::string& macro) {
+    std::map<Leave, std::string> trails;
+    for (const Leave leave : {Leave::kJump, Leave::kFault}) {
+      Host host;
+      host.item.Does("leave", [&] { LeaveTo(0, leave); });
+      host.item.Add("f");
+      host.Open();
+      EXPECT_EQ(S_OK, host.Parse(kMark + macro)) << macro;
+      const DWORD start = GetTickCount();
+      EXPECT_TRUE(StartAndLeave(host, leave)) << macro;
+      longest = std::max(longest, GetTickCount() - start);
+      const std::string log = TakeLog();
+      EXPECT_EQ("item.leave()", log.substr(std::min(log.find("item.leave"), log.size()))) << macro;
+      host.Close();
+      EXPECT_EQ("", TakeLog()) << macro;
+      trails[leave] = Trail();
+    }
+    EXPECT_EQ(trails[Leave::kJump], trails[Leave::kFault]) << macro;
+    return trails[Leave::kJump];
+  });
+  std::cout << "[ longest ] " << longest << " ms for an endless `ensure`\n";
+  EXPECT_LT(longest, 2500u);
+}
+
+// Macros three deep, left from the innermost one to each depth.
+TEST(Ending, HostLeavesNestedRuns) {
+  for (Leave leave : {Leave::kJump, Leave::kFault})
+    for (int depth = 0; depth < 3; ++depth) {
+      std::deque<Host> hosts(3);
+      const std::function<void(int)> run = [&](int level) {
+        Host& host = hosts[level];
+        host.item.Add("f");
+        host.item.Does("nest", [&, level] { level == 2 ? LeaveTo(depth, leave) : run(level + 1); });
+        host.Open();
+        host.Parse("D = " + std::to_string(level) + "\n" + kMark +
+                   "begin; @item.nest; mark D + 10; ensure; mark D; @item.f D; end");
+        if (level != depth) host.Start();
+        if (level == depth) EXPECT_TRUE(StartAndLeave(host, leave, depth));
+      };
+      run(0);
+      const char* const logs[] = {"", "; item.f(I4 0)", "; item.f(I4 1); item.f(I4 0)"};
+      EXPECT_EQ("item.nest(); item.nest(); item.nest()"s + logs[depth], TakeLog());
+      for (Host& host : hosts) host.Close();
+      EXPECT_EQ("", TakeLog()) << depth;
+      const char* const trails[] = {"[2, 1, 0]", "[2, 1, 10, 0]", "[2, 11, 1, 10, 0]"};
+      EXPECT_EQ(trails[depth], Trail());
+    }
+}
+
+// Runs the macro and interrupts it a moment after it has called `go`; milliseconds from there on.
+static double Interrupted(Host& host, const std::string& macro, DWORD wait = 20) {
+  const HANDLE go = CreateEventA(nullptr, FALSE, FALSE, nullptr);
+  host.item.Does("go", [&] { SetEvent(go); });
+  LARGE_INTEGER frequency, start = {}, end;
+  QueryPerformanceFrequency(&frequency);
+  host.Open();
+  EXPECT_EQ(S_OK, host.Parse(macro)) << macro;
+  std::thread other([&] {
+    if (WaitForSingleObject(go, 5000)) return;
+    Sleep(wait);
+    QueryPerformanceCounter(&start);
+    EXPECT_EQ(S_OK, host.script->InterruptScriptThread(SCRIPTTHREADID_BASE, nullptr, 0));
+  });
+  EXPECT_EQ(E_ABORT, host.Start()) << macro;
+  QueryPerformanceCounter(&end);
+  other.join();
+  CloseHandle(go);
+  host.Close();
+  return 1000.0 * (end.QuadPart - start.QuadPart) / frequency.QuadPart;
+}
+
+TEST(Ending, Interrupts) {
+  Host host;
+  host.item.Add("f");
+  double longest = 0;
+  CheckTranscript("interrupts.txt", [&](const std::string& macro) {
+    const double elapsed = Interrupted(host, "@item.go\n" + macro);
+    // What does not let itself be ended gets a grace first.
+    const bool resists = macro.find("# resists") != std::string::npos;
+    EXPECT_LT(elapsed, resists ? 1500 : 400) << macro;
+    if (!resists) longest = std::max(longest, elapsed);
+    const std::string log = TakeLog();  // no error, and nothing left over
+    EXPECT_EQ("item.f(I4 1)", host.Run("@item.f 1")) << macro;
+    return log;
+  });
+  std::cout << "[ longest ] " << longest << " ms to an interrupt's effect\n";
+
+  // In a call of the host the macro ends when the call returns, from whichever thread.
+  host.item.Does("self", [&] {
+    EXPECT_EQ(S_OK, host.script->InterruptScriptThread(SCRIPTTHREADID_CURRENT, nullptr, 0));
+  });
+  EXPECT_EQ("item.self(); 80004004",
+            host.Run("begin; @item.self; rescue Exception; end; @item.f 1"));
+  // Nothing to interrupt, and nothing that comes of it later.
+  host.Open();
+  EXPECT_EQ(S_OK, host.script->InterruptScriptThread(SCRIPTTHREADID_ALL, nullptr, 0));
+  host.Parse("sleep 0.05; @item.f 2");
+  EXPECT_EQ(S_OK, host.Start());
+  EXPECT_EQ(S_OK, host.script->InterruptScriptThread(SCRIPTTHREADID_ALL, nullptr, 0));
+  EXPECT_EQ(S_OK, host.Parse("@item.f 3"));
+  host.Close();
+  EXPECT_EQ("item.f(I4 2); item.f(I4 3)", TakeLog());
+
+  // Of two nested macros the outer one: the inner one runs to its end first.
+  Host outer;
+  outer.item.Does("nest", [&] {
+    outer.script->InterruptScriptThread(SCRIPTTHREADID_BASE, nullptr, 0);
+    Log(host.Run("sleep 0.05; @item.f 4"));
+  });
+  EXPECT_EQ("item.nest(); item.f(I4 4); 80004004",
+            outer.Run("begin; @item.nest; rescue Exception; end; @item.nest"));
+}
+
+// Of the process: memory of its own, and the number of a new handle, which grows with those that
+// stay open.
+struct Weight {
+  SIZE_T bytes;
+  size_t handle;
+};
+
+static Weight Weigh() {
+  Weight weight = {};
+  MEMORY_BASIC_INFORMATION region;
+  for (char* at = nullptr; VirtualQuery(at, &region, sizeof region); at += region.RegionSize)
+    if (region.State == MEM_COMMIT && region.Type == MEM_PRIVATE) weight.bytes += region.RegionSize;
+  const HANDLE handle = CreateEventA(nullptr, FALSE, FALSE, nullptr);
+  weight.handle = reinterpret_cast<size_t>(handle) / 4;
+  CloseHandle(handle);
+  return weight;
+}
+
+TEST(Ending, Soak) {
+  const auto repeat = [](const char* what, int runs, const std::function<void()>& run) {
+    Weight early = {};
+    const DWORD start = GetTickCount();
+    for (int i = 1; i <= runs; ++i) {
+      run();
+      if (i == std::max(runs / 10, 1)) early = Weigh();
+    }
+    const Weight late = Weigh();
+    std::cout << "[ " << what << " ] " << runs << " in " << GetTickCount() - start
+              << " ms; private KiB " << early.bytes / 1024 << ", " << late.bytes / 1024
+              << "; next handle " << early.handle << ", " << late.handle << std::endl;
+    EXPECT_LE(late.bytes, early.bytes + early.bytes / 4) << what;
+    EXPECT_LE(late.handle, early.handle + 8) << what;
+    EXPECT_EQ("", TakeLog()) << what;
+  };
+  Host host;
+  host.item.quiet = true;
+  host.item.Add("f");
+  Leave leave = Leave::kJump;
+  host.item.Does("leave", [&] { LeaveTo(0, leave); });
+  const auto leaveOnce = [&] {
+    host.Open();
+    host.Parse(
+        "def helper = @item.leave\n@kept = 'x' * 10_000\nbegin; helper; ensure; $x = 1; end");
+    EXPECT_TRUE(StartAndLeave(host, leave));
+    host.Close();
+  };
+  repeat("stops", Count(), leaveOnce);
+  leave = Leave::kFault;
+  repeat("faults", Count(), leaveOnce);
+  repeat("interrupts", Count(),
+         [&] { Interrupted(host, "@kept = 'x' * 10_000; @item.go; loop { }", 0); });
+  repeat("runs", 10 * Count(), [&] {
+    EXPECT_EQ(
+        "",
+        host.Run("class Local; end\ndef helper(x) = x.to_s * 100\n@item.f helper(1), [1, @item]"));
+  });
+}

@@ -1,0 +1,59 @@
+// SPDX-License-Identifier: MIT
+// The interpreter's life in a process, in a program of its own: what is before its start and, at the
+// end, its loss.
+#include "EngineHost.h"
+
+TEST(Life, KeepsTheLibraryFromItsStartOn) {
+  const auto canUnload = reinterpret_cast<HRESULT(WINAPI*)()>(EngineExport("DllCanUnloadNow"));
+  EXPECT_EQ(S_OK, canUnload());
+  IClassFactory* factory = nullptr;
+  ASSERT_EQ(S_OK,
+            GetClassObject(kEngineClass, IID_IClassFactory, reinterpret_cast<void**>(&factory)));
+  EXPECT_EQ(S_FALSE, canUnload());
+  EXPECT_EQ(S_OK, factory->LockServer(TRUE));
+  factory->Release();
+  EXPECT_EQ(S_FALSE, canUnload());
+  EXPECT_EQ(S_OK, factory->LockServer(FALSE));
+  EXPECT_EQ(S_OK, canUnload());
+  Host host;
+  host.Open();
+  EXPECT_EQ(S_FALSE, canUnload());
+  host.Close();
+  EXPECT_EQ(S_OK, canUnload());
+  EXPECT_EQ("", host.Run("1"));
+  EXPECT_EQ(S_FALSE, canUnload());
+}
+
+// The fault goes to the guard of the host that called last; nobody else waits for ever.
+TEST(Life, EndsWithAFaultInsideOfRuby) {
+  const char* const loses =
+      "begin\n"
+      "  code = RubyVM::InstructionSequence.compile('1').to_binary.b\n"
+      "  code[28, 4] = [0x70000000].pack('V') # where its list of methods is\n"
+      "  RubyVM::InstructionSequence.load_from_binary(code).eval\n"
+      "rescue Exception\nensure\n  @item.f\nend";
+  Host outer, inner, early, late;
+  inner.item.Add("f");
+  outer.item.Does("nest", [&] {
+    inner.Open();
+    inner.Parse(loses);
+    EXPECT_EQ(EXCEPTION_ACCESS_VIOLATION, Guarded([&] { inner.Start(); }));
+    inner.Close();
+  });
+  early.Open();
+  EXPECT_EQ(S_OK, early.Parse("def f = 1"));
+  EXPECT_EQ(S_OK, early.Start());
+  // What Ruby held of the host's objects is lost with it.
+  const std::string left = "left over: 0 of the engine, 0 of the site, 1 of the item";
+  EXPECT_EQ("item.nest(); " + left + "; 80004004; " + left,
+            outer.Run("begin; @item.nest; rescue Exception; end; @item.nest"));
+  const std::string lost =
+      "error: Ruby was lost to a fault (exception 0xC0000005) in an earlier macro. "
+      "Start the program anew to run Ruby macros again.";
+  EXPECT_EQ(kReported, early.Parse("f"));
+  early.Close();
+  EXPECT_EQ(lost + "; " + left, TakeLog());
+  for (int i = 0; i < 2; ++i) EXPECT_EQ(lost, late.Run("1"));
+  late.errorAnswer = E_FAIL;
+  EXPECT_EQ(lost + "; 80020009", late.Run("1"));
+}
