@@ -12,7 +12,7 @@ LOGS=$BUILD/logs
 PACKAGES=(
   clang-19 lld-19 llvm-19 libclang-rt-19-dev
   g++-mingw-w64-i686-posix mingw-w64-i686-dev g++-multilib
-  cmake ninja-build googletest libcli11-dev
+  cmake ninja-build googletest libcli11-dev nlohmann-json3-dev
   wine wine32:i386
 )
 
@@ -104,29 +104,32 @@ start_wine() {
   wine cmd /c exit >/dev/null 2>&1 </dev/null || true
 }
 
-# build_release CRUBY [TARGET...]: configures with that CRuby when it is due, and builds.
+# build_release CRUBY PCRE2 [TARGET...]: configures with those when it is due, and builds.
 build_release() {
-  local cruby=$1 made=$BUILD/release/build.ninja
-  shift
+  local cruby=$1 pcre2=$2 made=$BUILD/release/build.ninja
+  shift 2
   if ! [ "$made" -nt "$ROOT/CMakePresets.json" ] ||
     ! [ "$made" -nt "$ROOT/cmake/i686-w64-mingw32-clang.cmake" ] ||
-    ! grep -qxF "SCRIPTRUBY_CRUBY:PATH=$cruby" "$BUILD/release/CMakeCache.txt"; then
-    step "configuring" cmake -S "$ROOT" --preset release --fresh "-DSCRIPTRUBY_CRUBY=$cruby"
+    ! grep -qxF "SCRIPTRUBY_CRUBY:PATH=$cruby" "$BUILD/release/CMakeCache.txt" ||
+    ! grep -qxF "SCRIPTRUBY_PCRE2:PATH=$pcre2" "$BUILD/release/CMakeCache.txt"; then
+    step "configuring" cmake -S "$ROOT" --preset release --fresh \
+      "-DSCRIPTRUBY_CRUBY=$cruby" "-DSCRIPTRUBY_PCRE2=$pcre2"
   fi
   ninja -C "$BUILD/release" -n "$@" 2>/dev/null | grep -q 'no work to do' ||
     step "building" cmake --build "$BUILD/release" ${1:+--target "$@"}
 }
 
-# prepare [TARGET...]: set-up, build and Wine's server; one process at a time. CRuby comes first, since
-# its script takes the lock itself.
+# prepare [TARGET...]: set-up, build and Wine's server; one process at a time. CRuby and PCRE2 come
+# first, since their scripts take the lock themselves.
 prepare() {
-  local cruby
+  local cruby pcre2
   cruby=$("$ROOT/scripts/build-cruby.sh")
+  pcre2=$("$ROOT/scripts/build-pcre2.sh")
   mkdir -p "$BUILD"
   exec 9>"$BUILD/.lock"
   flock 9
   set_up
-  build_release "$cruby" "$@"
+  build_release "$cruby" "$pcre2" "$@"
   exec 9>&-
   start_wine
 }

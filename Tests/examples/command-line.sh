@@ -1,50 +1,30 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# command-line.sh MACRORUN FAKE_MODULE: exit codes, messages and what becomes of the text.
-. "$(dirname "$0")/wine.sh"
-macrorun=$1
-fake=$2
-folder=$(mktemp -d)
-trap 'rm -rf "$folder"' EXIT
-cd "$folder" || exit 1
-failures=0
-source=
-
-fail() {
-  echo "FAILED: $*"
-  failures=$((failures + 1))
-}
-
-# expect CODE TEXT [ARGUMENT...]: the exit code, and a text on either stream. A run that fails leaves
-# standard output empty.
-expect() {
-  code=$1 text=$2
-  shift 2
-  wine "$macrorun" "$@" > out 2> err
-  result=$?
-  [ $result -eq "$code" ] || fail "$* ($source): exit code $result, expected $code"
-  cat out err | grep -qF -- "$text" || fail "$* ($source): no '$text' in: $(cat err)"
-  [ "$code" -eq 0 ] || [ ! -s out ] || fail "$* ($source): printed although it failed"
-}
-
-# expect_js CODE TEXT SOURCE, expect_rbs likewise: as above, for a macro over input.txt.
-expect_source() {
-  source=$4
-  printf '%s\n' "$source" > "macro.$1"
-  expect "$2" "$3" "macro.$1" input.txt
-}
-expect_js() { expect_source js "$@"; }
-expect_rbs() { expect_source rbs "$@"; }
+# command-line.sh MACRORUN FAKE_MODULE: usage, exit codes, wrong calls, texts and paths.
+. "$(dirname "$0")/runner.sh"
 
 # The command line
 printf 'text\n' > input.txt
 echo 'tarn.line_count();' > macro.js
 touch macro.xyz
-expect 0 'set_line(line, text)' --help
+expect 0 'set_line(line, text)' --functions
+expect 0 '--in-place' --help
+[ "$(wc -l < out)" -le 50 ] && ! grep -q '.\{81\}' out || fail '--help does not fit a screen'
 expect 0 'RubyScript' --version
 expect 0 'VBScript' --version --description "$(dirname "$macrorun")/languages/vbs.qwsh"
 expect 2 'MACRO is required'
 expect 2 '--bogus' --bogus macro.js
+expect 2 'usage: macrorun' --bogus macro.js
+expect 2 'expected NAME=VALUE' --arg name macro.js
+expect 2 '--repeat' --repeat 0 macro.js
+expect 2 '--timeout' --timeout never macro.js
+expect 2 '--errors' --errors xml macro.js
+expect 2 'needs a FILE' --in-place macro.js
+expect 2 'standard input' --in-place macro.js -
+expect 2 '--output' -o out.txt --in-place macro.js input.txt
+expect 2 '--output' -o out.txt macro.js --each input.txt
+expect 2 'name all macros behind it' macro.js --check macro.js
+expect 2 '18 characters' --engine A.Name.Of.Nineteen. macro.js
 expect 2 'macro missing.js' missing.js
 expect 2 'missing.txt' macro.js missing.txt
 expect 2 'missing.dll' --module missing.dll macro.js
@@ -56,8 +36,12 @@ expect 2 'xyz.qwsh' macro.xyz
 expect_js 0 'text' 'tarn.message("done");'
 expect 0 'Debug: GetIDsOfNames call succeeded.' --trace macro.js
 expect_js 1 'Syntax error' 'x = = 1;'
-expect_js 1 'macro.js (2:' "$(printf 'tarn.write("x");\nnothing.here();')"
-expect_js 1 'unknown macro scripting function:  nothing' 'tarn.nothing();'
+expect_js 1 'macro.js:2:' "$(printf 'tarn.write("x");\nnothing.here();')"
+expect_js 1 'nothing is no macro function' 'tarn.nothing();'
+expect_js 0 '' 'try { tarn.nothing(); } catch (error) {}'
+expect 1 "Error creating 'No.Engine'" --engine No.Engine macro.js
+echo 'tarn.message("as JScript");' > macro.xyz
+expect 0 'as JScript' --engine JScript macro.xyz
 expect 4 'Tarn has detected' --module "$fake" macro.js
 
 # Wrong calls, which no script can catch
@@ -120,9 +104,12 @@ macrorun='Ordner ä 日本/macrorun.exe'
 expect 1 "Error creating 'RubyScript'" macro.rbs
 cp -r "$(dirname "$in_build_folder")/ruby" 'Ordner ä 日本/'
 expect 0 'found May' macro.rbs
+mv "$macrorun" 'Ordner ä 日本/other.exe'
+macrorun='Ordner ä 日本/other.exe'
+expect 0 'found May' macro.rbs
 macrorun=$in_build_folder
 
-# Nothing is left in the temporary folder, and a macro is stopped with Ctrl+C
+# Nothing is left in the temporary folder
 mkdir temporary
 temporary() {
   wine cmd /c "set TMP=Z:$(pwd | tr / '\\')\\temporary&& Z:$(echo "$macrorun" | tr / '\\') $1"
@@ -136,13 +123,4 @@ mkdir temporary/macrorun-999999-1
 temporary macro.js > /dev/null 2>&1
 [ -z "$(ls temporary)" ] || fail "the folder of a killed run is left"
 
-echo 'tarn.message("started"); while (true) tarn.line_count();' > macro.js
-wine "$macrorun" macro.js > out 2> err &
-i=0
-until grep -q started err || [ $i -eq 100 ]; do sleep 0.1; i=$((i + 1)); done
-kill -INT $!
-wait $!
-result=$?
-[ $result -eq 3 ] && [ ! -s out ] || fail "Ctrl+C: exit code $result, expected 3"
-
-[ $failures -eq 0 ]
+finish

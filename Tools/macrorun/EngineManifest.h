@@ -1,21 +1,6 @@
-// SPDX-License-Identifier: MIT
-// The Ruby engine that lies beside this program, for a machine on which none is registered.
+/* SPDX-License-Identifier: MIT
+   The number of the manifest resource that names this program as the Ruby engine's server; also read
+   by the resource compiler. 1 would be the program's own manifest. */
 #pragma once
 
-#include <windows.h>
-
-// The program's folder, seen from which `ruby\bin\rubyscript.manifest` describes the engine.
-class EngineManifest {
- public:
-  // From here to the destructor the calling thread finds the engine as if it were registered. Does
-  // nothing when one is, or when no manifest is there. Throws UsageError for a manifest that the
-  // system refuses.
-  EngineManifest();
-  ~EngineManifest();
-  EngineManifest(const EngineManifest&) = delete;
-  EngineManifest& operator=(const EngineManifest&) = delete;
-
- private:
-  HANDLE context = INVALID_HANDLE_VALUE;
-  ULONG_PTR cookie = 0;
-};
+#define kEngineManifest 20

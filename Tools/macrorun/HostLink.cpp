@@ -112,3 +112,14 @@ bool HostLinkSetText(HostLink* link, const char* text) {
 }
 
 HostStopCause HostLinkStopCause(HostLink* link) { return link->stopCause; }
+
+HostNesting HostLinkBeginNested(HostLink* link) {
+  const HostNesting nesting = {link->record.engine, link->stopCause};
+  link->stopCause = kNotStopped;
+  return nesting;
+}
+
+void HostLinkEndNested(HostLink* link, const HostNesting* nesting) {
+  link->record.engine = static_cast<xMacro*>(nesting->engine);
+  link->stopCause = nesting->stopCause;
+}

@@ -55,6 +55,15 @@ HostArgument HostLinkArgument(HostLink* link, uint32_t index);
 void HostLinkSetInteger(HostLink* link, int32_t value);
 bool HostLinkSetText(HostLink* link, const char* text);
 
-// Why the last run was stopped.
+// Whether the last run was stopped by the host, and why.
 HostStopCause HostLinkStopCause(HostLink* link);
+
+// Around a run that a call nests into the one in progress: the inner run leaves the record without
+// its engine. BeginNested answers what EndNested takes.
+struct HostNesting {
+  void* engine;
+  HostStopCause stopCause;
+};
+HostNesting HostLinkBeginNested(HostLink* link);
+void HostLinkEndNested(HostLink* link, const HostNesting* nesting);
 }

@@ -1,35 +1,85 @@
 // SPDX-License-Identifier: MIT
-// The macro functions that a macro calls on `tarn`: one table of names, parameters and help, from
-// which the lookup, the argument checks and the help text come.
+// The macro functions that a macro calls on `tarn`: one table of names, parameters, results and
+// help, from which the lookup, the argument checks and the documentation come. The functions
+// themselves stand by families in functions/.
 //
-// Numbers may arrive as an integer, as a real without fraction or as the text of a number (which is
-// how a variable passed by reference comes); texts may come from any kind of argument.
+// Lines and columns count from 1, columns in characters (Characters.h). Numbers may arrive as an
+// integer, as a real without fraction or as the text of a number (which is how a variable passed by
+// reference comes); texts may come from any kind of argument.
 //
 // A text that cannot pass between macro and host unchanged makes the call fail instead of changing
 // the document: the module cuts a text argument at 512 characters and a text result at 1023, and
 // widens results by the system's ANSI code page but narrows arguments by dropping high bytes, so
 // some bytes (0x80 to 0x9F in Western code pages) would come back as others unless the engine undoes
 // the widening. What cannot be seen from here is a character above U+00FF in an argument: the module
-// has already narrowed it.
+// has already narrowed it. These limits are for what passes; inside the editor texts have none.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <span>
 #include <stdexcept>
 #include <string>
 #include <string_view>
 #include <variant>
+#include <vector>
 
-#include "Document.h"
+#include "Editor.h"
+#include "EditorServices.h"
 #include "HostLink.h"
 
-// A call that breaks a function's rules; the document is unchanged. The text names the function.
+// A call that breaks a function's rules; the documents are unchanged. The text names the function.
 struct WrongCall : std::runtime_error {
-  using std::runtime_error::runtime_error;
+  WrongCall(std::string functionName, std::size_t argumentIndex, std::string expectation,
+            const std::string& text)
+      : std::runtime_error(text),
+        function(std::move(functionName)),
+        argument(argumentIndex),
+        expected(std::move(expectation)) {}
+
+  std::string function;
+  std::size_t argument;  // from 1; 0: not about one argument
+  std::string expected;
 };
 
 // An integer, or a text for functions that answer one.
 using MacroResult = std::variant<std::int32_t, std::string>;
+
+enum class ParameterKind {
+  kLine,       // an existing line
+  kLineOrEnd,  // an existing line, or the one after the last
+  kLastLine,   // an existing line, not before the one of the parameter before
+  kColumn,     // a column of the line of the parameter before, or the one behind its last
+  kCount,      // 0 or more
+  kDocument,   // the number of a document
+  kText,
+  kLineText,  // a text without line ends
+  kName,      // a text that is not empty
+  kWords,     // options: words with blanks between
+  kTexts,     // any number of texts; the last parameter
+};
+
+struct MacroParameter {
+  const char* name;
+  ParameterKind kind;
+  bool optional = false;  // all behind an optional one are optional too
+};
+
+enum class ResultKind { kNone, kNumber, kText };
+
+class MacroCall;
+
+struct MacroFunction {
+  const char* name;
+  std::vector<MacroParameter> parameters;
+  ResultKind result;
+  const char* help;  // one line
+  MacroResult (*run)(MacroCall& call);
+  const char* family = "";  // filled in by the table
+};
+
+// All functions, family by family. Function n has the number n + 1.
+std::span<const MacroFunction> MacroFunctions();
 
 // The number of a function, in any case (some script languages know none); kUnknownId if there is
 // none. Never 0, which engines call for an object's default value.
@@ -42,9 +92,11 @@ enum class TextPassage {
   kBytes,       // as the bytes that the host gave
 };
 
-// Carries out function `id`. Throws WrongCall. `message` writes to standard error.
-MacroResult CallMacroFunction(std::uint32_t id, Document& document,
+// Carries out function `id` as one step of the editor. Throws WrongCall.
+MacroResult CallMacroFunction(std::uint32_t id, Editor& editor, EditorServices& services,
                               std::span<const HostArgument> arguments, TextPassage passage);
 
-// One line for each function.
+// "(line, column[, count])"
+std::string ParameterList(const MacroFunction& function);
+// One line for each function, under its family.
 std::string MacroFunctionHelp();

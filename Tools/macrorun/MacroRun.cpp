@@ -1,79 +1,183 @@
 // SPDX-License-Identifier: MIT
 #include "MacroRun.h"
 
+#include <chrono>
 #include <cstdio>
+#include <map>
 #include <memory>
 #include <new>
 #include <string_view>
+#include <utility>
 #include <vector>
 
-#include "EngineManifest.h"
+#include "CallText.h"
+#include "Encoding.h"
 #include "HostLink.h"
 #include "MacroFunctions.h"
-#include "xLib/xTexts.h"
+#include "ModuleReports.h"
+#include "RunControl.h"
+#include "RunServices.h"
+
+namespace fs = std::filesystem;
 
 namespace {
 
-class MacroRun {
- public:
-  MacroRun(Document& text, TextPassage textPassage, bool traceLines)
-      : document(text), passage(textPassage), trace(traceLines) {
-    const HostCallbacks callbacks = {this, OnReport, OnTrace, OnFunctionId, OnCall};
-    link.reset(CreateHostLink(&callbacks));
-    if (!link) throw std::bad_alloc();
-  }
+using Clock = std::chrono::steady_clock;
 
-  ExitCode Run(ScriptModule& module, const std::filesystem::path& macro) {
-    const int result = module.Execute(macro, HostLinkInterface(link.get()));
-    if (faulted) return kFault;
-    if (HostLinkStopCause(link.get()) == kStoppedByUser) return kStopped;
-    // An engine may count a macro as run although it has reported an error in it.
-    return result == 1 && !scriptError ? kSuccess : kMacroFailed;
-  }
+class MacroRun final : public NestedRunner {
+ public:
+  MacroRun(RunSurroundings& runSurroundings, Editor& runEditor);
+  ExitCode Run();
 
  private:
   struct DestroyLink {
     void operator()(HostLink* object) const { DestroyHostLink(object); }
   };
+  using Arguments = std::vector<HostArgument>;
 
   // The callbacks. None may let an exception out.
   static MacroRun& From(void* context) { return *static_cast<MacroRun*>(context); }
-  static void OnReport(void* context, const char* text) { From(context).Report(text); }
-  static void OnTrace(void* context, const char* text) {
-    if (From(context).trace) std::fputs(text, stderr);
+  static void OnReport(void* context, const char* text) { From(context).reports.Take(text); }
+  static void OnTrace(void* context, const char* text) { From(context).TraceLine(text); }
+  static std::uint32_t OnFunctionId(void* context, const char* name) {
+    return From(context).FunctionId(name);
   }
-  static std::uint32_t OnFunctionId(void*, const char* name) { return MacroFunctionId(name); }
   static bool OnCall(void* context, std::uint32_t id) { return From(context).Call(id); }
 
-  void Report(std::string_view text) noexcept;
+  void TraceLine(std::string_view text) noexcept;
+  std::uint32_t FunctionId(const char* name) noexcept;
   bool Call(std::uint32_t id) noexcept;
+  MacroResult Perform(std::uint32_t id, const std::string& name, const Arguments& arguments);
+  bool WrongCallMade(const std::string& name, const WrongCall& wrong);
   void SetResult(const MacroResult& result);
+  bool Execute(const fs::path& macro);
+  bool RunNested(const fs::path& macro) override;
+  ExitCode Outcome(bool succeeded);
 
-  Document& document;
+  RunSurroundings& surroundings;
+  Editor& editor;
   const TextPassage passage;
-  const bool trace;
-  bool scriptError = false;
-  bool faulted = false;
+  std::map<std::uint32_t, std::string> names;
+  ModuleReports reports;
+  bool leftByJump = false;  // an engine that must not be touched any more
   std::unique_ptr<HostLink, DestroyLink> link;
+  std::unique_ptr<RunControl> control;
+  RunServices services;
 };
 
-// The beginnings of some reports tell more than the result of `execute` does.
-void MacroRun::Report(std::string_view text) noexcept {
-  if (text.starts_with(kScriptErrorReport)) scriptError = true;
-  if (text.starts_with(kFaultReport)) faulted = true;
-  std::fwrite(text.data(), 1, text.size(), stderr);
-  if (!text.ends_with('\n')) std::fputc('\n', stderr);
+MacroRun::MacroRun(RunSurroundings& runSurroundings, Editor& runEditor)
+    : surroundings(runSurroundings),
+      editor(runEditor),
+      passage(runSurroundings.module.RunsRuby() ? TextPassage::kBytes : TextPassage::kCharacters),
+      reports(runSurroundings.reporter, passage == TextPassage::kCharacters),
+      services(runSurroundings.options, runSurroundings.reporter, *this) {
+  const HostCallbacks callbacks = {this, OnReport, OnTrace, OnFunctionId, OnCall};
+  link.reset(CreateHostLink(&callbacks));
+  if (!link) throw std::bad_alloc();
+}
+
+ExitCode MacroRun::Run() {
+  control = std::make_unique<RunControl>(surroundings.module, surroundings.engines,
+                                         surroundings.reporter, surroundings.options.timeout);
+  services.SetControl(control.get());
+  const Clock::time_point begin = Clock::now();
+  const bool succeeded = Execute(surroundings.options.macro);
+  surroundings.profile.AddRun(Clock::now() - begin);
+  const ExitCode outcome = Outcome(succeeded);
+  if (leftByJump || outcome == kFault) surroundings.engines.Abandon();
+  return outcome;
+}
+
+ExitCode MacroRun::Outcome(bool succeeded) {
+  const RunControl::Cause cause = control->StopCause();
+  control.reset();
+  if (reports.Faulted()) return kFault;
+  // A request that came too late for a macro that has ended does not count.
+  if (cause != RunControl::Cause::kNone && !succeeded) {
+    surroundings.reporter.Note(cause == RunControl::Cause::kUser ? "stopped" : "timed out");
+    return kStopped;
+  }
+  return succeeded ? kSuccess : kMacroFailed;
+}
+
+// One `execute`, outermost or nested: whether the macro has succeeded.
+bool MacroRun::Execute(const fs::path& macro) {
+  const std::string name = ScriptModule::NameOf(macro);
+  const ModuleReports::Scope scope(reports, {name, ToUtf8(macro)});
+  const EditorStep step(editor);
+  services.EnterMacro(macro);
+  const int result = surroundings.module.Execute(name, HostLinkInterface(link.get()));
+  services.LeaveMacro();
+  leftByJump |= HostLinkStopCause(link.get()) != kNotStopped;
+  const bool stopped = control->StopCause() != RunControl::Cause::kNone;
+  reports.EndRun(stopped);
+  // An engine may count a macro as run although it has reported an error in it.
+  return result == 1 && !reports.ErrorSeen();
+}
+
+bool MacroRun::RunNested(const fs::path& macro) {
+  const HostNesting nesting = HostLinkBeginNested(link.get());
+  const bool succeeded = Execute(macro);
+  HostLinkEndNested(link.get(), &nesting);
+  return succeeded;
+}
+
+void MacroRun::TraceLine(std::string_view text) noexcept {
+  if (!surroundings.options.trace) return;
+  surroundings.reporter.Trace(text.substr(0, text.find_last_not_of("\r\n") + 1));
+}
+
+std::uint32_t MacroRun::FunctionId(const char* name) noexcept {
+  const std::uint32_t id = MacroFunctionId(name);
+  if (id != kUnknownId) names.try_emplace(id, name);
+  return id;
 }
 
 bool MacroRun::Call(std::uint32_t id) noexcept try {
-  std::vector<HostArgument> arguments;
-  for (std::uint32_t i = 0; i < HostLinkArgumentCount(link.get()); ++i)
-    arguments.push_back(HostLinkArgument(link.get(), i));
-  SetResult(CallMacroFunction(id, document, arguments, passage));
-  return true;
+  const std::string name = names[id];
+  const ArgumentCopies arguments(link.get());
+  try {
+    SetResult(Perform(id, name, arguments.List()));
+    return !reports.Faulted();
+  } catch (const WrongCall& wrong) {
+    return WrongCallMade(name, wrong);
+  }
 } catch (const std::exception& error) {
-  std::fprintf(stderr, "macrorun: %s\n", error.what());
+  ErrorReport report;
+  report.kind = "fault";
+  report.message = error.what();
+  reports.Add(std::move(report));
   return false;
+}
+
+MacroResult MacroRun::Perform(std::uint32_t id, const std::string& name,
+                              const Arguments& arguments) {
+  const bool trace = surroundings.options.trace;
+  const std::string call = trace ? CallText(name, arguments) : "";
+  const Clock::time_point begin = Clock::now();
+  try {
+    MacroResult result = CallMacroFunction(id, editor, services, arguments, passage);
+    surroundings.profile.AddCall(name, Clock::now() - begin);
+    if (trace) surroundings.reporter.Trace(call + " -> " + ResultText(result));
+    return result;
+  } catch (const WrongCall&) {
+    surroundings.profile.AddCall(name, Clock::now() - begin);
+    if (trace) surroundings.reporter.Trace(call + " -> wrong call");
+    throw;
+  }
+}
+
+// Whether the macro goes on.
+bool MacroRun::WrongCallMade(const std::string& name, const WrongCall& wrong) {
+  ErrorReport report;
+  report.kind = "call";
+  report.function = wrong.function.empty() ? name : wrong.function;
+  report.argument = static_cast<int>(wrong.argument);
+  report.expected = wrong.expected;
+  report.message = wrong.what();
+  report.line = surroundings.engines.CallingLine();
+  reports.Add(std::move(report));
+  return surroundings.options.keepGoing;
 }
 
 void MacroRun::SetResult(const MacroResult& result) {
@@ -86,10 +190,6 @@ void MacroRun::SetResult(const MacroResult& result) {
 
 }  // namespace
 
-ExitCode RunMacro(ScriptModule& module, const std::filesystem::path& macro, Document& document,
-                  bool trace) {
-  if (!module.RunsRuby())
-    return MacroRun(document, TextPassage::kCharacters, trace).Run(module, macro);
-  const EngineManifest manifest;
-  return MacroRun(document, TextPassage::kBytes, trace).Run(module, macro);
+ExitCode RunMacro(RunSurroundings& surroundings, Editor& editor) {
+  return MacroRun(surroundings, editor).Run();
 }

@@ -1,14 +1,29 @@
 // SPDX-License-Identifier: MIT
-// One run of a macro over a document: this program's side of the host macro interface.
+// One run of a macro over documents: this program's side of the host macro interface.
+//
+// Ownership: everything in the surroundings is the caller's. Errors: those of the macro go to the
+// reporter and into the exit code; UsageError for a macro that the module cannot name.
+// Threading: the thread that loaded the module.
 #pragma once
 
 #include <filesystem>
 
-#include "Document.h"
+#include "CallProfile.h"
+#include "Editor.h"
+#include "EngineWatch.h"
 #include "ExitCode.h"
+#include "Options.h"
+#include "Reporter.h"
 #include "ScriptModule.h"
 
-// Runs `macro`, which changes `document`. Messages go to standard error, with `trace` the module's
-// debug lines too. Throws UsageError.
-ExitCode RunMacro(ScriptModule& module, const std::filesystem::path& macro, Document& document,
-                  bool trace);
+// What stays the same from run to run.
+struct RunSurroundings {
+  const Options& options;
+  ScriptModule& module;
+  EngineWatch& engines;
+  Reporter& reporter;
+  CallProfile& profile;
+};
+
+// Runs the options' macro, which changes the editor's documents, as one step.
+ExitCode RunMacro(RunSurroundings& surroundings, Editor& editor);

@@ -6,31 +6,46 @@
 #include <shellapi.h>
 
 #include <CLI/CLI.hpp>
-#include <string>
-#include <vector>
+#include <cstdio>
+#include <memory>
 
 #include "Encoding.h"
 #include "ExitCode.h"
-#include "MacroFunctions.h"
 
 namespace {
 
-std::string Footer() {
-  return "Macros call these functions on the object tarn. Lines count from 1; goto_line and\n"
-         "insert_line also take the number after the last line.\n" +
-         MacroFunctionHelp() +
-         "A line feed in the text of write begins a new line. Texts: at most 511 characters\n"
-         "in, 1023 out. Ruby's pass as bytes; of other languages, characters above U+00FF do\n"
-         "not pass. A real arrives with six decimals: convert it first. No dialogs: use\n"
-         "message. What a function refuses ends the macro.\n"
-         "A macro's source is read byte by byte, so UTF-8 in its texts is written as it\n"
-         "stands.\n"
-         "\n"
-         "Exit codes: 0 success, 1 the macro failed, 2 wrong usage or\n"
-         "a file that cannot be read or written, 3 stopped by Ctrl+C\n"
-         "(a macro that calls nothing: by a second one), 4 fault.\n"
-         "Standard output is the document, and only after success.";
-}
+constexpr char kUsage[] =
+    "usage: macrorun [OPTION...] MACRO [FILE|-]\n"
+    "       macrorun [OPTION...] MACRO --each FILE...\n"
+    "       macrorun --check MACRO...\n";
+
+constexpr char kFooter[] =
+    "Exit codes: 0 success, 1 the macro failed, 2 wrong usage or a file that cannot\n"
+    "be read or written, 3 stopped or timed out, 4 fault. The text is written only\n"
+    "after success. More in Docs/macrorun.md.";
+
+// Positionals stand in the usage.
+class HelpFormatter : public CLI::Formatter {
+ public:
+  std::string make_usage(const CLI::App*, std::string) const override {
+    return kUsage + std::string("\n");
+  }
+  std::string make_positionals(const CLI::App*) const override { return {}; }
+  std::string make_option_opts(const CLI::Option* option) const override {
+    return option->get_type_size() == 0 ? "" : " " + option->get_type_name();
+  }
+  std::string make_group(std::string group, bool positional,
+                         std::vector<const CLI::Option*> options) const override {
+    std::string text = CLI::Formatter::make_group(group, positional, options);
+    return text.substr(text.front() == '\n' ? 1 : 0);
+  }
+};
+
+// What the library hands out as text, before it is what the program wants.
+struct Texts {
+  std::string macro, input, output, description, module, log, errors = "text";
+  std::vector<std::string> each, check, arguments;
+};
 
 // In the order that CLI::App::parse wants: the last argument first, without the program.
 std::vector<std::string> ReversedArguments() {
@@ -43,37 +58,144 @@ std::vector<std::string> ReversedArguments() {
   return arguments;
 }
 
+std::vector<std::filesystem::path> Paths(const std::vector<std::string>& texts) {
+  std::vector<std::filesystem::path> paths;
+  for (const std::string& text : texts) paths.push_back(PathFromUtf8(text));
+  return paths;
+}
+
+void AddTextOptions(CLI::App& app, Options& options, Texts& texts) {
+  app.add_option("MACRO", texts.macro);
+  CLI::Option* const file = app.add_option("FILE", texts.input);
+  CLI::Option* const each = app.add_option("--each", texts.each, "Work on each of these files")
+                                ->type_name("FILE...")
+                                ->expected(1, 1 << 20)
+                                ->excludes(file)
+                                ->group("Text");
+  CLI::Option* const output = app.add_option("-o,--output", texts.output, "Write the text to FILE")
+                                  ->type_name("FILE")
+                                  ->excludes(each)
+                                  ->group("Text");
+  app.add_flag("-i,--in-place", options.inPlace, "Replace the file, in one step at the end")
+      ->excludes(output)
+      ->group("Text");
+}
+
+void AddMacroOptions(CLI::App& app, Options& options, Texts& texts) {
+  const auto add = [&app](const char* name, auto& value, const char* type, const char* help) {
+    return app.add_option(name, value, help)->type_name(type)->group("Macro");
+  };
+  add("--arg", texts.arguments, "NAME=VALUE", "Argument for the macro; may be repeated")
+      ->allow_extra_args(false);
+  add("--answer", options.answers, "TEXT", "Answer to its next prompt; may be repeated")
+      ->allow_extra_args(false);
+  add("--repeat", options.repeat, "N", "Run it N times over the same text")
+      ->check(CLI::Range(1u, 1000000000u).description(""));
+  add("--timeout", options.timeout, "SECONDS", "Stop it; prompts do not count")
+      ->check(CLI::Range(0.001, 1e9).description(""));
+  app.add_flag("--keep-going", options.keepGoing, "Do not stop it for a wrong call")
+      ->group("Macro");
+  add("--engine", options.engine, "PROGID", "Script engine (default: by the extension)");
+  add("--description", texts.description, "FILE", "Language description with its engine")
+      ->excludes("--engine");
+  add("--module", texts.module, "FILE", "Module (default: scriptruby.dll beside macrorun)");
+}
+
+void AddReportOptions(CLI::App& app, Options& options, Texts& texts) {
+  const auto flag = [&app](const char* name, bool& value, const char* help) {
+    app.add_flag(name, value, help)->group("Reports, on standard error");
+  };
+  app.add_option("--errors", texts.errors, "As text, or as JSON objects, one a line")
+      ->type_name("text|json")
+      ->check(CLI::IsMember({"text", "json"}).description(""))
+      ->group("Reports, on standard error");
+  flag("--trace", options.trace, "Show every call, and the module's debug lines");
+  flag("--profile", options.profile, "Show calls and time of each macro function");
+  app.add_option("--log", texts.log, "File for the module's failed assertions")
+      ->type_name("FILE")
+      ->group("Reports, on standard error");
+}
+
+void AddOtherModes(CLI::App& app, Options& options, Texts& texts) {
+  app.set_help_flag("-h,--help", "Show this help")->group("Instead of running");
+  app.add_option("--check", texts.check, "Report syntax errors of these macros")
+      ->type_name("MACRO...")
+      ->expected(1, 1 << 20)
+      ->group("Instead of running");
+  app.add_flag("--functions", options.functions, "List the macro functions")
+      ->group("Instead of running");
+  app.add_flag("--version", options.version, "Show the versions of macrorun and of the module")
+      ->group("Instead of running");
+}
+
+void ReadArguments(const std::vector<std::string>& texts, Options& options) {
+  for (const std::string& text : texts) {
+    const std::size_t equals = text.find('=');
+    if (equals == text.npos || equals == 0)
+      throw CLI::ValidationError("--arg " + text, "expected NAME=VALUE");
+    options.arguments[text.substr(0, equals)] = text.substr(equals + 1);
+  }
+}
+
+void Convert(const Texts& texts, Options& options) {
+  options.macro = PathFromUtf8(texts.macro);
+  options.each = !texts.each.empty();
+  options.inputs = Paths(texts.each);
+  if (!texts.input.empty()) options.inputs = {PathFromUtf8(texts.input)};
+  options.output = PathFromUtf8(texts.output);
+  options.description = PathFromUtf8(texts.description);
+  options.module =
+      texts.module.empty() ? ProgramFolder() / "scriptruby.dll" : PathFromUtf8(texts.module);
+  options.log = PathFromUtf8(texts.log);
+  options.check = Paths(texts.check);
+  options.jsonErrors = texts.errors == "json";
+  ReadArguments(texts.arguments, options);
+}
+
+// What the library's own rules do not say.
+void CheckCombination(const Options& options) {
+  const bool runs = options.check.empty() && !options.functions && !options.version;
+  if (runs && options.macro.empty()) throw CLI::RequiredError("MACRO");
+  if (!options.check.empty() && !options.macro.empty())
+    throw CLI::ValidationError("--check", "name all macros behind it");
+  if (!options.inPlace) return;
+  if (options.inputs.empty()) throw CLI::ValidationError("--in-place", "needs a FILE to replace");
+  for (const std::filesystem::path& input : options.inputs)
+    if (input == "-") throw CLI::ValidationError("--in-place", "cannot replace standard input");
+}
+
 }  // namespace
 
-std::filesystem::path ProgramFolder() {
+std::filesystem::path ProgramFolder() { return ProgramFile().parent_path(); }
+
+std::filesystem::path ProgramFile() {
   std::wstring file(32768, L'\0');
   const DWORD length = static_cast<DWORD>(file.size());
   file.resize(GetModuleFileNameW(nullptr, file.data(), length));
-  return std::filesystem::path(file).parent_path();
+  return file;
 }
 
 std::optional<int> ParseOptions(Options& options) {
-  std::string macro, input, description;
-  std::string module = ToUtf8(ProgramFolder() / "scriptruby.dll");
+  Texts texts;
   CLI::App app("Runs a macro over a text and prints the text.", "macrorun");
   app.allow_windows_style_options(false);  // "/x/y" is a path
-  app.footer(Footer());
-  app.add_option("MACRO", macro, "Macro file");
-  app.add_option("FILE", input, "Text to start with; - is standard input, none an empty text");
-  app.add_option("--module", module, "Scripting module (default: scriptruby.dll beside macrorun)");
-  app.add_option("--description", description,
-                 "Language description (default: languages\\EXTENSION.qwsh; none for .rbs)");
-  app.add_flag("--trace", options.trace, "Show the module's debug lines");
-  app.add_flag("--version", options.version, "Show the versions of macrorun and of the module");
+  app.formatter(std::make_shared<HelpFormatter>());
+  app.get_formatter()->column_width(29);
+  app.footer(kFooter);
+  AddTextOptions(app, options, texts);
+  AddMacroOptions(app, options, texts);
+  AddReportOptions(app, options, texts);
+  AddOtherModes(app, options, texts);
   try {
     app.parse(ReversedArguments());
-    if (macro.empty() && !options.version) throw CLI::RequiredError("MACRO");
+    Convert(texts, options);
+    CheckCombination(options);
+  } catch (const CLI::Success& request) {
+    return app.exit(request);
   } catch (const CLI::ParseError& error) {
-    return app.exit(error) == 0 ? kSuccess : kWrongUsage;
+    std::fprintf(stderr, "macrorun: %s\n%smacrorun --help lists the options.\n", error.what(),
+                 kUsage);
+    return kWrongUsage;
   }
-  options.macro = PathFromUtf8(macro);
-  options.input = PathFromUtf8(input);
-  options.module = PathFromUtf8(module);
-  options.description = PathFromUtf8(description);
   return std::nullopt;
 }

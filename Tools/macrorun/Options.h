@@ -1,20 +1,46 @@
 // SPDX-License-Identifier: MIT
 // The command line.
+//
+// Errors: ParseOptions tells the user what was wrong and answers an exit code.
+// Units: seconds. Threading: the main thread.
 #pragma once
 
 #include <filesystem>
+#include <map>
 #include <optional>
+#include <string>
+#include <vector>
 
 struct Options {
   std::filesystem::path macro;
-  std::filesystem::path input;  // empty: none; "-": standard input
-  std::filesystem::path module;
+  std::vector<std::filesystem::path> inputs;  // none: an empty text; "-": standard input
+  bool each = false;                          // the inputs come from --each
+
+  std::filesystem::path output;  // empty: standard output
+  bool inPlace = false;
+
+  std::map<std::string, std::string> arguments;
+  std::vector<std::string> answers;
+  unsigned repeat = 1;
+  double timeout = 0;  // seconds; 0: none
+  bool keepGoing = false;
+
+  std::string engine;                 // ProgID; empty: not given
   std::filesystem::path description;  // empty: not given
+  std::filesystem::path module;
+
+  bool jsonErrors = false;
   bool trace = false;
+  bool profile = false;
+  std::filesystem::path log;  // empty: none
+
+  std::vector<std::filesystem::path> check;  // the macros to check; nothing is run
+  bool functions = false;
   bool version = false;
 };
 
-// The folder of this program.
+// The file of this program, and its folder.
+std::filesystem::path ProgramFile();
 std::filesystem::path ProgramFolder();
 
 // Reads the process's command line. An exit code when there is nothing to run: help was asked for,

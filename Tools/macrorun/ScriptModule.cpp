@@ -3,8 +3,7 @@
 
 #include <cstdio>
 #include <cwchar>
-#include <mutex>
-#include <utility>
+#include <fstream>
 
 #include "Encoding.h"
 #include "ExitCode.h"
@@ -29,31 +28,16 @@ Function As(FARPROC address) {
   return reinterpret_cast<Function>(reinterpret_cast<void*>(address));
 }
 
-// For the console's own thread, on which Ctrl+C arrives; null outside a run. The lock is held while
-// it is called, so that the host and the module outlive the call.
-std::mutex killLock;
-KillFunction killRun = nullptr;
-
-void SetKill(KillFunction kill) {
-  const std::lock_guard lock(killLock);
-  killRun = kill;
-}
-
-BOOL WINAPI OnConsoleEvent(DWORD event) {
-  if (event != CTRL_C_EVENT && event != CTRL_BREAK_EVENT) return FALSE;
-  const std::lock_guard lock(killLock);
-  const KillFunction kill = std::exchange(killRun, nullptr);
-  if (!kill || !kill(1)) TerminateProcess(GetCurrentProcess(), kStopped);
-  std::fputs("macrorun: stopping at the macro's next call; Ctrl+C again ends it at once\n", stderr);
-  return TRUE;
-}
-
 void Copy(const fs::path& from, const fs::path& to) {
   std::error_code error;
   fs::copy_file(from, to, error);
   if (error) throw UsageError("cannot copy " + ToUtf8(from) + ": " + error.message());
   // A copy that is read-only like its model could not be removed.
   SetFileAttributesW(to.c_str(), FILE_ATTRIBUTE_NORMAL);
+}
+
+void WriteDescription(const fs::path& file, const std::string& engine) {
+  std::ofstream(file, std::ios::binary) << "[Options]\r\nLanguage=" << engine << "\r\n";
 }
 
 bool ProcessExists(DWORD id) {
@@ -123,12 +107,11 @@ PrivateFolder::~PrivateFolder() {
                  ToUtf8(path).c_str(), error.message().c_str());
 }
 
-ScriptModule::ScriptModule(const fs::path& file, const fs::path& description) {
+ScriptModule::ScriptModule(const fs::path& file, const Language* language) {
   std::error_code error;
   if (!fs::is_regular_file(file, error))
     throw UsageError("no module at " + ToUtf8(file) + " (--module)");
-  const fs::path loaded =
-      description.empty() ? fs::absolute(file) : CopyPrivately(file, description);
+  const fs::path loaded = language ? CopyPrivately(file, *language) : fs::absolute(file);
   library = LoadLibraryExW(loaded.c_str(), nullptr, LOAD_WITH_ALTERED_SEARCH_PATH);
   if (!library)
     throw UsageError("cannot load the module " + ToUtf8(file) + ": " +
@@ -140,10 +123,14 @@ ScriptModule::ScriptModule(const fs::path& file, const fs::path& description) {
   }
 }
 
-fs::path ScriptModule::CopyPrivately(const fs::path& file, const fs::path& description) {
+fs::path ScriptModule::CopyPrivately(const fs::path& file, const Language& language) {
   folder.emplace();
   Copy(file, folder->Path() / kModuleName);
-  Copy(description, folder->Path() / kDescriptionFileName);
+  const fs::path description = folder->Path() / kDescriptionFileName;
+  if (language.description.empty())
+    WriteDescription(description, language.engine);
+  else
+    Copy(language.description, description);
   // The module asks for its own folder in the ANSI code page.
   return RequireAnsiNamed(folder->Path()) / kModuleName;
 }
@@ -154,15 +141,15 @@ ScriptModule::~ScriptModule() { FreeLibrary(library); }
 
 FARPROC ScriptModule::Export(const char* name) const { return GetProcAddress(library, name); }
 
-int ScriptModule::Execute(const fs::path& macro, void* host) {
-  const std::string file = ToAnsi(RequireAnsiNamed(fs::absolute(macro)));
-  SetKill(As<KillFunction>(Export("kill")));
-  SetConsoleCtrlHandler(OnConsoleEvent, TRUE);
-  const int result = As<ExecuteFunction>(Export("execute"))(file.c_str(), host);
-  SetConsoleCtrlHandler(OnConsoleEvent, FALSE);
-  SetKill(nullptr);
-  return result;
+std::string ScriptModule::NameOf(const fs::path& macro) {
+  return ToAnsi(RequireAnsiNamed(fs::absolute(macro)));
 }
+
+int ScriptModule::Execute(const std::string& macro, void* host) {
+  return As<ExecuteFunction>(Export("execute"))(macro.c_str(), host);
+}
+
+bool ScriptModule::Kill() { return As<KillFunction>(Export("kill"))(1); }
 
 std::string ScriptModule::Description() {
   ScriptInfoRecord record{};
@@ -172,5 +159,8 @@ std::string ScriptModule::Description() {
   return record.description;
 }
 
-// The module's name for a language begins with the engine's.
-bool ScriptModule::RunsRuby() { return Description().starts_with("RubyScript "); }
+// The module's name for a language begins with the engine's, which has two.
+bool ScriptModule::RunsRuby() {
+  const std::string description = Description();
+  return description.starts_with("RubyScript ") || description.starts_with("Tarn.RubyScript ");
+}

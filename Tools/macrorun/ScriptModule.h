@@ -1,11 +1,12 @@
 // SPDX-License-Identifier: MIT
 // The loaded scripting module.
 //
-// The module reads its language description from its own folder. To give it another one, its file
-// and the description are copied into a private temporary folder and loaded from there; the folder
-// goes when the object does. A process that is killed leaves its folder to the next run.
+// The module reads its language description from its own folder, or else from the user's. To give it
+// another one, its file and the description are copied into a private temporary folder and loaded
+// from there; the folder goes when the object does. A process that is killed leaves its folder to the
+// next run.
 //
-// Threading: one thread; Ctrl+C arrives on a thread of the console's, which calls only `kill`.
+// Errors: UsageError. Threading: one thread, but Kill may come from any.
 #pragma once
 
 #include <windows.h>
@@ -13,6 +14,8 @@
 #include <filesystem>
 #include <optional>
 #include <string>
+
+#include "Language.h"
 
 // A folder under the user's temporary folder, removed with the two files that it may hold.
 class PrivateFolder {
@@ -30,24 +33,28 @@ class PrivateFolder {
 
 class ScriptModule {
  public:
-  // Loads `file`, with `description` unless that is empty. Throws UsageError.
-  ScriptModule(const std::filesystem::path& file, const std::filesystem::path& description);
+  // Loads `file` for the language; null: with the description that it finds.
+  ScriptModule(const std::filesystem::path& file, const Language* language);
   ~ScriptModule();
   ScriptModule(const ScriptModule&) = delete;
   ScriptModule& operator=(const ScriptModule&) = delete;
 
-  // Runs a macro with `host`, an object of the host macro interface, and returns what `execute`
-  // does. Meanwhile the first Ctrl+C asks the host to stop the macro; a second ends the program.
-  // Throws UsageError when the system's code page cannot name the file.
-  int Execute(const std::filesystem::path& macro, void* host);
+  // The macro's name as `execute` and the module's reports have it. Throws UsageError when the
+  // system's code page has no name for it.
+  static std::string NameOf(const std::filesystem::path& macro);
+
+  // Runs a macro, by that name, with `host`, an object of the host macro interface; answers what
+  // `execute` does.
+  int Execute(const std::string& macro, void* host);
+  // Asks the host of the run to stop it; false outside a run.
+  bool Kill();
 
   // The name of the module's language; empty when the module refuses to tell.
   std::string Description();
   bool RunsRuby();
 
  private:
-  std::filesystem::path CopyPrivately(const std::filesystem::path& file,
-                                      const std::filesystem::path& description);
+  std::filesystem::path CopyPrivately(const std::filesystem::path& file, const Language& language);
   FARPROC Export(const char* name) const;
 
   std::optional<PrivateFolder> folder;  // outlives the library

@@ -1,118 +1,83 @@
 // SPDX-License-Identifier: MIT
-// macrorun: runs one macro over a text outside the editor. It hosts the scripting module as the
-// editor does and offers the macro a small document.
+// macrorun: runs macros over texts outside the editor. It hosts the scripting module as the editor
+// does and offers the macro documents.
 //
-// Reader's path: main -> MacroRun (the host) -> HostLink (its Microsoft-ABI side) -> ScriptModule
-// (the exports) -> MacroFunctions (what a macro can call) -> Document.
-#include <fcntl.h>
-#include <io.h>
+// Reader's path: main -> Batch (the texts) -> MacroRun (the host) -> HostLink (its Microsoft-ABI
+// side) -> ScriptModule (the exports) -> MacroFunctions (what a macro can call) -> Document.
 #include <windows.h>
 
-#include <cerrno>
 #include <cstdio>
-#include <cstring>
 #include <exception>
 #include <filesystem>
-#include <memory>
 #include <optional>
 #include <string>
 
-#include "Document.h"
-#include "Encoding.h"
+#include "Batch.h"
+#include "Console.h"
 #include "ExitCode.h"
-#include "MacroRun.h"
+#include "Language.h"
+#include "MacroFunctions.h"
 #include "Options.h"
+#include "Reporter.h"
+#include "RunControl.h"
 #include "ScriptModule.h"
-
-namespace fs = std::filesystem;
+#include "SyntaxCheck.h"
 
 namespace {
 
-using File = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
-
-File Open(const fs::path& path, const char* what) {
-  File file(_wfopen(path.c_str(), L"rb"), std::fclose);
-  if (!file) {
-    const std::string reason = std::strerror(errno);
-    throw UsageError(std::string("cannot read the ") + what + " " + ToUtf8(path) + ": " + reason);
-  }
-  return file;
-}
-
-std::string ReadAll(std::FILE* file, const std::string& name) {
-  std::string bytes;
-  char block[16384];
-  while (const std::size_t count = std::fread(block, 1, sizeof block, file))
-    bytes.append(block, count);
-  if (std::ferror(file)) throw UsageError("cannot read " + name);
-  return bytes;
-}
-
-std::string ReadInput(const fs::path& path) {
-  if (path.empty()) return {};
-  if (path == "-") {
-    _setmode(_fileno(stdin), _O_BINARY);
-    return ReadAll(stdin, "standard input");
-  }
-  return ReadAll(Open(path, "file").get(), ToUtf8(path));
-}
-
-void WriteOutput(const std::string& bytes) {
-  _setmode(_fileno(stdout), _O_BINARY);
-  if (std::fwrite(bytes.data(), 1, bytes.size(), stdout) != bytes.size() || std::fflush(stdout))
-    throw UsageError("cannot write to standard output");
-}
-
-// The description file to give to the module; empty for none: a Ruby macro needs none, and without
-// a macro there is only the module's own.
-fs::path ChooseDescription(const Options& options) {
-  if (!options.description.empty()) {
-    Open(options.description, "language description (--description)");
-    return options.description;
-  }
-  const std::wstring extension = options.macro.extension().wstring();
-  if (options.macro.empty() || _wcsicmp(extension.c_str(), L".rbs") == 0) return {};
-  const std::wstring language = extension.empty() ? extension : extension.substr(1);
-  const fs::path file = ProgramFolder() / "languages" / (language + L".qwsh");
-  std::error_code error;
-  if (!language.empty() && fs::is_regular_file(file, error)) return file;
-  throw UsageError("no language description for " + ToUtf8(options.macro) + " (" + ToUtf8(file) +
-                   "); name one with --description");
-}
-
-void PrintVersions(const Options& options) {
-  ScriptModule module(options.module, ChooseDescription(options));
+// Without a macro, an engine or a description there is only what the module finds by itself.
+ExitCode PrintVersions(const Options& options) {
+  std::optional<Language> language;
+  if (!options.macro.empty() || !options.engine.empty() || !options.description.empty())
+    language = ChooseLanguage(options, options.macro);
+  ScriptModule module(options.module, language ? &*language : nullptr);
   std::printf("macrorun %s\n%s\n", MACRORUN_VERSION, module.Description().c_str());
+  return kSuccess;
 }
 
-int Run(const Options& options) {
-  if (options.version) {
-    PrintVersions(options);
-    return kSuccess;
-  }
-  Open(options.macro, "macro");
-  const fs::path description = ChooseDescription(options);
-  Document document(ReadInput(options.input));
-  ScriptModule module(options.module, description);
-  const ExitCode result = RunMacro(module, options.macro, document, options.trace);
-  if (result == kSuccess) WriteOutput(document.Bytes());
-  return result;
+ExitCode PrintFunctions() {
+  std::fputs(MacroFunctionHelp().c_str(), stdout);
+  return kSuccess;
+}
+
+// The module reads it when it is loaded.
+void SetLog(const std::filesystem::path& file) {
+  if (file.empty()) return;
+  const std::wstring path = std::filesystem::absolute(file).wstring();
+  _wputenv_s(L"SCRIPTRUBY_LOG", path.c_str());
+}
+
+ExitCode Perform(const Options& options, Reporter& reporter) {
+  SetLog(options.log);
+  if (options.functions) return PrintFunctions();
+  if (options.version) return PrintVersions(options);
+  RunControl::CatchInterrupts();
+  if (!options.check.empty()) return CheckMacros(options, reporter);
+  return RunBatch(options, reporter);
+}
+
+ExitCode Fail(Reporter& reporter, const char* kind, const char* text, ExitCode code) {
+  ErrorReport report;
+  report.kind = kind;
+  report.message = text;
+  reporter.Error(std::move(report));
+  return code;
 }
 
 }  // namespace
 
 int main() {
+  PrepareStandardError();
+  // A file that is no library is an error message, not a system dialog.
+  SetErrorMode(SEM_FAILCRITICALERRORS | SEM_NOOPENFILEERRORBOX);
+  Options options;
+  if (const std::optional<int> finished = ParseOptions(options)) return *finished;
+  Reporter reporter(options.jsonErrors ? Reporter::Form::kJson : Reporter::Form::kText);
   try {
-    // A file that is no library is an error message, not a system dialog.
-    SetErrorMode(SEM_FAILCRITICALERRORS | SEM_NOOPENFILEERRORBOX);
-    Options options;
-    if (const std::optional<int> finished = ParseOptions(options)) return *finished;
-    return Run(options);
+    return Perform(options, reporter);
   } catch (const UsageError& error) {
-    std::fprintf(stderr, "macrorun: %s\n", error.what());
-    return kWrongUsage;
+    return Fail(reporter, "usage", error.what(), kWrongUsage);
   } catch (const std::exception& error) {
-    std::fprintf(stderr, "macrorun: %s\n", error.what());
-    return kFault;
+    return Fail(reporter, "fault", error.what(), kFault);
   }
 }

@@ -1,0 +1,108 @@
+#!/bin/sh
+# SPDX-License-Identifier: MIT
+# errors.sh MACRORUN FAKE_MODULE: how errors are shown, and what else is told about a run.
+. "$(dirname "$0")/runner.sh"
+printf 'text\n' > input.txt
+
+# Place, message, the source line and a caret below the character, once each
+expect_rbs 1 '' "$(printf 'def f\n\t"\303\244" + nil\nend\nf')"
+expect_lines err "macro.rbs:2:2: no implicit conversion of nil into String (TypeError)" \
+  "$(printf '  \t"\303\244" + nil')" "$(printf '  \t^')" "$(printf "\tfrom macro.rbs:2:in \`+'")" \
+  "$(printf "\tfrom macro.rbs:2:in \`f'")" "$(printf "\tfrom macro.rbs:4:in \`<main>'")"
+expect_rbs 1 '' 'x = "ä"; y = = 1'
+expect_lines err "macro.rbs:1:14: syntax error, unexpected '='" '  x = "ä"; y = = 1' \
+  '               ^'
+expect_js 1 '' '/* ä */ x = = 1;'
+expect_lines err 'macro.js:1:13: Syntax error' '  /* ä */ x = = 1;' '              ^'
+expect_js 1 '' "$(printf 'var ok;\n  tarn.nothing();')"
+expect_lines err 'macro.js:2:3: nothing is no macro function (see --functions)' \
+  '    tarn.nothing();' '    ^'
+expect_js 1 '' 'tarn.goto_line(7);'
+expect_lines err 'macro.js: goto_line: argument 1 of (line): expected a line number from 1 to 2, got "7"'
+expect_rbs 1 '' "$(printf 'def f\n  @tarn.goto_line(7)\nend\n\nf')"
+expect_lines err 'macro.rbs:2: goto_line: argument 1 of (line): expected a line number from 1 to 2, got "7"' \
+  '    @tarn.goto_line(7)'
+
+# --keep-going: the call does nothing, the macro goes on, and has failed
+expect_js 1 'after' 'tarn.goto_line(7); tarn.message("after");' --keep-going
+
+# JSON: every line is an object
+json() {
+  python3 - "$@" << 'PYTHON'
+import json, sys
+lines = [json.loads(line) for line in open('err', 'rb').read().decode().splitlines()]
+sys.exit(0 if eval(sys.argv[1], {'e': lines}) else 'not so: %s in %s' % (sys.argv[1], lines))
+PYTHON
+  # shellcheck disable=SC2181
+  [ $? -eq 0 ] || fail "$source"
+}
+if command -v python3 > /dev/null; then
+  expect_rbs 1 '' "$(printf '@tarn.message("a\\"\\xff")\nx = nil.no')" --errors json --profile
+  json '[x["type"] for x in e] == ["message", "error"] + 3 * ["profile"]'
+  json '(e[1]["file"], e[1]["line"], e[1]["column"], e[1]["source"]) == ("macro.rbs", 2, 8, "x = nil.no")'
+  json 'e[0]["text"] == "a\"\ufffd" and "NoMethodError" in e[1]["message"]'
+  expect_rbs 1 '' '@tarn.goto_line("x")' --errors json --trace
+  json '[(x["kind"], x["function"], x["argument"], x["expected"]) for x in e if x["type"] == "error"] \
+== [("call", "goto_line", 1, "a line number from 1 to 2")]'
+  json '{"type": "trace", "text": "goto_line(\"x\") -> wrong call"} in e'
+  expect 2 '' --errors json missing.js
+  json 'e[0]["kind"] == "usage" and "missing.js" in e[0]["message"]'
+  expect 4 '' --errors json --module "$fake" macro.js
+  json 'e[0]["kind"] == "fault"'
+else
+  echo 'no python3: JSON is not checked'
+fi
+
+# Colour on a terminal, unless the user does not want it
+if command -v script > /dev/null; then
+  colour=$(printf '\033\\[[0-9;]*3[1-6][0-9;]*m\|\033\\[[0-9;]*9[1-6][0-9;]*m')
+  echo 'x = = 1;' > macro.js
+  timeout 20 script -qec "wine '$macrorun' macro.js" terminal > /dev/null 2>&1
+  grep -q 'Syntax error' terminal && grep -q "$colour" terminal || fail "no colour: $(cat -v terminal)"
+  NO_COLOR=1 timeout 20 script -qec "wine '$macrorun' macro.js" terminal > /dev/null 2>&1
+  grep -q 'Syntax error' terminal && ! grep -q "$colour" terminal || fail 'colour despite NO_COLOR'
+fi
+
+# --trace, --profile, --log
+expect_rbs 0 'write("a\"b\n") -> 0' '@tarn.write("a\"b\n"); @tarn.get_line(1)' --trace
+grep -qxF 'get_line(1) -> "a\"b"' err || fail "--trace: $(cat err)"
+grep -qxF 'Debug: Initialising macro interface' err || fail '--trace: no debug lines'
+echo 'sleep 0.2' > slow.rbs
+expect_rbs 0 '' '5.times { @tarn.line_count }; @tarn.run_macro("slow.rbs")' --profile
+awk 'NR == 2 { ok = $1 == "run_macro" && $2 == 1 && $3 >= 200 && $4 + 0 > 20 }
+     NR == 3 { ok = ok && $1 == "line_count" && $2 == 5 } END { exit !ok }' err ||
+  fail "--profile: $(cat err)"
+expect 4 '' --log module.log --module "$fake" macro.rbs
+grep -qx 'a line of the module' module.log || fail '--log: the module has not found it'
+
+# Messages, arguments, answers and macros in macros
+echo '@tarn.write(@tarn.argument("name") + @tarn.argument("other", "-") + @tarn.prompt("?") + @tarn.prompt("?"))' > ask.rbs
+expect 0 'a=b-12' ask.rbs --arg name=a=b --answer 1 --answer 2
+expect 1 'prompt: ' ask.rbs --arg name=x --answer 1 < /dev/null
+expect 1 'argument: argument 1' ask.rbs
+mkdir inner
+echo '@tarn.write("<"); ok = @tarn.run_macro("inner/one.rbs"); @tarn.write(ok.to_s + ">")' > outer.rbs
+echo '@tarn.write("1"); raise "inside" if @tarn.run_macro("two.rbs") == 0; @tarn.write("3")' > inner/one.rbs
+echo '@tarn.write("2")' > inner/two.rbs
+expect 0 '<1231>' outer.rbs
+echo '@tarn.goto_line(99)' > inner/two.rbs
+expect 0 '<10>' outer.rbs
+grep -q '^inner.two.rbs:1: goto_line' err && grep -q '^inner/one.rbs:1:.*inside' err ||
+  fail "nested errors: $(cat err)"
+echo '@tarn.run_macro("inner/none.rbs"); @tarn.run_macro("self.rbs")' > self.rbs
+expect 0 'there is no macro' self.rbs
+grep -q 'more than 16 deep' err || fail "endless macros: $(cat err)"
+
+# --check: every file, and nothing runs
+echo '@tarn.message("has run"); at_exit { puts "has run" }; BEGIN { @tarn.message("has run") }' > good.rbs
+printf 'x = 1\ny = = "ä"\n' > bad.rbs
+printf 'tarn.message("has run");\nif (' > bad.js
+printf 'tarn.message "has run"\nIf x Then\n' > bad.vbs
+expect 0 '' --check good.rbs good.rbs
+[ ! -s out ] && [ ! -s err ] || fail "--check: $(cat out err)"
+expect 1 'bad.rbs:2:5: syntax error' --check good.rbs bad.rbs bad.js bad.vbs good.rbs
+grep -q '^bad.js:2:' err && grep -q '^bad.vbs:' err && ! grep -q 'has run' err || fail "--check: $(cat err)"
+expect 2 'missing.rbs' --check missing.rbs bad.rbs
+grep -q '^bad.rbs:2:5:' err || fail '--check stops at a missing file'
+
+finish

@@ -1,0 +1,64 @@
+#!/bin/sh
+# SPDX-License-Identifier: MIT
+# stops.sh MACRORUN FAKE_MODULE: Ctrl+C and timeouts.
+. "$(dirname "$0")/runner.sh"
+printf 'text\n' > input.txt
+
+echo 'loop {}' > endless.rbs
+
+now() { date +%s%3N; }
+
+# interrupt SIGNALS: runs macro.rbs or macro.js ($1), sends Ctrl+C that often once the macro has
+# started, and leaves exit code and time since the last signal.
+interrupt() {
+  wine "$macrorun" "$1" input.txt > out 2> err &
+  process=$!
+  i=0
+  until grep -q started err || [ $i -eq 100 ]; do sleep 0.1; i=$((i + 1)); done
+  kill -INT $process
+  begin=$(now)
+  if [ "$2" = 2 ]; then
+    sleep 0.5
+    kill -0 $process || fail "$source: did not need the second Ctrl+C"
+    kill -INT $process
+    begin=$(now)
+  fi
+  wait $process
+  result=$?
+  duration=$(($(now) - begin))
+  [ $result -eq 3 ] && [ ! -s out ] || fail "$source: exit code $result, expected 3: $(cat err)"
+  [ $duration -lt 1500 ] || fail "$source: $duration ms"
+}
+
+while IFS='|' read -r extension signals source; do
+  echo "$source" > "macro.$extension"
+  interrupt "macro.$extension" "$signals"
+done << 'MACROS'
+js|1|tarn.message("started"); while (true) tarn.line_count();
+rbs|1|@tarn.message("started"); loop { begin; @tarn.line_count; rescue Exception; end }
+rbs|1|@tarn.message("started"); loop {}
+rbs|1|@tarn.message("started"); sleep
+rbs|1|@tarn.message("started"); @tarn.run_macro("endless.rbs"); loop {}
+js|2|tarn.message("started"); while (true);
+MACROS
+
+# What has been stopped by force says so; its ensure blocks have run
+expect_rbs 3 'timed out' 'begin; sleep; ensure; File.write("ensured", "x"); end' --timeout 0.3
+[ -e ensured ] || fail 'an interrupted macro has not run its ensure block'
+expect_js 3 'the program ends' 'while (true);' --timeout 0.3
+expect_js 3 'timed out' 'while (true) tarn.line_count();' --timeout 0.3
+expect_rbs 3 'timed out' '@tarn.run_macro("endless.rbs"); @tarn.message("after")' --timeout 0.3
+! grep -q after err || fail 'a macro goes on after the one that it ran was stopped'
+expect_rbs 0 '' '@tarn.line_count' --timeout 30
+
+# Of several files none is begun after a stop
+expect 3 '0 of 2 files done, 1 failed, 1 not begun' --timeout 0.3 endless.rbs --each input.txt input.txt
+
+# Time that a prompt waits does not count
+if command -v script > /dev/null; then
+  echo 'tarn.message("answer: " + tarn.prompt("who?"));' > macro.js
+  { sleep 2; printf 'Bob\r'; sleep 1; } | timeout 20 script -qec "wine '$macrorun' --timeout 1 macro.js" terminal > /dev/null 2>&1
+  grep -q 'answer: Bob' terminal || fail "a prompt: $(cat -v terminal)"
+fi
+
+finish

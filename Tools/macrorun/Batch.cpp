@@ -1,0 +1,106 @@
+// SPDX-License-Identifier: MIT
+#include "Batch.h"
+
+#include <algorithm>
+
+#include "Encoding.h"
+#include "Files.h"
+#include "Language.h"
+#include "MacroRun.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+class Batch {
+ public:
+  Batch(const Options& runOptions, Reporter& runReporter)
+      : options(runOptions),
+        reporter(runReporter),
+        language(ChooseLanguage(options, options.macro)),
+        module(options.module, &language),
+        engines(language.engine),
+        surroundings{options, module, engines, reporter, profile} {}
+
+  ExitCode RunOne(const fs::path& input);
+  ExitCode RunEach();
+  void ShowProfile();
+
+ private:
+  void Write(const fs::path& input, const std::string& bytes);
+  ExitCode RunGuarded(const fs::path& input);
+
+  const Options& options;
+  Reporter& reporter;
+  const Language language;
+  ScriptModule module;
+  EngineWatch engines;  // goes before the module, whose engines it may hold
+  CallProfile profile;
+  RunSurroundings surroundings;
+};
+
+ExitCode Batch::RunOne(const fs::path& input) {
+  if (options.inPlace) RequireReplaceable(input, true);
+  Editor editor(Document(ReadInput(input)), input == "-" ? fs::path() : input);
+  for (unsigned i = 0; i < options.repeat; ++i)
+    if (const ExitCode code = RunMacro(surroundings, editor); code != kSuccess) return code;
+  Write(input, editor.First().Bytes());
+  return kSuccess;
+}
+
+void Batch::Write(const fs::path& input, const std::string& bytes) {
+  reporter.EndProgress();
+  if (options.inPlace)
+    ReplaceFileBytes(input, bytes);
+  else if (!options.output.empty())
+    ReplaceFileBytes(options.output, bytes);
+  else
+    WriteStandardOutput(bytes);
+}
+
+// A file that cannot be read or written keeps no other from its turn.
+ExitCode Batch::RunGuarded(const fs::path& input) try {
+  return RunOne(input);
+} catch (const UsageError& error) {
+  ErrorReport report;
+  report.kind = "file";
+  report.message = error.what();
+  reporter.Error(std::move(report));
+  return kWrongUsage;
+}
+
+ExitCode Batch::RunEach() {
+  ExitCode worst = kSuccess;
+  std::size_t done = 0, succeeded = 0;
+  for (const fs::path& input : options.inputs) {
+    reporter.Progress(++done, options.inputs.size(), ToUtf8(input));
+    const ExitCode code = RunGuarded(input);
+    succeeded += code == kSuccess;
+    worst = std::max(worst, code);
+    if (code == kStopped || code == kFault) break;
+  }
+  std::string summary = std::to_string(succeeded) + " of " + std::to_string(options.inputs.size()) +
+                        " files done, " + std::to_string(done - succeeded) + " failed";
+  if (done < options.inputs.size())
+    summary += ", " + std::to_string(options.inputs.size() - done) + " not begun";
+  reporter.Note(summary);
+  return worst;
+}
+
+void Batch::ShowProfile() {
+  reporter.EndProgress();
+  if (options.profile) reporter.Profile(profile.Table());
+}
+
+}  // namespace
+
+ExitCode RunBatch(const Options& options, Reporter& reporter) {
+  RequireReadable(options.macro, "macro");
+  if (!options.output.empty()) RequireReplaceable(options.output, false);
+  Batch batch(options, reporter);
+  const ExitCode code =
+      options.each ? batch.RunEach()
+                   : batch.RunOne(options.inputs.empty() ? fs::path() : options.inputs.front());
+  batch.ShowProfile();
+  return code;
+}

@@ -1,0 +1,31 @@
+// SPDX-License-Identifier: MIT
+// Characters in texts of bytes that are UTF-8 by convention.
+//
+// A character is a Unicode code point; each byte that belongs to no valid UTF-8 sequence (overlong
+// forms, surrogates and what lies above U+10FFFF are not valid) counts as one character of its own.
+// Offsets are in bytes from 0.
+#pragma once
+
+#include <cstddef>
+#include <string>
+#include <string_view>
+
+// Bytes of the character at `offset`, which must be inside the text and at a character's start.
+std::size_t CharacterLength(std::string_view text, std::size_t offset);
+// The start of the character before `offset`, which must not be 0 and be at a character's start.
+std::size_t PreviousCharacter(std::string_view text, std::size_t offset);
+// Whether a character starts at `offset`, or the text ends there.
+bool IsCharacterStart(std::string_view text, std::size_t offset);
+
+std::size_t CharacterCount(std::string_view text);
+// The offset behind the first `count` characters; the text's length when it has fewer.
+std::size_t OffsetOfCharacter(std::string_view text, std::size_t count);
+bool IsValidUtf8(std::string_view text);
+
+// Letters, digits, marks on them and the underscore make words; blank are space and tab.
+bool IsWordAt(std::string_view text, std::size_t offset);
+bool IsBlankAt(std::string_view text, std::size_t offset);
+
+enum class LetterCase { kUpper, kLower, kTitle };  // title: words begin with a capital
+// One character becomes one character, so "ß" has no capital. Invalid bytes stay.
+std::string WithCase(std::string_view text, LetterCase letterCase);

@@ -1,0 +1,82 @@
+// SPDX-License-Identifier: MIT
+#include "Console.h"
+
+#include <fcntl.h>
+#include <io.h>
+#include <windows.h>
+
+#include <algorithm>
+
+#include "Encoding.h"
+
+namespace {
+
+HANDLE HandleOf(std::FILE* stream) {
+  return reinterpret_cast<HANDLE>(_get_osfhandle(_fileno(stream)));
+}
+
+bool ColourWanted() {
+  wchar_t value[2];
+  return GetEnvironmentVariableW(L"NO_COLOR", value, 2) == 0;
+}
+
+WORD Attributes(Colour colour, WORD plain) {
+  switch (colour) {
+    case Colour::kError:
+      return FOREGROUND_RED | FOREGROUND_INTENSITY;
+    case Colour::kHighlight:
+      return FOREGROUND_GREEN | FOREGROUND_INTENSITY;
+    case Colour::kFaint:
+      return FOREGROUND_GREEN | FOREGROUND_BLUE;
+    case Colour::kPlain:
+      break;
+  }
+  return plain;
+}
+
+// The system's own attributes and not escape sequences: every console takes them.
+void WriteTerminal(HANDLE terminal, std::string_view text, Colour colour) {
+  CONSOLE_SCREEN_BUFFER_INFO before = {};
+  const bool coloured =
+      colour != Colour::kPlain && ColourWanted() && GetConsoleScreenBufferInfo(terminal, &before);
+  if (coloured) SetConsoleTextAttribute(terminal, Attributes(colour, before.wAttributes));
+  const std::wstring wide = PathFromUtf8(text).wstring();
+  DWORD written = 0;
+  for (std::size_t from = 0; from < wide.size(); from += written) {
+    const DWORD length = static_cast<DWORD>(std::min<std::size_t>(wide.size() - from, 8192));
+    if (!WriteConsoleW(terminal, wide.data() + from, length, &written, nullptr) || !written) break;
+  }
+  if (coloured) SetConsoleTextAttribute(terminal, before.wAttributes);
+}
+
+}  // namespace
+
+void PrepareStandardError() { _setmode(_fileno(stderr), _O_BINARY); }
+
+bool IsTerminal(std::FILE* stream) {
+  DWORD mode = 0;
+  return GetConsoleMode(HandleOf(stream), &mode);
+}
+
+void WriteError(std::string_view text, Colour colour) {
+  if (IsTerminal(stderr)) {
+    WriteTerminal(HandleOf(stderr), text, colour);
+    return;
+  }
+  std::fwrite(text.data(), 1, text.size(), stderr);
+  std::fflush(stderr);
+}
+
+std::optional<std::string> ReadTerminalLine() {
+  std::wstring line;
+  wchar_t block[256];
+  DWORD count = 0;
+  while (ReadConsoleW(HandleOf(stdin), block, 256, &count, nullptr) && count > 0) {
+    line.append(block, count);
+    if (line.back() != L'\n') continue;
+    line.erase(line.find_last_not_of(L"\r\n") + 1);
+    if (!line.empty() && line.front() == L'\x1A') return {};  // Ctrl+Z
+    return WideToUtf8(line);
+  }
+  return {};
+}

@@ -1,0 +1,27 @@
+// SPDX-License-Identifier: MIT
+// The streams that a person may be looking at: whether they are a terminal, and text with colour on
+// standard error.
+//
+// Texts are UTF-8; what is not passes as it is, except to a terminal, which shows a replacement
+// character. Colour is used on a terminal only, and never when the environment variable NO_COLOR is
+// set and not empty.
+// Errors: a stream that cannot be written is passed over; there is nobody to tell.
+// Threading: any thread; texts of two threads may mix line by line.
+#pragma once
+
+#include <cstdio>
+#include <optional>
+#include <string>
+#include <string_view>
+
+enum class Colour { kPlain, kError, kHighlight, kFaint };
+
+// Standard error as it is, without the C library's line ends.
+void PrepareStandardError();
+
+bool IsTerminal(std::FILE* stream);
+
+void WriteError(std::string_view text, Colour colour = Colour::kPlain);
+
+// A line that the user types, without its end; nothing at the end of the input.
+std::optional<std::string> ReadTerminalLine();

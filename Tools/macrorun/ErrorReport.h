@@ -1,0 +1,53 @@
+// SPDX-License-Identifier: MIT
+// An error of a macro in one form, wherever it comes from: the module's reports, a script engine's
+// syntax check, or a macro function that was called wrongly.
+//
+// Texts are bytes, UTF-8 by convention. Lines and columns count from 1, columns in characters once the
+// source is complete; 0 is unknown.
+// Errors: none; what a text does not tell stays empty.
+// Threading: values.
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+struct ErrorReport {
+  std::string kind;  // "script", "call", "engine", "fault"
+  std::string file;
+  int line = 0;
+  int column = 0;
+  bool columnInBytes = false;  // as engines count that take each byte for a character
+  std::string message;         // one line
+  std::string source;          // the text of the line
+  std::vector<std::string> details;
+  std::string function;  // of a wrong call, as are the next two
+  int argument = 0;      // from 1; 0: not one of them
+  std::string expected;
+};
+
+// How a macro is named: in what `execute` is given and the module's reports say, and to the user.
+struct MacroName {
+  std::string inModule;
+  std::string shown;
+};
+
+// The module's report of a script error; nothing for another report.
+std::optional<ErrorReport> ParseScriptError(std::string_view report, const MacroName& macro);
+
+// An engine's description of an error becomes message and details: what repeats the place or the
+// source line is left out, and `file` stands for the name that the engine has for a macro.
+void SetDescription(ErrorReport& error, std::string_view description);
+
+// The line's text from the macro file, where the engine has told none, and the column in characters.
+void CompleteSource(ErrorReport& error);
+
+// One JSON object without a line end.
+std::string ErrorAsJson(const ErrorReport& error);
+
+// "file:line:column: " as far as it is known.
+std::string Place(const ErrorReport& error);
+
+// The blanks and the caret below the source line; empty when the column is unknown or beyond it.
+std::string CaretLine(const ErrorReport& error);

@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: MIT
+#include "Language.h"
+
+#include <windows.h>
+
+#include <cwchar>
+#include <system_error>
+
+#include "Encoding.h"
+#include "ExitCode.h"
+#include "Files.h"
+#include "Options.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+// What the module keeps of a ProgID.
+constexpr std::size_t kLongestEngine = 18;
+
+std::string EngineOf(const fs::path& description) {
+  wchar_t name[kLongestEngine + 1];
+  GetPrivateProfileStringW(L"Options", L"Language", L"RubyScript", name,
+                           static_cast<DWORD>(std::size(name)), fs::absolute(description).c_str());
+  return WideToUtf8(name);
+}
+
+Language Described(const fs::path& description) { return {description, EngineOf(description)}; }
+
+}  // namespace
+
+Language ChooseLanguage(const Options& options, const fs::path& macro) {
+  if (options.engine.size() > kLongestEngine)
+    throw UsageError("--engine " + options.engine + ": the module takes " +
+                     std::to_string(kLongestEngine) + " characters at most");
+  if (!options.engine.empty()) return {{}, options.engine};
+  if (!options.description.empty()) {
+    RequireReadable(options.description, "language description (--description)");
+    return Described(options.description);
+  }
+  const std::wstring extension = macro.extension().wstring();
+  if (_wcsicmp(extension.c_str(), L".rbs") == 0) return {{}, "RubyScript"};
+  const std::wstring language = extension.empty() ? extension : extension.substr(1);
+  const fs::path file = ProgramFolder() / "languages" / (language + L".qwsh");
+  std::error_code error;
+  if (!language.empty() && fs::is_regular_file(file, error)) return Described(file);
+  throw UsageError("no language description for " + ToUtf8(macro) + " (" + ToUtf8(file) +
+                   "); name the engine with --engine, or a description with --description");
+}

@@ -1,0 +1,57 @@
+// SPDX-License-Identifier: MIT
+#include "RunServices.h"
+
+#include <system_error>
+
+#include "Console.h"
+#include "Encoding.h"
+#include "RunControl.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+// Far below what the stack holds.
+constexpr std::size_t kDeepest = 16;
+
+}  // namespace
+
+std::optional<std::string> RunServices::Prompt(const std::string& question,
+                                               const std::string& proposal) {
+  if (answersTaken < options.answers.size()) return options.answers[answersTaken++];
+  if (!IsTerminal(stdin)) return {};
+  return AskUser(question, proposal);
+}
+
+std::optional<std::string> RunServices::AskUser(const std::string& question,
+                                                const std::string& proposal) {
+  reporter.EndProgress();
+  WriteError(question + (proposal.empty() ? " " : " [" + proposal + "] "), Colour::kHighlight);
+  control->Pause();
+  std::optional<std::string> answer = ReadTerminalLine();
+  control->Resume();
+  if (answer && answer->empty()) answer = proposal;
+  return answer;
+}
+
+std::optional<std::string> RunServices::MacroArgument(const std::string& name) const {
+  const auto argument = options.arguments.find(name);
+  if (argument == options.arguments.end()) return {};
+  return argument->second;
+}
+
+bool RunServices::RunMacro(const fs::path& macro) {
+  const fs::path file = macros.back().parent_path() / macro;
+  std::error_code error;
+  ErrorReport report;
+  report.kind = "call";
+  report.file = ToUtf8(macros.back());
+  if (!fs::is_regular_file(file, error))
+    report.message = "there is no macro " + ToUtf8(file);
+  else if (macros.size() >= kDeepest)
+    report.message = "macros run each other more than " + std::to_string(kDeepest) + " deep";
+  else
+    return nested.RunNested(file);
+  reporter.Error(std::move(report));
+  return false;
+}

@@ -1,0 +1,51 @@
+// SPDX-License-Identifier: MIT
+// What macro functions get from this program: the user, the command line, and other macros.
+//
+// Ownership: everything it is made with is the caller's. Threading: the run's thread.
+#pragma once
+
+#include <filesystem>
+#include <vector>
+
+#include "EditorServices.h"
+#include "Options.h"
+#include "Reporter.h"
+
+class RunControl;
+
+// Runs a macro inside the present call; whether it has succeeded.
+class NestedRunner {
+ public:
+  virtual ~NestedRunner() = default;
+  virtual bool RunNested(const std::filesystem::path& macro) = 0;
+};
+
+class RunServices final : public EditorServices {
+ public:
+  RunServices(const Options& runOptions, Reporter& runReporter, NestedRunner& runner)
+      : options(runOptions), reporter(runReporter), nested(runner) {}
+
+  // Whose time stands still while the user is asked; before the first prompt.
+  void SetControl(RunControl* runControl) { control = runControl; }
+  // Around each run.
+  void EnterMacro(const std::filesystem::path& macro) { macros.push_back(macro); }
+  void LeaveMacro() { macros.pop_back(); }
+
+  void Message(const std::string& text) override { reporter.Message(text); }
+  // The answers of the command line come first, then those of a user at a terminal. An empty line is
+  // the proposal.
+  std::optional<std::string> Prompt(const std::string& question,
+                                    const std::string& proposal) override;
+  std::optional<std::string> MacroArgument(const std::string& name) const override;
+  bool RunMacro(const std::filesystem::path& macro) override;
+
+ private:
+  std::optional<std::string> AskUser(const std::string& question, const std::string& proposal);
+
+  const Options& options;
+  Reporter& reporter;
+  NestedRunner& nested;
+  RunControl* control = nullptr;
+  std::vector<std::filesystem::path> macros;  // outermost first
+  std::size_t answersTaken = 0;
+};

@@ -1,0 +1,68 @@
+// SPDX-License-Identifier: MIT
+// A script engine that tells when it goes: passes every call on to the real one. A reference beside the
+// module's would keep an engine longer than the site that it calls as it goes, so whoever wants to
+// reach the engine from outside must know its end and hold none.
+//
+// Ownership: COM's; it holds the real engine. Errors: those of the real engine.
+// Threading: the real engine's.
+#pragma once
+
+#include <activscp.h>
+#include <windows.h>
+
+// The 32-bit form of the parser; libraries do not carry its identifier under the header's name.
+inline constexpr IID kActiveScriptParse = {
+    0xBB1A2AE2, 0xA4F9, 0x11CF, {0x8F, 0x20, 0x00, 0x80, 0x5F, 0x2C, 0xD0, 0x64}};
+
+class WatchedEngine final : public IActiveScript, public IActiveScriptParse {
+ public:
+  class Owner {
+   public:
+    virtual ~Owner() = default;
+    // Returns when nobody uses the engine any more.
+    virtual void Going(WatchedEngine* engine) = 0;
+  };
+
+  // Takes over the reference. The owner outlives the object.
+  WatchedEngine(IActiveScript* realEngine, IActiveScriptParse* realParser, Owner& engineOwner)
+      : engine(realEngine), parser(realParser), owner(engineOwner) {}
+  WatchedEngine(const WatchedEngine&) = delete;
+  WatchedEngine& operator=(const WatchedEngine&) = delete;
+
+  STDMETHODIMP QueryInterface(REFIID riid, void** object) override;
+  STDMETHODIMP_(ULONG) AddRef() override;
+  STDMETHODIMP_(ULONG) Release() override;
+
+  // IActiveScript
+  STDMETHODIMP SetScriptSite(IActiveScriptSite* site) override;
+  STDMETHODIMP GetScriptSite(REFIID riid, void** object) override;
+  STDMETHODIMP SetScriptState(SCRIPTSTATE state) override;
+  STDMETHODIMP GetScriptState(SCRIPTSTATE* state) override;
+  STDMETHODIMP Close() override;
+  STDMETHODIMP AddNamedItem(LPCOLESTR name, DWORD flags) override;
+  STDMETHODIMP AddTypeLib(REFGUID library, DWORD major, DWORD minor, DWORD flags) override;
+  STDMETHODIMP GetScriptDispatch(LPCOLESTR item, IDispatch** dispatch) override;
+  STDMETHODIMP GetCurrentScriptThreadID(SCRIPTTHREADID* thread) override;
+  STDMETHODIMP GetScriptThreadID(DWORD systemThread, SCRIPTTHREADID* thread) override;
+  STDMETHODIMP GetScriptThreadState(SCRIPTTHREADID thread, SCRIPTTHREADSTATE* state) override;
+  STDMETHODIMP InterruptScriptThread(SCRIPTTHREADID thread, const EXCEPINFO* exception,
+                                     DWORD flags) override;
+  STDMETHODIMP Clone(IActiveScript** copy) override;
+
+  // IActiveScriptParse
+  STDMETHODIMP InitNew() override;
+  STDMETHODIMP AddScriptlet(LPCOLESTR defaultName, LPCOLESTR code, LPCOLESTR item,
+                            LPCOLESTR subItem, LPCOLESTR event, LPCOLESTR delimiter, DWORD context,
+                            ULONG line, DWORD flags, BSTR* name, EXCEPINFO* exception) override;
+  STDMETHODIMP ParseScriptText(LPCOLESTR code, LPCOLESTR item, IUnknown* context,
+                               LPCOLESTR delimiter, DWORD cookie, ULONG line, DWORD flags,
+                               VARIANT* result, EXCEPINFO* exception) override;
+
+ private:
+  ~WatchedEngine() = default;
+
+  LONG references = 1;
+  IActiveScript* const engine;
+  IActiveScriptParse* const parser;
+  Owner& owner;
+};

@@ -1,0 +1,145 @@
+// SPDX-License-Identifier: MIT
+// Several documents. Paths count from the process's current directory. Document 1 is the run's,
+// which alone decides where it goes: it needs a path to be saved and cannot be closed.
+#include <windows.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <memory>
+#include <optional>
+
+#include "../Encoding.h"
+#include "../MacroCall.h"
+#include "Families.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+using Kind = ParameterKind;
+using File = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
+
+std::optional<std::string> ReadFile(const fs::path& path) {
+  const File file(_wfopen(path.c_str(), L"rb"), std::fclose);
+  if (!file) return {};
+  std::string bytes;
+  char block[16384];
+  while (const std::size_t count = std::fread(block, 1, sizeof block, file.get()))
+    bytes.append(block, count);
+  if (std::ferror(file.get())) return {};
+  return bytes;
+}
+
+// The file is the old or the whole new one: it is written beside and renamed.
+bool WriteFile(const fs::path& path, const std::string& bytes) {
+  fs::path beside = path;
+  beside += L".macrorun-" + std::to_wstring(GetCurrentProcessId());
+  File file(_wfopen(beside.c_str(), L"wb"), std::fclose);
+  if (!file) return false;
+  bool done = std::fwrite(bytes.data(), 1, bytes.size(), file.get()) == bytes.size();
+  done = std::fclose(file.release()) == 0 && done;
+  done = done && MoveFileExW(beside.c_str(), path.c_str(), MOVEFILE_REPLACE_EXISTING);
+  if (!done) DeleteFileW(beside.c_str());
+  return done;
+}
+
+MacroResult Number(const MacroCall& call) {
+  return static_cast<std::int32_t>(call.editor.CurrentNumber());
+}
+
+MacroResult OpenDocument(MacroCall& call) {
+  std::error_code error;
+  const fs::path path = fs::absolute(PathFromUtf8(call.Text(0)), error);
+  for (std::size_t number = 1; number <= call.editor.DocumentCount(); ++number) {
+    if (!fs::equivalent(call.editor.Name(number), path, error)) continue;
+    call.editor.Switch(number);
+    return Number(call);
+  }
+  errno = 0;
+  const std::optional<std::string> bytes = ReadFile(path);
+  if (!bytes) call.Fail(0, std::string("a file that can be read (") + std::strerror(errno) + ")");
+  call.editor.Open(Document(*bytes), path);
+  return Number(call);
+}
+
+MacroResult SaveDocument(MacroCall& call) {
+  const std::size_t number = call.editor.CurrentNumber();
+  fs::path path = call.editor.Name(number);
+  std::error_code error;
+  if (call.Has(0))
+    path = fs::absolute(PathFromUtf8(call.Text(0)), error);
+  else if (number == 1 || path.empty())
+    call.Fail(0, "the path of a file, since this document has none of its own to be saved in");
+  if (!WriteFile(path, call.document().Bytes())) call.Fail(0, "a file that can be written");
+  if (number != 1) call.editor.SetName(number, path);
+  return 0;
+}
+
+MacroResult CloseDocument(MacroCall& call) {
+  const std::size_t number = call.Number(0, call.editor.CurrentNumber());
+  if (number == 1) call.Fail(0, "a document other than 1, which stays");
+  call.editor.Close(number);
+  return 0;
+}
+
+constexpr ResultKind kNone = ResultKind::kNone, kNumber = ResultKind::kNumber;
+const MacroParameter kDocument = {"document", Kind::kDocument};
+const MacroParameter kOptionalDocument = {"document", Kind::kDocument, true};
+
+const std::vector<MacroFunction> kFunctions = {
+    {"new_document",
+     {},
+     kNumber,
+     "opens an empty document and goes there; its number",
+     [](MacroCall& call) {
+       call.editor.Open(Document(""), {});
+       return Number(call);
+     }},
+    {"open_document",
+     {{"path", Kind::kName}},
+     kNumber,
+     "opens a file, if it is not open, and goes there; its number",
+     OpenDocument},
+    {"save_document",
+     {{"path", Kind::kName, true}},
+     kNone,
+     "writes the current document to a file, by default its own",
+     SaveDocument},
+    {"switch_document",
+     {kDocument},
+     kNone,
+     "goes to a document",
+     [](MacroCall& call) -> MacroResult {
+       call.editor.Switch(call.Number(0));
+       return 0;
+     }},
+    {"current_document",
+     {},
+     kNumber,
+     "the number of the current document",
+     [](MacroCall& call) { return Number(call); }},
+    {"document_count",
+     {},
+     kNumber,
+     "the number of documents",
+     [](MacroCall& call) -> MacroResult {
+       return static_cast<std::int32_t>(call.editor.DocumentCount());
+     }},
+    {"document_name",
+     {kOptionalDocument},
+     ResultKind::kText,
+     "the path of a document's file, empty without one; by default the current document's",
+     [](MacroCall& call) -> MacroResult {
+       return ToUtf8(call.editor.Name(call.Number(0, call.editor.CurrentNumber())));
+     }},
+    {"close_document",
+     {kOptionalDocument},
+     kNone,
+     "closes a document, by default the current one; unsaved changes are lost",
+     CloseDocument},
+};
+
+}  // namespace
+
+Family DocumentFamily() { return {"Documents", kFunctions}; }

@@ -1,0 +1,56 @@
+// SPDX-License-Identifier: MIT
+// The user, the command line and other macros.
+#include "../Encoding.h"
+#include "../MacroCall.h"
+#include "Families.h"
+
+namespace {
+
+using Kind = ParameterKind;
+
+MacroResult Prompt(MacroCall& call) {
+  const std::optional<std::string> answer = call.services.Prompt(call.Text(0), call.Text(1));
+  if (!answer) call.Fail("an answer, but there is none");
+  return *answer;
+}
+
+MacroResult Argument(MacroCall& call) {
+  const std::optional<std::string> value = call.services.MacroArgument(call.Text(0));
+  if (value) return *value;
+  if (!call.Has(1)) call.Fail(0, "the name of an argument that the macro was given");
+  return call.Text(1);
+}
+
+constexpr ResultKind kText = ResultKind::kText;
+
+const std::vector<MacroFunction> kFunctions = {
+    {"message",
+     {{"text", Kind::kTexts}},
+     ResultKind::kNone,
+     "shows its texts to the user, with a blank between",
+     [](MacroCall& call) -> MacroResult {
+       call.services.Message(call.Text(0));
+       return 0;
+     }},
+    {"prompt",
+     {{"question", Kind::kText}, {"default", Kind::kText, true}},
+     kText,
+     "asks the user; the answer",
+     Prompt},
+    {"argument",
+     {{"name", Kind::kName}, {"default", Kind::kText, true}},
+     kText,
+     "the value that the macro was given for a name, or the default",
+     Argument},
+    {"run_macro",
+     {{"path", Kind::kName}},
+     ResultKind::kNumber,
+     "runs another macro over the same documents; 1, or 0 when it failed",
+     [](MacroCall& call) -> MacroResult {
+       return call.services.RunMacro(PathFromUtf8(call.Text(0))) ? 1 : 0;
+     }},
+};
+
+}  // namespace
+
+Family MacroFamily() { return {"Macro", kFunctions}; }
