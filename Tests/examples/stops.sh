@@ -11,6 +11,7 @@ now() { date +%s%3N; }
 # interrupt SIGNALS: runs macro.rbs or macro.js ($1), sends Ctrl+C that often once the macro has
 # started, and leaves exit code and time since the last signal.
 interrupt() {
+  : > err # not the one of the run before, which has started
   wine "$macrorun" "$1" input.txt > out 2> err &
   process=$!
   i=0

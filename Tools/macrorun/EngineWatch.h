@@ -3,11 +3,12 @@
 // interrupted.
 //
 // The module asks COM for an engine by its ProgID. This class answers with a class object of its own,
-// which makes the real engine and hands it out in a wrapper that tells when it goes (see
-// WatchedEngine.h). For an engine that is registered, the class object is registered in this process under
-// the engine's class. Activation contexts go before that, so for the Ruby engine that lies beside this
-// program and is registered nowhere, a manifest inside macrorun.exe names the program itself as the
-// engine's server (DllGetClassObject below). Under another name it only runs macros and interrupts none.
+// which makes the real engine and hands it out in a wrapper that tells when it goes (WatchedEngine.h).
+// For an engine that is registered, the class object is registered in this process under the engine's
+// class. Activation contexts go before that, so for the Ruby engine that lies beside this program and is
+// registered nowhere, a manifest inside macrorun.exe names the program itself as the engine's server
+// (DllGetClassObject, exported). Under another file name the program runs Ruby macros as well, but
+// interrupts none.
 //
 // Ownership: it holds no engine. Those that a stop or a fault has left must not be touched any more, and
 // never go: the run says so with Abandon.

@@ -8,7 +8,7 @@ enum ExitCode {
   kSuccess = 0,
   kMacroFailed = 1,  // it did not parse, ended with an error, or called a macro function wrongly
   kWrongUsage = 2,   // UsageError
-  kStopped = 3,      // by Ctrl+C
+  kStopped = 3,      // by Ctrl+C or a timeout
   kFault = 4,        // in this program, the module or the script engine
 };
 
