@@ -71,9 +71,11 @@ module ActiveScript
           abort: Thread.abort_on_exception, report: Thread.report_on_exception, gc_disabled: false }
       end
 
+      # Only what differs: some of these keep memory each time.
       def apply(settings)
-        Encoding.default_external = settings[:external]
-        Encoding.default_internal = settings[:internal]
+        present = self.settings
+        Encoding.default_external = settings[:external] unless present[:external].equal?(settings[:external])
+        Encoding.default_internal = settings[:internal] unless present[:internal].equal?(settings[:internal])
         Warning[:deprecated] = settings[:deprecated]
         Warning[:experimental] = settings[:experimental]
         $. = settings[:line_number]
