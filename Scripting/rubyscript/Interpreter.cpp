@@ -15,6 +15,7 @@ struct Entry {
   RubyTask* task;
   Entry* outer;
   const void* hostFrame;  // address in the frame of Enter; stacks grow downwards
+  unsigned number;
   bool abandoned = false;
   bool interrupted = false;
   bool interruptible = false;
@@ -43,6 +44,7 @@ struct State {
   const void* hostFrame = nullptr;  // of kBegin
   HostCall* call = nullptr;         // of kCall
   Entry* innermost = nullptr;
+  unsigned tasks = 0;  // so far
   EXCEPTION_RECORD fault = {};
   FaultBase* faultBase = nullptr;
   // Guards `innermost` and its chain, for Interrupt; changed by the interpreter's thread alone.
@@ -86,7 +88,7 @@ void OnAbort(int) {
 
 // With the process as a macro may change it.
 void RunTask() {
-  Entry entry = {state.task, state.innermost, state.hostFrame};
+  Entry entry = {state.task, state.innermost, state.hostFrame, ++state.tasks};
   entry.process.Save();
   signal(SIGABRT, OnAbort);
   SetInnermost(&entry);
@@ -289,3 +291,5 @@ void Interpreter::SetLeaving() { state.innermost->leaving = true; }
 bool Interpreter::IsMainThread() { return static_cast<LONG>(GetCurrentThreadId()) == state.thread; }
 
 const void* Interpreter::Owner() { return state.innermost->task->owner; }
+
+unsigned Interpreter::TaskNumber() { return state.innermost ? state.innermost->number : 0; }

@@ -78,6 +78,8 @@ class Interpreter {
   // Ruby side, any thread of Ruby's: whether what runs now is to be interrupted.
   enum class Urgency { kNone, kNow, kAfterGrace };
   static Urgency InterruptDue();
+  // Ruby side, any thread of Ruby's. A number that each task gets anew; 0 while none runs.
+  static unsigned TaskNumber();
   // Ruby side. Of the innermost task.
   static const void* Owner();
   // Ruby side, any thread of Ruby's. Whether this is the thread that may call the host.

@@ -78,7 +78,9 @@ VALUE Interrupt(void*) {
   for (;;) {
     Wait(INFINITE);
     while (Interpreter::InterruptDue() != Interpreter::Urgency::kNone) {
+      const unsigned task = Interpreter::TaskNumber();
       if (Interpreter::InterruptDue() == Interpreter::Urgency::kAfterGrace) Wait(kGrace);
+      if (Interpreter::TaskNumber() != task) continue;  // the grace was another one's
       DeliverIfDue();
       Wait(kGrace);
     }
