@@ -74,12 +74,20 @@ void DeliverIfDue() {
   delivering = false;
 }
 
+// All of it, however often it is woken meanwhile, unless another task runs by then.
+void WaitGrace(unsigned task) {
+  const DWORD start = GetTickCount();
+  for (DWORD past = 0; past < kGrace && Interpreter::TaskNumber() == task;
+       past = GetTickCount() - start)
+    Wait(kGrace - past);
+}
+
 VALUE Interrupt(void*) {
   for (;;) {
     Wait(INFINITE);
     while (Interpreter::InterruptDue() != Interpreter::Urgency::kNone) {
       const unsigned task = Interpreter::TaskNumber();
-      if (Interpreter::InterruptDue() == Interpreter::Urgency::kAfterGrace) Wait(kGrace);
+      if (Interpreter::InterruptDue() == Interpreter::Urgency::kAfterGrace) WaitGrace(task);
       if (Interpreter::TaskNumber() != task) continue;  // the grace was another one's
       DeliverIfDue();
       Wait(kGrace);
