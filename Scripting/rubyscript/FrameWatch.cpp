@@ -77,13 +77,13 @@ void FaultBase::RedirectThread(const EXCEPTION_RECORD& exception, CONTEXT& state
 
 // The interpreter's own fibers begin with an empty chain, so no record would be asked.
 LONG FaultBase::HandleUnasked(EXCEPTION_POINTERS* exception) {
-  if (base->isThreadFault(*exception->ExceptionRecord)) {
-    base->RedirectThread(*exception->ExceptionRecord, *exception->ContextRecord);
+  const EXCEPTION_RECORD& record = *exception->ExceptionRecord;
+  if (IsFault(record.ExceptionCode) && base->isThreadFault(record)) {
+    base->RedirectThread(record, *exception->ContextRecord);
     return EXCEPTION_CONTINUE_EXECUTION;
   }
   if (GetCurrentThreadId() != base->thread || ChainHead() != kEmptyChain)
     return EXCEPTION_CONTINUE_SEARCH;
-  return base->Take(*exception->ExceptionRecord, *exception->ContextRecord)
-             ? EXCEPTION_CONTINUE_EXECUTION
-             : EXCEPTION_CONTINUE_SEARCH;
+  return base->Take(record, *exception->ContextRecord) ? EXCEPTION_CONTINUE_EXECUTION
+                                                       : EXCEPTION_CONTINUE_SEARCH;
 }

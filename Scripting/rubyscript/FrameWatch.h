@@ -36,7 +36,7 @@ class FrameWatch {
 // chains are empty.
 class FaultBase {
  public:
-  // Asked of every exception on any thread; true: a fault of another thread that the interpreter has
+  // Asked of every fault on any thread; true: one of another thread that the interpreter has
   // made. That thread then goes on in `endThread`, which must not return.
   using IsThreadFault = bool (*)(const EXCEPTION_RECORD& fault);
 

@@ -113,8 +113,7 @@ void Serve(Message answer) {
 
 // A fault in the interpreter's own code on one of its other threads.
 bool IsFaultOfRubyThread(const EXCEPTION_RECORD& fault) {
-  return fault.ExceptionCode >= 0xC0000000 && !Interpreter::IsMainThread() && IsRubyThread() &&
-         IsRubyCode(fault.ExceptionAddress);
+  return !Interpreter::IsMainThread() && IsRubyThread() && IsRubyCode(fault.ExceptionAddress);
 }
 
 // It loses the interpreter as one on the main thread does, as soon as that has come to the task's end.
