@@ -16,6 +16,7 @@ constexpr DWORD kUnstoppable = 0xE0525542;
 HANDLE wakeEvent = nullptr;  // made once, before the first macro
 VALUE interrupterThread = Qnil;
 VALUE mainThread = Qnil;
+bool waiting = false;  // the thread has come to its first wait
 
 constexpr DWORD kGrace = 500;  // milliseconds for `ensure` blocks
 
@@ -83,6 +84,7 @@ void WaitGrace(unsigned task) {
 }
 
 VALUE Interrupt(void*) {
+  waiting = true;
   for (;;) {
     Wait(INFINITE);
     while (Interpreter::InterruptDue() != Interpreter::Urgency::kNone) {
@@ -107,7 +109,9 @@ void Interrupter::EnsureAlive() {
   }
   if (interrupterThread != Qnil && RTEST(rb_funcall(interrupterThread, rb_intern("alive?"), 0)))
     return;
+  waiting = false;
   interrupterThread = rb_thread_create(Interrupt, nullptr);
+  while (!waiting) rb_thread_schedule();  // else a macro could be slow to let it start
   rb_funcall(rb_const_get(rb_cObject, rb_intern("ActiveScript")), rb_intern("interrupter="), 1,
              interrupterThread);
 }

@@ -126,11 +126,15 @@ TEST(Ending, Interrupts) {
   host.item.Add("f");
   double longest = 0;
   CheckTranscript("interrupts.txt", [&](const std::string& macro) {
-    const double elapsed = Interrupted(host, "@item.go\n" + macro);
-    // What does not let itself be ended gets a grace first.
-    const bool resists = macro.find("# resists") != std::string::npos;
-    EXPECT_LT(elapsed, resists ? 1500 : 400) << macro;
-    if (!resists) longest = std::max(longest, elapsed);
+    // What does not let itself be ended gets a grace first. The best of three, on busy machines.
+    const double most = macro.find("# resists") != std::string::npos ? 1500 : 200;
+    double elapsed = most;
+    for (int i = 0; i < 3 && elapsed >= most; ++i) {
+      TakeLog();
+      elapsed = Interrupted(host, "@item.go\n" + macro);
+    }
+    EXPECT_LT(elapsed, most) << macro;
+    if (most < 1000) longest = std::max(longest, elapsed);
     const std::string log = TakeLog();  // no error, and nothing left over
     EXPECT_EQ("item.f(I4 1)", host.Run("@item.f 1")) << macro;
     return log;
@@ -212,8 +216,15 @@ TEST(Ending, Soak) {
   repeat("stops", Count(), leaveOnce);
   leave = Leave::kFault;
   repeat("faults", Count(), leaveOnce);
-  repeat("interrupts", Count(),
-         [&] { Interrupted(host, "@kept = 'x' * 10_000; @item.go; loop { }", 0); });
+  std::vector<double> waits;
+  repeat("interrupts", Count(), [&] {
+    waits.push_back(Interrupted(host, "@kept = 'x' * 10_000; @item.go; loop { }", 0));
+  });
+  std::sort(waits.begin(), waits.end());
+  const double most = waits[waits.size() * 98 / 100];
+  std::cout << "[ interrupts ] ms: half within " << waits[waits.size() / 2] << ", 98 % within "
+            << most << ", all within " << waits.back() << std::endl;
+  EXPECT_LT(most, 200);
   repeat("runs", 10 * Count(), [&] {
     EXPECT_EQ(
         "",
