@@ -6,18 +6,15 @@
 #   lib/       libmsvcrt-ruby310.dll.a
 #   ruby/      what a Windows machine needs: bin, lib/ruby/3.1.0, licenses. It works wherever it is copied.
 #   samples/   the package's own test/ruby, sample and benchmark, and tool/lib, which the tests need
-# The folder is in a cache outside the build folder and appears in one rename, so it is whole or not
-# there. Changing a command here makes another one. Call it before taking the build lock: it takes that itself.
 set -euo pipefail
-source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
+source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/cross-build.sh"
 
-PACKAGES+=(ruby dpkg-dev)
+PACKAGES+=(ruby)
 
+SOURCE=ruby3.1
 PACKAGE_VERSION=3.1.2-7+deb12u1
-VERSION=${PACKAGE_VERSION%%-*}
 API=3.1.0
 ARCH=i386-mingw32
-HOST=i686-w64-mingw32
 
 # Each needs a library that is not there for Windows, or serves none there.
 LEFT_OUT=openssl,readline,readline-ext,zlib,dbm,gdbm,fiddle,psych,pty,syslog,socket
@@ -29,34 +26,10 @@ UNUSABLE=(
   bundler bundler.rb debug.rb irb irb.rb mkmf.rb rdoc rdoc.rb reline reline.rb un.rb
 )
 
-CACHE=${SCRIPTRUBY_CACHE:-$HOME/.cache/scriptruby}
-RECIPE=$(grep -v '^ *#' "${BASH_SOURCE[0]}" | sha256sum)
-NAME=cruby-$VERSION-${RECIPE:0:12}
-RESULT=$CACHE/$NAME
-
-# A list of its own: the machine's sources stay as they are, and root is not needed.
-fetch_source() {
-  local codename mirror
-  codename=$(. /etc/os-release && printf %s "$VERSION_CODENAME")
-  mirror=$(apt-get indextargets --format '$(SITE)' "Codename: $codename" | head -n 1)
-  local apt=(
-    apt-get -o Dir::Etc::sourcelist="$WORK/source.list" -o Dir::Etc::sourceparts=-
-    -o Dir::State::lists="$WORK/lists" -o Dir::Cache::pkgcache= -o Dir::Cache::srcpkgcache=
-    -o APT::Sandbox::User=root -o APT::Update::Error-Mode=any
-  )
-  printf 'deb-src [signed-by=%s] %s %s main\n' /usr/share/keyrings/debian-archive-keyring.gpg \
-    "${mirror:-http://deb.debian.org/debian}" "$codename" >"$WORK/source.list"
-  mkdir -p "$WORK/lists/partial" &&
-    "${apt[@]}" update &&
-    "${apt[@]}" source "ruby3.1=$PACKAGE_VERSION" &&
-    mv "ruby3.1-$VERSION" source &&
-    touch source/configure && # newer than the patched configure.ac, so autoconf is not called for
-    rm -r source/ext/-test-
-}
-
-# The static libgcc leaves only system DLLs to import; the blank option drops debug information.
+# The static libgcc leaves only system DLLs to import; the blank option drops debug information. With
+# a configure that is newer than the patched configure.ac, autoconf is not called for.
 configure_ruby() (
-  mkdir build && cd build &&
+  touch source/configure && rm -r source/ext/-test- && mkdir build && cd build &&
     ../source/configure --build=x86_64-linux-gnu --host=$HOST --prefix=/ --with-baseruby=/usr/bin/ruby \
       CC=$HOST-gcc-posix CXX=$HOST-g++-posix LDFLAGS=-static-libgcc optflags=-O2 debugflags= \
       --enable-shared --disable-jit-support --disable-install-doc --without-gmp --with-out-ext=$LEFT_OUT
@@ -122,32 +95,12 @@ check_runtime() {
   '
 }
 
-# What an interrupted build left behind goes away; the lock says that nobody works there.
-build_ruby() {
-  rm -rf "$CACHE"/.cruby-*
-  WORK=$(mktemp -d "$CACHE/.$NAME.XXXXXX")
-  cd "$WORK"
-  step "fetching the source of CRuby $PACKAGE_VERSION" fetch_source
+build() {
   step "configuring CRuby" configure_ruby
   step "building CRuby (some minutes)" make -C build -j "$(nproc)"
   step "installing CRuby" install_ruby
   step "collecting CRuby" collect
   step "checking CRuby" check_runtime
-  chmod 755 result
-  mv -T result "$RESULT"
-  cd "$CACHE"
-  rm -rf "$WORK"
 }
 
-if [ ! -d "$RESULT" ]; then
-  [[ $CACHE != *[[:space:]]* ]] || die "CRuby cannot be built in a folder with a blank: set SCRIPTRUBY_CACHE"
-  mkdir -p "$BUILD" "$CACHE"
-  exec 9>"$BUILD/.lock"
-  flock 9
-  set_up
-  exec 9>"$CACHE/.lock"
-  flock 9
-  [ -d "$RESULT" ] || build_ruby
-  say "CRuby $VERSION: $(du -sh "$RESULT/ruby" | cut -f 1) for Windows in $RESULT"
-fi
-printf '%s\n' "$RESULT"
+print_cached cruby

@@ -45,9 +45,7 @@ VALUE MacroTask::PrepareBody(VALUE data) {
 
 VALUE MacroTask::Compile() {
   // A unit that is no byte shows that this text is not an 8-bit host's.
-  TextForm form = half.form;
-  for (UINT i = 0; i < SysStringLen(text); ++i)
-    if (text[i] > 0xFF) form = TextForm::kUtf16;
+  const TextForm form = HoldsBytes(text, SysStringLen(text)) ? half.form : TextForm::kUtf16;
   return rb_funcall(half.context, rb_intern("compile"), 4, StringOf(text, form),
                     ULONG2NUM(firstLine + 1), ULONG2NUM(cookie), persistent ? Qtrue : Qfalse);
 }

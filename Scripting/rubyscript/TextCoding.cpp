@@ -81,14 +81,19 @@ static bool NamesItsEncoding(const wchar_t* text) {
   return false;
 }
 
-bool IsByteText(const wchar_t* text) {
-  const size_t units = wcslen(text);
-  for (size_t i = 0; i < units; ++i)
+bool HoldsBytes(const wchar_t* text, UINT units) {
+  for (UINT i = 0; i < units; ++i)
     if (text[i] > 0xFF) return false;
+  return true;
+}
+
+bool IsByteText(const wchar_t* text) {
+  const UINT units = static_cast<UINT>(wcslen(text));
+  if (!HoldsBytes(text, units)) return false;
   if (units == 0 || NamesItsEncoding(text)) return true;
   char* const bytes = static_cast<char*>(malloc(units));
   if (!bytes) return false;
-  for (size_t i = 0; i < units; ++i) bytes[i] = static_cast<char>(text[i]);
+  for (UINT i = 0; i < units; ++i) bytes[i] = static_cast<char>(text[i]);
   const int length = static_cast<int>(units);
   const bool valid =
       MultiByteToWideChar(CP_UTF8, MB_ERR_INVALID_CHARS, bytes, length, nullptr, 0) > 0;

@@ -33,6 +33,9 @@ UINT TextFromHost(const wchar_t* text, UINT units, TextForm form, TextOrigin ori
 // them apart, which all single-byte code pages do. `target` as above; returns its bytes.
 UINT BytesFromAnsi(UINT codePage, const wchar_t* text, UINT units, char* target);
 
+// Whether each unit is a byte.
+bool HoldsBytes(const wchar_t* text, UINT units);
+
 // Whether a macro's text can be an 8-bit host's: each unit a byte, the bytes UTF-8 or in an encoding
 // that the text itself names in a comment. A macro in the ANSI code page is not: as characters, it
 // serves an 8-bit host as it does an ordinary one.

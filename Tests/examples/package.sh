@@ -1,0 +1,54 @@
+#!/bin/sh
+# SPDX-License-Identifier: MIT
+# package.sh SOURCE_FOLDER: the zip, unpacked into a folder with a blank and letters beyond ASCII, for
+# a user on whose machine nothing else is.
+folder=$(mktemp -d)
+export WINEARCH=win32 WINEDEBUG=-all LC_ALL=C.UTF-8
+failed=0
+fail() {
+  echo "FAILED: $*"
+  failed=1
+}
+
+"$1/scripts/package.sh" "$folder/package.zip" > "$folder/log" 2>&1 || fail "package.sh: $(cat "$folder/log")"
+export WINEPREFIX="$folder/prefix"
+trap 'wineserver -k; rm -rf "$folder"' EXIT
+mkdir "$folder/Käse & Brot" "$folder/Süße Macros"
+cd "$folder/Käse & Brot" || exit 1
+cmake -E tar xf ../package.zip
+cd scriptruby-* || exit 1
+package=$PWD
+wineboot -i > "$folder/log" 2>&1
+wine reg add 'HKCU\Software\Wine\Drivers' /v Graphics /d null /f > "$folder/log" 2>&1
+
+# By command line, from elsewhere
+cd Examples || exit 1
+timeout 60 wine ../macrorun.exe csv-to-table.rbs csv-to-table.in > "$folder/out" 2> "$folder/err"
+cmp "$folder/out" csv-to-table.out || fail "macrorun: $(cat "$folder/err")"
+timeout 60 wine ../macrorun.exe sort-unique.js sort-unique.in > "$folder/out" 2> "$folder/err"
+cmp "$folder/out" sort-unique.out || fail "macrorun with JScript: $(cat "$folder/err")"
+
+# By double click and by dropping a macro, which both have the shell start a file
+cd .. || exit 1
+timeout 60 wine cmd /c try-example.cmd < /dev/null > "$folder/out" 2>&1
+grep -q '| Jürgen Groß ' "$folder/out" || fail "try-example.cmd: $(cat "$folder/out")"
+printf 'line\n' > '../../Süße Macros/mark.in'
+echo 'File.write("ran.txt", @tarn.get_line(1))' > '../../Süße Macros/mark.rbs'
+timeout 60 wine start /unix "$package/run-macro.cmd" \
+  "$(wine winepath -w "$folder/Süße Macros/mark.rbs" 2> /dev/null | tr -d '\r')" > "$folder/log" 2>&1
+tries=0
+until [ -s "$folder/Süße Macros/ran.txt" ] || [ $((tries += 1)) -gt 300 ]; do sleep 0.1; done
+[ "$(cat "$folder/Süße Macros/ran.txt")" = line ] || fail "run-macro.cmd: $(cat "$folder/log")"
+
+# Registered, and not any more
+class='HKCU\Software\Classes\RubyScript\CLSID'
+timeout 60 wine cmd /c register.cmd < /dev/null > "$folder/out" 2>&1 || fail "register.cmd: $(cat "$folder/out")"
+wine reg query "$class" > "$folder/log" 2>&1 || fail "register.cmd has not registered"
+timeout 60 wine cmd /c unregister.cmd < /dev/null > "$folder/out" 2>&1 || fail "unregister.cmd: $(cat "$folder/out")"
+! wine reg query "$class" > "$folder/log" 2>&1 || fail "unregister.cmd has not unregistered"
+
+# What has to travel with it
+for file in LICENSE README.md licenses/pcre2-LICENCE ruby/licenses/COPYING Docs/macrorun.md; do
+  [ -s "$file" ] || fail "no $file in the package"
+done
+exit $failed

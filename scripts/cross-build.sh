@@ -1,0 +1,61 @@
+# SPDX-License-Identifier: MIT
+# shellcheck shell=bash
+# What build-cruby.sh and build-pcre2.sh share: they cross-build the source package SOURCE, pinned to
+# PACKAGE_VERSION, for 32-bit Windows and print the folder that holds the outcome. It is in a cache
+# outside the build folder and appears in one rename, so it is whole or not there. Changing a command
+# here or in the caller makes another one. It takes the build lock by itself: call it before.
+source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
+
+PACKAGES+=(dpkg-dev)
+
+HOST=i686-w64-mingw32
+CACHE=${SCRIPTRUBY_CACHE:-$HOME/.cache/scriptruby}
+RECIPE=$(grep -hv '^ *#' "$0" "${BASH_SOURCE[0]}" | sha256sum)
+
+# A list of its own: the machine's sources stay as they are, and root is not needed.
+fetch_source() {
+  local codename mirror
+  codename=$(. /etc/os-release && printf %s "$VERSION_CODENAME")
+  mirror=$(apt-get indextargets --format '$(SITE)' "Codename: $codename" | head -n 1)
+  local apt=(
+    apt-get -o Dir::Etc::sourcelist="$WORK/source.list" -o Dir::Etc::sourceparts=-
+    -o Dir::State::lists="$WORK/lists" -o Dir::Cache::pkgcache= -o Dir::Cache::srcpkgcache=
+    -o APT::Sandbox::User=root -o APT::Update::Error-Mode=any
+  )
+  printf 'deb-src [signed-by=%s] %s %s main\n' /usr/share/keyrings/debian-archive-keyring.gpg \
+    "${mirror:-http://deb.debian.org/debian}" "$codename" >"$WORK/source.list"
+  mkdir -p "$WORK/lists/partial" &&
+    "${apt[@]}" update &&
+    "${apt[@]}" source "$SOURCE=$PACKAGE_VERSION" &&
+    mv "$SOURCE-${PACKAGE_VERSION%%-*}" source
+}
+
+# What an interrupted build left behind goes away; the lock says that nobody works there.
+build_into_cache() {
+  local name=$1 result=$2
+  rm -rf "$CACHE/.$name"-*
+  WORK=$(mktemp -d "$CACHE/.$name-XXXXXX")
+  cd "$WORK"
+  step "fetching the source of $SOURCE $PACKAGE_VERSION" fetch_source
+  build # in the folder WORK, out of `source`: makes `result`
+  chmod 755 result
+  mv -T result "$result"
+  cd "$CACHE"
+  rm -rf "$WORK"
+}
+
+# print_cached NAME: builds with the caller's function `build` what is not in the cache under that name.
+print_cached() {
+  local name=$1 result=$CACHE/$1-${PACKAGE_VERSION%%-*}-${RECIPE:0:12}
+  if [ ! -d "$result" ]; then
+    [[ $CACHE != *[[:space:]]* ]] || die "$name cannot be built in a folder with a blank: set SCRIPTRUBY_CACHE"
+    mkdir -p "$BUILD" "$CACHE"
+    exec 9>"$BUILD/.lock"
+    flock 9
+    set_up
+    exec 9>"$CACHE/.lock"
+    flock 9
+    [ -d "$result" ] || build_into_cache "$name" "$result"
+  fi
+  printf '%s\n' "$result"
+}
