@@ -1,0 +1,40 @@
+#!/bin/sh
+# SPDX-License-Identifier: MIT
+# guide.sh MACRORUN FAKE_MODULE: what the guide for authors of macros shows does what it says.
+. "$(dirname "$0")/runner.sh"
+guide=$(dirname "$0")/../../Docs/writing-macros.md
+[ "${guide#/}" != "$guide" ] || guide=$OLDPWD/$guide
+
+# Macros, and the texts before and after that follow some of them
+awk '/^```ruby$/ { n++; file = n ".rbs"; next }
+     /^```text before$/ { file = n ".in"; next }
+     /^```text after$/ { file = n ".out"; next }
+     /^```/ { file = ""; next }
+     file { print > file }' "$guide"
+ran=0
+for macro in *.rbs; do
+  expect 0 '' --check "$macro"
+  name=${macro%.rbs}
+  [ -f "$name.out" ] || continue
+  expect 0 '' "$macro" "$name.in"
+  diff "$name.out" out > difference || fail "$(cat "$macro"): $(cat difference)"
+  ran=$((ran + 1))
+done
+[ $ran -ge 3 ] || fail "only $ran macros with texts found in $guide"
+
+# run CODE TEXT WORD [OPTION...]: the macro with that word in it, over the file text
+run() {
+  code=$1 text=$2 macro=$(grep -l -- "$3" ./*.rbs)
+  shift 3
+  expect "$code" "$text" "$macro" text "$@"
+}
+printf 'a Colour and colour\n' > text
+run 0 '2 replaced' colour
+expect_lines out 'a color and color'
+printf 'one\ntwo\n' > text
+run 0 '' prefix --arg 'prefix=| '
+expect_lines out '| one' '| two'
+printf '{"a": [1' > text
+run 1 'This is no JSON' JSON.parse
+
+finish
