@@ -70,6 +70,7 @@ int main() {
   PrepareStandardError();
   // A file that is no library is an error message, not a system dialog.
   SetErrorMode(SEM_FAILCRITICALERRORS | SEM_NOOPENFILEERRORBOX);
+  SetDllDirectoryW(L"");  // no library comes from the folder of the text
   Options options;
   if (const std::optional<int> finished = ParseOptions(options)) return *finished;
   Reporter reporter(options.jsonErrors ? Reporter::Form::kJson : Reporter::Form::kText);
