@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: MIT */
 /*
- * The smallest host of scriptruby.dll that is worth the name: it runs one macro, which calls four
+ * The smallest host of scriptruby.dll that is worth the name: it runs one macro, which calls
  * functions of ours, and Ctrl+C stops it. Plain C, one file, no header of the module's.
  *
  *   minimal_host.exe FULL-PATH-OF-scriptruby.dll MACRO
@@ -8,7 +8,7 @@
  * Build it for 32-bit Windows with any compiler:
  *   i686-w64-mingw32-gcc minimal_host.c -o minimal_host.exe
  *   clang --target=i686-w64-mingw32 minimal_host.c -o minimal_host.exe
- *   cl minimal_host.c
+ *   cl /std:c11 minimal_host.c
  *
  * The module calls C++ member functions of the Microsoft ABI: the object in ecx, the arguments on
  * the stack, which the callee clears. In C that is __fastcall with a second argument that is not
@@ -144,7 +144,10 @@ static void AnswerText(Host* host, const char* characters) {
   host->record.resultKind = 1;
 }
 
-static void AnswerInteger(Host* host, int32_t value) { host->record.integerResult = value; }
+static void AnswerNumber(Host* host, double value) {
+  const double fitting = value > INT32_MAX ? INT32_MAX : value < INT32_MIN ? INT32_MIN : value;
+  host->record.integerResult = (int32_t)fitting;
+}
 
 /* --- The macro functions: a number for each, not 0 ------------------------------------------- */
 
@@ -167,7 +170,7 @@ static void Add(Host* host) {
   const Argument* argument;
   for (int32_t i = 0; (argument = ArgumentAt(host, i)) != NULL; ++i)
     if (argument->kind != 1) sum += argument->real;
-  AnswerInteger(host, (int32_t)sum);
+  AnswerNumber(host, sum);
 }
 
 /* user_name() -> text */

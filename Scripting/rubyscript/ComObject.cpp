@@ -197,6 +197,16 @@ VALUE TakeResult(Invocation& call, TextForm form) {
   return holdsObjects ? rb_ensure(ConvertResult, data, ClearOnHost, data) : ConvertResult(data);
 }
 
+// Of a call that came back just before the macro was interrupted. The host's objects are released
+// where others are that nobody needs any more.
+void DropResult(Invocation& call, TextForm form) {
+  call.FreeException();
+  if (call.result.vt == VT_DISPATCH)
+    TakeResult(call, form);
+  else if (call.result.vt == VT_BSTR)
+    SysFreeString(call.result.bstrVal);
+}
+
 // Fills COM's last-first order; the object keeps its own reference. False: no memory.
 bool FillArguments(const Wrapped& wrapped, Invocation& call, const VALUE* arguments) {
   const int count = static_cast<int>(call.parameters.cArgs);
@@ -230,7 +240,10 @@ VALUE Invoke(const Wrapped& wrapped, VALUE name, DISPID id, WORD flags, int coun
   for (int i = 0; i < count; ++i) VariantClear(&call.parameters.rgvarg[i]);
   if (count > kFewArguments) free(call.parameters.rgvarg);
   if (!filled) rb_memerror();
-  if (!goesOn) LeaveTask();
+  if (!goesOn) {
+    DropResult(call, wrapped.form);
+    LeaveTask();
+  }
   if (FAILED(call.outcome)) RaiseInvocationFailure(wrapped, name, call);
   return flags & DISPATCH_PROPERTYGET ? TakeResult(call, wrapped.form) : arguments[count - 1];
 }

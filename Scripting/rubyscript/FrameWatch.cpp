@@ -13,7 +13,7 @@ static constexpr DWORD kUnwinding = EXCEPTION_UNWINDING | EXCEPTION_EXIT_UNWIND;
 // --- FrameWatch ----------------------------------------------------------------------------------
 
 FrameWatch::FrameWatch(void (*callback)(void*), void* callbackContext)
-    : record{static_cast<Record*>(ChainHead()), Handle},
+    : record{static_cast<HandlerRecord*>(ChainHead()), Handle},
       discarded(callback),
       context(callbackContext) {
   SetChainHead(&record);
@@ -36,7 +36,7 @@ static FaultBase* base = nullptr;
 
 FaultBase::FaultBase(EXCEPTION_RECORD& target, void (*landing)(), IsThreadFault isFault,
                      void (*threadEnd)())
-    : record{static_cast<Record*>(ChainHead()), Handle},
+    : record{static_cast<HandlerRecord*>(ChainHead()), Handle},
       fault(target),
       land(landing),
       isThreadFault(isFault),

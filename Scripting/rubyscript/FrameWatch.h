@@ -9,6 +9,13 @@
 
 #include <windows.h>
 
+// As the system defines it.
+struct HandlerRecord {
+  HandlerRecord* next;
+  EXCEPTION_DISPOSITION(__cdecl* handle)(EXCEPTION_RECORD* record, void* frame, CONTEXT* context,
+                                         void* dispatcher);
+};
+
 // Calls `discarded(context)` when its frame is left by a fault that an outer frame has caught, or by
 // a jump. The call is made on top of the discarded frames, before they are gone; it must return.
 class FrameWatch {
@@ -21,11 +28,7 @@ class FrameWatch {
  private:
   static EXCEPTION_DISPOSITION __cdecl Handle(EXCEPTION_RECORD* record, void* frame,
                                               CONTEXT* context, void* dispatcher);
-  struct Record {
-    Record* next;
-    decltype(&Handle) handle;
-  };
-  Record record;  // first: the chain's records are found by their own address
+  HandlerRecord record;  // first: the chain's records are found by their own address
   void (*discarded)(void*);
   void* context;
 };
@@ -58,11 +61,7 @@ class FaultBase {
   void RedirectThread(const EXCEPTION_RECORD& record, CONTEXT& context);
   bool Take(const EXCEPTION_RECORD& record, CONTEXT& context);
 
-  struct Record {
-    Record* next;
-    decltype(&Handle) handle;
-  };
-  Record record;
+  HandlerRecord record;
   EXCEPTION_RECORD& fault;
   EXCEPTION_RECORD threadFault = {};
   void (*land)();

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: MIT
 // The process-wide state that belongs to the host and that CRuby or a script may change: a snapshot
-// of it is taken before a run and put back after it. It covers the locale, the signal handlers and
-// the modes of the standard streams and the file mask of msvcrt, the error mode, the current directory and the
-// environment. The floating-point control words are switched elsewhere, with the fibers.
+// of it is taken before a run and put back after it. It covers the locale, the signal handlers, the
+// modes of the standard streams and the file mask of msvcrt, the error mode, the current directory
+// and the environment. The floating-point control words are switched elsewhere, with the fibers.
 //
 // The variables that CRuby adds to the environment when it starts (HOME and the like) are for
 // scripts only. The order of calls is therefore, where CRuby is started,

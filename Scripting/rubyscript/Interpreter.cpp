@@ -14,7 +14,6 @@ namespace {
 struct Entry {
   RubyTask* task;
   Entry* outer;
-  const void* hostFrame;  // address in the frame of Enter; stacks grow downwards
   unsigned number;
   bool abandoned = false;
   bool interrupted = false;
@@ -40,9 +39,8 @@ struct State {
   void* hostFiber = nullptr;  // of the latest switch; a host may use fibers itself
   bool started = false;
   Message message = Message::kStart;
-  RubyTask* task = nullptr;         // of kBegin
-  const void* hostFrame = nullptr;  // of kBegin
-  HostCall* call = nullptr;         // of kCall
+  RubyTask* task = nullptr;  // of kBegin
+  HostCall* call = nullptr;  // of kCall
   Entry* innermost = nullptr;
   unsigned tasks = 0;  // so far
   EXCEPTION_RECORD fault = {};
@@ -88,7 +86,7 @@ void OnAbort(int) {
 
 // With the process as a macro may change it.
 void RunTask() {
-  Entry entry = {state.task, state.innermost, state.hostFrame, ++state.tasks};
+  Entry entry = {state.task, state.innermost, ++state.tasks};
   entry.process.Save();
   signal(SIGABRT, OnAbort);
   SetInnermost(&entry);
@@ -164,14 +162,6 @@ void OnFrameDiscarded(void* entry) {
     if (each == entry) return AbandonUpTo(each);
 }
 
-// For hosts whose jumps do not unwind: on one stack, a frame further in than this one is dead.
-void AbandonDeadEntries(const void* frame) {
-  const NT_TIB& stack = *reinterpret_cast<NT_TIB*>(NtCurrentTeb());
-  while (state.innermost && !Interpreter::LostTo() && state.innermost->hostFrame < frame &&
-         state.innermost->hostFrame >= stack.StackLimit)
-    Abandon(state.innermost);
-}
-
 HRESULT CreateRubyFiber() {
   if (!IsThreadAFiber() && !ConvertThreadToFiber(nullptr)) return E_OUTOFMEMORY;
   constexpr SIZE_T kCommitted = 64 * 1024;
@@ -220,10 +210,8 @@ HRESULT Interpreter::Start() {
 }
 
 HRESULT Interpreter::Enter(RubyTask* task) {
-  AbandonDeadEntries(&task);
   if (LostTo()) return E_ABORT;
   state.task = task;
-  state.hostFrame = &task;
   SwitchToRuby(Message::kBegin);
   for (;;) {
     if (LostTo()) RaiseFault();

@@ -10,11 +10,12 @@
 //     returns  -------------------------------->    goes on
 //   returns  <----------------------------------  is done
 //
-// Around each task the host's process state is put back (see HostProcess.h). When the host discards the frame of a call, the pending CallHost answers false, the task unwinds
-// its Ruby code (`ensure` blocks run, but no further call is made) and is deleted.
+// Around each task the host's process state is put back (see HostProcess.h). When the host discards
+// the frame of a call, the pending CallHost answers false, the task unwinds its Ruby code (`ensure`
+// blocks run, but no further call is made) and is deleted.
 //
-// Threading: everything is called on the interpreter's thread, except Interrupt, IsRunning and HasStarted. "Host
-// side" functions are called on the host's stack, "Ruby side" ones on the interpreter's.
+// Threading: the interpreter's thread, unless said otherwise. "Host side" functions are called on the
+// host's stack, "Ruby side" ones on the interpreter's.
 // Errors: as given at each function. A fault inside the interpreter leaves it lost for good.
 #pragma once
 
@@ -47,18 +48,19 @@ class Interpreter {
   // Any thread. Once started the interpreter cannot be ended: its DLL stays in the process.
   static bool HasStarted();
 
-  // Host side. Starts the interpreter when this is the first use. RPC_E_WRONG_THREAD: it lives on
-  // another thread. E_OUTOFMEMORY: a later try may start it. E_FAIL: it does not start. E_ABORT: lost.
+  // Host side, any thread. Starts the interpreter when this is the first use. RPC_E_WRONG_THREAD: it
+  // lives on another thread. E_OUTOFMEMORY: a later try may start it. E_FAIL: it does not start.
+  // E_ABORT: lost.
   static HRESULT Start();
   // Host side, after a successful Start: runs the task and serves its calls. S_OK: it has run and is
-  // the caller's to delete; E_ABORT: it cannot go on, and is not the caller's any more. Raises the fault of an
-  // interpreter that gets lost, as a structured exception of the same code. If the caller's frame is
-  // discarded, the task is deleted.
+  // the caller's to delete; E_ABORT: it cannot go on, and is not the caller's any more. Raises the
+  // fault of an interpreter that gets lost, as a structured exception of the same code. If the
+  // caller's frame is discarded, the task is deleted.
   static HRESULT Enter(RubyTask* task);
-  // Host side. The exception code that lost the interpreter; 0 while it is whole.
+  // Any thread. The exception code that lost the interpreter; 0 while it is whole.
   static DWORD LostTo();
-  // Any thread. Ends what runs for the owner, and what is nested into it: within a few milliseconds when it is in Ruby code, at
-  // the call's return when it is in a call of the host.
+  // Any thread. Ends what runs for the owner, and what is nested into it: within a tenth of a second
+  // when it is in Ruby code, at the call's return when it is in a call of the host.
   static void Interrupt(const void* owner);
   // Any thread. Whether a task of the owner is under way, perhaps in a call of the host.
   static bool IsRunning(const void* owner);

@@ -112,8 +112,9 @@ void Interrupter::EnsureAlive() {
   waiting = false;
   interrupterThread = rb_thread_create(Interrupt, nullptr);
   while (!waiting) rb_thread_schedule();  // else a macro could be slow to let it start
-  rb_funcall(rb_const_get(rb_cObject, rb_intern("ActiveScript")), rb_intern("interrupter="), 1,
-             interrupterThread);
+  // Else it gives the macro the next tenth of a second, too, when one has gone by as it gets its turn.
+  rb_funcall(interrupterThread, rb_intern("priority="), 1, INT2FIX(3));
+  rb_funcall(ActiveScriptModule(), rb_intern("interrupter="), 1, interrupterThread);
 }
 
 void Interrupter::StopMainThread() {

@@ -30,8 +30,10 @@ VALUE MacroTask::PrepareBody(VALUE data) {
   Interrupter::EnsureAlive();
   if (!task.half.context) {
     const VALUE isByteHost = task.half.form == TextForm::kBytes ? Qtrue : Qfalse;
-    rb_gc_register_address(&task.half.context);  // first: it may collect
-    task.half.context = rb_funcall(ActiveScriptConst("Context"), rb_intern("new"), 1, isByteHost);
+    const volatile VALUE context =  // collecting finds it on the stack
+        rb_funcall(ActiveScriptConst("Context"), rb_intern("new"), 1, isByteHost);
+    task.half.context = context;
+    rb_gc_register_address(&task.half.context);
   }
   for (NamedItem* item = task.items; item; item = item->next) {
     if (!item->dispatch) continue;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // What a script engine has done in the interpreter: compile a text, run what is compiled, call a
-// macro's function. Around each one the engine's context is entered and left (see prelude/context.rb), and
-// the host's process state is put back (see HostProcess.h).
+// macro's function. Around each one the engine's context is entered and left (prelude/context.rb),
+// and the host's process state is put back (see HostProcess.h).
 //
 // Ownership: as RubyTask. What a task points to belongs to the engine and outlives the task, which
 // may go on after the host has jumped away; what it holds itself goes with it.

@@ -77,9 +77,13 @@ void LeaveTask() {
   rb_raise(StopClass(), "the macro has been stopped");
 }
 
+VALUE ActiveScriptModule() {
+  static const VALUE module = rb_path2class("ActiveScript");
+  return module;
+}
+
 VALUE ActiveScriptConst(const char* name) {
-  const VALUE module = rb_const_get(rb_cObject, rb_intern("ActiveScript"));
-  return rb_const_get(module, rb_intern(name));
+  return rb_const_get(ActiveScriptModule(), rb_intern(name));
 }
 
 VALUE StopClass() {

@@ -21,7 +21,8 @@ Outcome Send(VALUE receiver, const char* method, int count, const VALUE* argumen
 // Leaves the innermost task: its `ensure` blocks run, no `rescue` takes it.
 [[noreturn]] void LeaveTask();
 
-// A constant of the engine's own module `ActiveScript`.
+// The engine's own module, and a constant of it.
+VALUE ActiveScriptModule();
 VALUE ActiveScriptConst(const char* name);
 // `ActiveScript::Stop`, what an interrupted macro ends with where it cannot be left otherwise.
 VALUE StopClass();

@@ -83,7 +83,7 @@ class ScriptEngine::Call {
  private:
   static void End(void* context) {
     Call& call = *static_cast<Call*>(context);
-    --call.engine->calls;
+    if (--call.engine->calls == 0) call.engine->closing = false;
     if (call.site) call.site->Release();
     call.engine->Release();
   }
@@ -125,6 +125,7 @@ HRESULT ScriptEngine::GetScriptSite(REFIID riid, void** object) {
 
 HRESULT ScriptEngine::InitNew() {
   if (initialized || state == SCRIPTSTATE_CLOSED) return E_UNEXPECTED;
+  if (site && thread != GetCurrentThreadId()) return E_UNEXPECTED;
   const Call call(this);
   initialized = true;
   if (site) ChangeState(SCRIPTSTATE_INITIALIZED);
@@ -245,7 +246,7 @@ void ScriptEngine::Reset(bool all) {
 // It has to be the name of an instance variable.
 static bool IsIdentifier(LPCOLESTR name) {
   const auto isLetter = [](wchar_t unit) {
-    return (unit | 0x20) >= 'a' && (unit | 0x20) <= 'z' ? true : unit == '_' || unit >= 0x80;
+    return ((unit | 0x20) >= 'a' && (unit | 0x20) <= 'z') || unit == '_' || unit >= 0x80;
   };
   if (!isLetter(*name)) return false;
   for (; *name; ++name)
@@ -410,7 +411,7 @@ HRESULT ScriptEngine::Enter(MacroTask* task, EXCEPINFO* exception) {
 
 // Takes over the error.
 HRESULT ScriptEngine::Report(ScriptError* error, EXCEPINFO* exception) {
-  const bool taken = site && SUCCEEDED(site->OnScriptError(error));
+  const bool taken = SUCCEEDED(site->OnScriptError(error));
   if (!taken) error->Fill(exception);
   error->Release();
   return taken ? SCRIPT_E_REPORTED : DISP_E_EXCEPTION;

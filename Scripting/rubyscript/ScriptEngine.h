@@ -12,8 +12,8 @@
 // The host may call the engine back from what the engine calls; it may also leave its frames then by
 // a jump or a fault, and need not come back. Closing waits for the outermost call to end, resetting is
 // refused until then.
-// Threading: the thread of SetScriptSite; others get E_UNEXPECTED. AddRef, Release, GetScriptState,
-// InterruptScriptThread and the questions about threads may come from any thread.
+// Threading: the thread of SetScriptSite; others get E_UNEXPECTED. AddRef, Release, GetScriptSite,
+// GetScriptState, InterruptScriptThread and the questions about threads may come from any thread.
 //
 // Next on the reader's path: MacroTask, Interpreter.
 #pragma once

@@ -17,19 +17,13 @@ constexpr long kMostBytesToByteHost = 512;
 
 constexpr int kMostNesting = 32;  // of arrays
 
-// The time's days since 30 December 1899, which the engine's Ruby part computes.
-VALUE OleDateClass() {
-  static const VALUE type = ActiveScriptConst("OleDate");
-  return type;
-}
-
 VALUE PassableInteger(VALUE value) {
   if (FIXNUM_P(value)) return value;
   if (rb_absint_size(value, nullptr) < sizeof(LONG_LONG)) {
     const LONG_LONG integer = NUM2LL(value);
     if (integer == static_cast<LONG>(integer)) return value;
   }
-  const double real = RFLOAT_VALUE(rb_funcall(value, rb_intern("to_f"), 0));
+  const double real = rb_big2dbl(value);
   const bool finite = real - real == 0;
   if (!finite || !RTEST(rb_equal(rb_dbl2big(real), value)))
     rb_raise(rb_eRangeError, "integer too big to pass exactly to a COM object: %" PRIsVALUE, value);
@@ -73,12 +67,11 @@ VALUE PassableArray(VALUE array, TextForm form, int nesting) {
 }
 
 VALUE PassableObject(VALUE value, TextForm form, int nesting) {
-  if (rb_obj_class(value) == OleDateClass()) return value;
   if (IsComObject(value)) {
     if (!DispatchOf(value)) rb_raise(rb_eArgError, "the COM object is gone: its engine is closed");
     return value;
   }
-  const VALUE date = rb_funcall(rb_path2class("ActiveScript"), rb_intern("ole_date"), 1, value);
+  const VALUE date = rb_funcall(ActiveScriptModule(), rb_intern("ole_date"), 1, value);
   if (!NIL_P(date)) return date;
   const VALUE text = rb_check_string_type(value);
   if (!NIL_P(text)) return PassableText(text, form);
@@ -219,7 +212,7 @@ VALUE FromArray(SAFEARRAY* array, VARTYPE type, TextForm form) {
 }
 
 VALUE FromDate(double days) {
-  return rb_funcall(rb_path2class("ActiveScript"), rb_intern("time_from_ole"), 1, DBL2NUM(days));
+  return rb_funcall(ActiveScriptModule(), rb_intern("time_from_ole"), 1, DBL2NUM(days));
 }
 
 VALUE FromBstr(BSTR text, TextForm form) {

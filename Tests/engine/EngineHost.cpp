@@ -37,6 +37,7 @@ void CheckTranscript(const std::string& file,
     macro.clear();
   }
   EXPECT_NE("", written) << path;
+  EXPECT_EQ("", macro) << path << ": no outcome behind the last macro";
   if (std::getenv("SCRIPTRUBY_PROMOTE")) std::ofstream(path, std::ios::binary) << written;
 }
 

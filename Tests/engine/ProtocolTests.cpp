@@ -209,6 +209,7 @@ TEST(Protocol, WrongUse) {
     EXPECT_EQ(S_OK, host.script->GetScriptState(&state));
     EXPECT_EQ(E_UNEXPECTED, host.Parse("1"));
     EXPECT_EQ(E_UNEXPECTED, host.script->Close());
+    EXPECT_EQ(E_UNEXPECTED, host.parse->InitNew());
     Host late;
     EXPECT_EQ("error: Ruby macros run on the thread that ran the first one.", late.Run("1"));
   }).join();

@@ -122,6 +122,10 @@ TEST(Values, FromTheHost) {
     });
     EXPECT_EQ("nil", host.Inspect("@item.back(@item.value)"));
   }
+  for (int i = 1; i < 1000; i += 37) {
+    host.item.Add("value", Answers(Value(VT_DATE, 45000 + (43200 + i / 1000.0) / 86400)));
+    EXPECT_EQ(std::to_string(i), host.Inspect("@item.value.strftime('%L').to_i"));
+  }
   host.item.Add("value", Answers(Value(VT_DATE, HUGE_VAL)));
   EXPECT_EQ("error: ", host.Inspect("@item.value").substr(0, 7));
   // An object of another kind is asked for what it has.

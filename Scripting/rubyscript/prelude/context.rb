@@ -39,7 +39,7 @@ module ActiveScript
     # The first item that has a function `message`; nil without one. An 8-bit host tells its user of
     # names it does not know, so it is asked once in the process.
     def messenger
-      return @messenger if defined?(@messenger)
+      return @messenger if defined?(@messenger) || !ActiveScript.can_call?
       @messenger = @items.values.find { |item| item.respond_to?(:message) } unless byte_host && Context.mute_host
       Context.mute_host = true if byte_host && !@messenger
       @messenger
@@ -50,8 +50,8 @@ module ActiveScript
     def compile(source, first_line, cookie, persistent)
       name = @sources.empty? ? "macro" : "macro#{@sources.size + 1}"
       source = source.b.delete_prefix("\xEF\xBB\xBF".b).force_encoding(Encoding::UTF_8)
-      @sources[name] = Source.new(source.b.split(/\r\n|[\r\n]/n), first_line, cookie)
-      @data = source[/^__END__\r?\n(.*)/m, 1] if source.valid_encoding? && source.include?("__END__")
+      @sources[name] = Source.new(source.b.split(/\r?\n/n), first_line, cookie)
+      @data = source.match(/^__END__(?:\r?\n(.*)|\z)/m)&.then { |match| match[1].to_s } if source.valid_encoding?
       RubyVM.keep_script_lines = true
       code = RubyVM::InstructionSequence.compile(source, name, nil, first_line)
       @queue.push(code)
@@ -71,36 +71,21 @@ module ActiveScript
     # Threads that are not the macro's to see.
     def foreign_threads = @threads - [Thread.main]
 
-    # Runs what is compiled; the value of the last code. A macro that ends by `exit` has succeeded.
+    # Runs what is compiled; the value of the last code.
     def run
       codes, @queue = @queue, []
-      result = nil
-      nested, @running = @running, true
-      @outer_frames = ENTERED.size > 1 ? caller.size : 0
       Object.const_set(:DATA, StringIO.new(@data)) if @data && !Object.const_defined?(:DATA)
-      error = attempt { codes.each { |code| result = code.eval } }
-      while !nested && (block = @exit_blocks.pop)
-        error = attempt(&block) || error
-      end
-      @output.finish
-      @error_output.finish
-      raise error if error && !(SystemExit === error && error.success?)
-      result
-    ensure
-      @running = nested
+      value = nil
+      work { codes.each { |code| value = code.eval } }
+      value
     end
 
-    def call(name, arguments)
-      @world.main.__send__(name, *arguments)
-    ensure
-      @output.finish if ActiveScript.can_call?
-    end
+    def call(name, arguments) = work { @world.main.__send__(name, *arguments) }
 
-    # Files that the macro has left open would stay locked.
+    # Files that the macro has left open would stay locked. Closing the pipe of a process would wait
+    # for its end.
     def close
-      @left_open.each { |file| file.close unless file.closed? }
-    rescue IOError, SystemCallError
-      nil
+      @left_open.each { |file| quietly { file.close unless file.closed? || file.pid } }
     end
 
     # What goes on after the engine has been reset; nil when nothing does.
@@ -160,6 +145,24 @@ module ActiveScript
       outer&.put_back
     end
 
+    # The block is the macro's code. What ends by `exit` has succeeded.
+    def work
+      nested, @running = @running, true
+      outer_frames = ENTERED.size > 1 ? caller.size : 0
+      value = nil
+      error = attempt { value = yield }
+      while !nested && (block = @exit_blocks.pop)
+        error = attempt(&block) || error
+      end
+      @output.finish
+      @error_output.finish
+      return value if !error || (SystemExit === error && error.success?)
+      @outer_frames = outer_frames # for its description
+      raise error
+    ensure
+      @running = nested
+    end
+
     def attempt
       yield
       nil
@@ -176,9 +179,14 @@ module ActiveScript
       STDOUT.flush
       return if ActiveScript.lowest_descriptor == @descriptor
       @left_open |= open_files - @files - [STDIN, STDOUT, STDERR]
-      @left_open.reject(&:closed?).each(&:flush)
+      @left_open.each { |file| quietly { file.flush } }
+    end
+
+    # Closed, not writable, or the other end is gone.
+    def quietly
+      yield
     rescue IOError, SystemCallError
-      nil # not writable, or the other end is gone
+      nil
     end
 
     # --- Errors --------------------------------------------------------------------------------

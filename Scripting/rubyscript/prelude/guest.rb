@@ -38,6 +38,8 @@ module ActiveScript
 
   # The process is the host's: what would end or replace it ends the macro at most.
   module Guest
+    private
+
     def at_exit(&block)
       raise ArgumentError, "called without block" unless block
       Context.current.at_exit(block)
@@ -50,13 +52,21 @@ module ActiveScript
     end
   end
   Kernel.prepend(Guest)
-  Kernel.singleton_class.prepend(Guest)
-  Process.singleton_class.prepend(Guest)
+
+  # As functions of a module they can be called from everywhere.
+  module GuestFunctions
+    include Guest
+    public(*Guest.private_instance_methods)
+  end
+  Kernel.singleton_class.prepend(GuestFunctions)
+  Process.singleton_class.prepend(GuestFunctions)
 
   module GuestProcess
     def kill(signal, *processes)
-      return super unless processes.any? { |id| id == ::Process.pid || id.zero? }
-      raise SignalException, ::Integer === signal ? signal : signal.to_s.delete_prefix("SIG")
+      name = ::Integer === signal ? signal : signal.to_s.delete_prefix("SIG")
+      asks = [0, "EXIT"].include?(name) # only whether the process is there
+      return super if asks || processes.none? { |id| id == ::Process.pid || id.zero? }
+      raise SignalException, name
     end
   end
   Process.singleton_class.prepend(GuestProcess)

@@ -18,19 +18,14 @@ module ActiveScript
 
     # nil for what is neither Time nor Date. The host gets the time as its own zone shows it.
     def ole_date(value)
-      case value
-      when Time then time = value
-      when ->(date) { defined?(::Date) && ::Date === date }
-        time = ::DateTime === value ? value.new_offset(value.offset) : value
-      else return
-      end
-      raise RangeError, "year out of a COM date's range: #{time.year}" unless OLE_YEARS.cover?(time.year)
-      OleDate.new(ole_days(shown_as_utc(time)))
+      return unless Time === value || (defined?(::Date) && ::Date === value)
+      raise RangeError, "year out of a COM date's range: #{value.year}" unless OLE_YEARS.cover?(value.year)
+      OleDate.new(ole_days(shown_as_utc(value)))
     end
 
     def time_from_ole(days)
       whole = days.truncate
-      time = OLE_EPOCH + whole * 86_400 + ((days - whole).abs * 86_400).round(3).rationalize(0.0005r)
+      time = OLE_EPOCH + whole * 86_400 + Rational(((days - whole).abs * 86_400_000).round, 1000)
       Time.local(time.year, time.month, time.day, time.hour, time.min, time.sec + time.subsec)
     end
 

@@ -7,7 +7,8 @@ module ActiveScript
   # $stdout and $stderr of a macro: whole lines go to the host's function `message`, or straight to
   # the process's own stream when the host has none.
   class HostOutput < StringIO
-    # Bytes of a text that an 8-bit host surely takes whole: its own limit is one more.
+    # Bytes of a text that an 8-bit host surely takes whole: one of 512 it cannot tell from one that
+    # was cut.
     LIMIT = 511
 
     def initialize(context, stream)
@@ -41,7 +42,7 @@ module ActiveScript
     # Also the last line, when it has no end.
     def finish
       return if @pending.empty?
-      @pending << "\n" if @context.messenger
+      @pending << "\n" if @context.messenger && !@pending.end_with?("\n")
       pass_on
     end
 
@@ -51,7 +52,7 @@ module ActiveScript
     private_constant :PLAIN
 
     def as_utf8(text)
-      return text if PLAIN.include?(text.encoding) || !@context.messenger
+      return text if PLAIN.include?(text.encoding) || (ActiveScript.can_call? && !@context.messenger)
       text.encode(Encoding::UTF_8, invalid: :replace, undef: :replace)
     end
 

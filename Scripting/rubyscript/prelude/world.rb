@@ -91,6 +91,7 @@ module ActiveScript
       @main = MAIN.clone
       @globals = globals
       @constants = {}
+      @autoloads = {}
       @methods = []
       @settings = baseline.settings
       @lists = baseline.lists
@@ -120,6 +121,8 @@ module ActiveScript
       $VERBOSE = nil
       @constants.each { |name, value| Object.const_set(name, value) }
       @constants = {}
+      @autoloads.each { |name, path| Object.autoload(name, path) }
+      @autoloads = {}
       give_methods
       @globals.each { |name, value| ActiveScript.set_global(name, value) }
       LISTS.zip(@lists) { |list, content| list.replace(content) unless list == content }
@@ -138,6 +141,8 @@ module ActiveScript
       Object.constants(false).each do |name|
         value = World.constant(name)
         next restore_constant(name, value, known) if known.key?(name)
+        path = Object.autoload?(name)
+        next @autoloads[name] = path.tap { Object.__send__(:remove_const, name) } if path
         next known[name] = value if baseline.library_constant?(Object.const_source_location(name), value)
         @constants[name] = Object.__send__(:remove_const, name)
       end
