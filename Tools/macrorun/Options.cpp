@@ -17,7 +17,8 @@ namespace {
 constexpr char kUsage[] =
     "usage: macrorun [OPTION...] MACRO [FILE|-]\n"
     "       macrorun [OPTION...] MACRO --each FILE...\n"
-    "       macrorun --check MACRO...\n";
+    "       macrorun --check MACRO...\n"
+    "       macrorun --record STEPS [-o MACRO]\n";
 
 constexpr char kFooter[] =
     "Exit codes: 0 success, 1 the macro failed, 2 wrong usage or a file that cannot\n"
@@ -43,7 +44,7 @@ class HelpFormatter : public CLI::Formatter {
 
 // What the library hands out as text, before it is what the program wants.
 struct Texts {
-  std::string macro, input, output, description, module, log, errors = "text";
+  std::string macro, input, output, description, module, log, record, errors = "text";
   std::vector<std::string> each, check, arguments;
 };
 
@@ -122,6 +123,9 @@ void AddOtherModes(CLI::App& app, Options& options, Texts& texts) {
       ->type_name("MACRO...")
       ->expected(1, 1 << 20)
       ->group("Instead of running");
+  app.add_option("--record", texts.record, "Print a macro of these recorded steps (JSON)")
+      ->type_name("STEPS")
+      ->group("Instead of running");
   app.add_flag("--functions", options.functions, "List the macro functions")
       ->group("Instead of running");
   app.add_flag("--version", options.version, "Show the versions of macrorun and of the module")
@@ -148,14 +152,18 @@ void Convert(const Texts& texts, Options& options) {
       texts.module.empty() ? ProgramFolder() / "scriptruby.dll" : PathFromUtf8(texts.module);
   options.log = PathFromUtf8(texts.log);
   options.check = Paths(texts.check);
+  options.record = PathFromUtf8(texts.record);
   options.jsonErrors = texts.errors == "json";
   ReadArguments(texts.arguments, options);
 }
 
 // What the library's own rules do not say.
 void CheckCombination(const Options& options) {
-  const bool runs = options.check.empty() && !options.functions && !options.version;
+  const bool records = !options.record.empty();
+  const bool runs = options.check.empty() && !records && !options.functions && !options.version;
   if (runs && options.macro.empty()) throw CLI::RequiredError("MACRO");
+  if (records && !(options.macro.empty() && options.inputs.empty() && options.check.empty()))
+    throw CLI::ValidationError("--record", "takes no macro and no text; -o names the new macro");
   if (!options.check.empty() && !options.macro.empty())
     throw CLI::ValidationError("--check", "name all macros behind it");
   if (!options.inPlace) return;

@@ -35,6 +35,7 @@ struct Options {
   std::filesystem::path log;  // empty: none
 
   std::vector<std::filesystem::path> check;  // the macros to check; nothing is run
+  std::filesystem::path record;              // the steps to make a macro of; likewise
   bool functions = false;
   bool version = false;
 };

@@ -151,12 +151,16 @@ int ScriptModule::Execute(const std::string& macro, void* host) {
 
 bool ScriptModule::Kill() { return As<KillFunction>(Export("kill"))(1); }
 
-std::string ScriptModule::Description() {
-  ScriptInfoRecord record{};
+bool ScriptModule::FillRecord(ScriptInfoRecord& record) {
+  record = {};
   record.size = sizeof record;
   record.layoutVersion = kScriptInfoRecordVersion;
-  if (!As<VersionFunction>(Export("version"))(&record, "")) return {};
-  return record.description;
+  return As<VersionFunction>(Export("version"))(&record, "");
+}
+
+std::string ScriptModule::Description() {
+  ScriptInfoRecord record;
+  return FillRecord(record) ? record.description : "";
 }
 
 // The module's name for a language begins with the engine's, which has two.

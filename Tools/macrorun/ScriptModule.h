@@ -17,6 +17,8 @@
 
 #include "Language.h"
 
+struct ScriptInfoRecord;
+
 // A folder under the user's temporary folder, removed with the two files that it may hold.
 class PrivateFolder {
  public:
@@ -49,6 +51,8 @@ class ScriptModule {
   // Asks the host of the run to stop it; false outside a run.
   bool Kill();
 
+  // What the module tells of its language; false when it refuses.
+  bool FillRecord(ScriptInfoRecord& record);
   // The name of the module's language; empty when the module refuses to tell.
   std::string Description();
   bool RunsRuby();

@@ -11,13 +11,18 @@
 #include <filesystem>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "Batch.h"
 #include "Console.h"
 #include "ExitCode.h"
+#include "Files.h"
 #include "Language.h"
+#include "LanguageTemplates.h"
+#include "MacroComposer.h"
 #include "MacroFunctions.h"
 #include "Options.h"
+#include "Recording.h"
 #include "Reporter.h"
 #include "RunControl.h"
 #include "ScriptModule.h"
@@ -40,6 +45,21 @@ ExitCode PrintFunctions() {
   return kSuccess;
 }
 
+// A macro that does what was recorded; for Ruby unless something else is asked for.
+ExitCode WriteRecorded(const Options& options) {
+  const bool prints = options.output.empty();
+  if (!prints) RequireReplaceable(options.output, false);
+  const std::vector<RecordedStep> steps = ReadRecording(options.record);
+  const Language language = ChooseLanguage(options, prints ? "macro.rbs" : options.output);
+  ScriptModule module(options.module, &language);
+  const std::string macro = MacroComposer(TemplatesOf(module, language)).Compose(steps);
+  if (prints)
+    WriteStandardOutput(macro);
+  else
+    ReplaceFileBytes(options.output, macro);
+  return kSuccess;
+}
+
 // The module reads it when it is loaded.
 void SetLog(const std::filesystem::path& file) {
   if (file.empty()) return;
@@ -51,6 +71,7 @@ ExitCode Perform(const Options& options, Reporter& reporter) {
   SetLog(options.log);
   if (options.functions) return PrintFunctions();
   if (options.version) return PrintVersions(options);
+  if (!options.record.empty()) return WriteRecorded(options);
   RunControl::CatchInterrupts();
   if (!options.check.empty()) return CheckMacros(options, reporter);
   return RunBatch(options, reporter);
