@@ -361,8 +361,8 @@ TEST(FunctionTest, TheTable) {
     EXPECT_STRNE(function.family, "");
     bool optional = false;
     for (const MacroParameter& parameter : function.parameters) {
-      EXPECT_TRUE(parameter.optional || !optional) << parameter.name;
-      optional = parameter.optional;
+      EXPECT_TRUE(parameter.Optional() || !optional) << parameter.name;
+      optional = parameter.Optional();
     }
   }
   EXPECT_EQ(MacroFunctionId("WRITE"), MacroFunctionId("write"));

@@ -83,7 +83,7 @@ Call RandomCall(Random& random, const Document& document) {
     if (family == "Documents" || family == "Macro" || family == "Undo") continue;
     Call call = {function.name, {}};
     for (const MacroParameter& parameter : function.parameters) {
-      if (parameter.optional && random.Below(2) == 0) break;
+      if (parameter.Optional() && random.Below(2) == 0) break;
       call.arguments.push_back(random.Argument(parameter.kind, document));
     }
     return call;

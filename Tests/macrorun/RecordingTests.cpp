@@ -143,7 +143,7 @@ class RandomRecording {
     std::vector<StepArgument> arguments;
     json list = json::array();
     for (const MacroParameter& parameter : function.parameters) {
-      if (parameter.optional && Below(2) == 0) break;
+      if (parameter.Optional() && Below(2) == 0) break;
       arguments.push_back(Argument(parameter.kind));
       const auto* const text = std::get_if<std::string>(&arguments.back());
       std::visit([&](const auto& value) { list.push_back(value); }, arguments.back());

@@ -51,7 +51,7 @@ ArgumentCheck::ArgumentCheck(const MacroFunction& called, std::span<const HostAr
 void ArgumentCheck::CheckCount(std::size_t given) const {
   const std::size_t most = function.parameters.size();
   std::size_t least = 0;
-  while (least < most && !function.parameters[least].optional) ++least;
+  while (least < most && !function.parameters[least].Optional()) ++least;
   const bool any = most > 0 && function.parameters.back().kind == ParameterKind::kTexts;
   if (any || (given >= least && given <= most)) return;
   const std::string range = (least < most ? std::to_string(least) + " to " : std::string()) +

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "MacroCall.h"
 
+#include <algorithm>
+
 #include "Characters.h"
 
 MacroCall::MacroCall(const MacroFunction& called, Editor& owner, EditorServices& runner,
@@ -20,8 +22,7 @@ std::size_t MacroCall::LineOrCursor(std::size_t index) {
   return line;
 }
 
-std::set<std::string_view> MacroCall::Words(std::size_t index,
-                                            std::initializer_list<std::string_view> allowed) {
+std::set<std::string_view> MacroCall::Words(std::size_t index) const {
   std::set<std::string_view> words;
   if (!Has(index)) return words;
   std::string_view rest = Text(index);
@@ -29,13 +30,9 @@ std::set<std::string_view> MacroCall::Words(std::size_t index,
     rest.remove_prefix(rest.find_first_not_of(' '));
     const std::string_view word = rest.substr(0, rest.find(' '));
     rest.remove_prefix(word.size());
-    std::string list;
-    bool known = false;
-    for (const std::string_view& candidate : allowed) {
-      known = known || word == candidate;
-      list += (list.empty() ? "" : ", ") + std::string(candidate);
-    }
-    if (!known) Fail(index, "words among " + list);
+    const MacroParameter& parameter = function.parameters[index];
+    if (std::find(parameter.words.begin(), parameter.words.end(), word) == parameter.words.end())
+      Fail(index, "words among " + WordList(parameter));
     words.insert(word);
   }
   return words;

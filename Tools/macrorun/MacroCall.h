@@ -3,7 +3,6 @@
 #pragma once
 
 #include <cstddef>
-#include <initializer_list>
 #include <set>
 #include <span>
 #include <string_view>
@@ -24,7 +23,6 @@ class MacroCall : public ArgumentCheck {
   Position At(std::size_t lineIndex) const;
   // The line of an optional argument, by default the cursor's, which must be an existing one.
   std::size_t LineOrCursor(std::size_t index);
-  // The words of an optional argument, each of which must be among those allowed.
-  std::set<std::string_view> Words(std::size_t index,
-                                   std::initializer_list<std::string_view> allowed);
+  // The words of an optional argument, each of which must be one of the parameter's.
+  std::set<std::string_view> Words(std::size_t index) const;
 };

@@ -81,24 +81,16 @@ std::string ParameterList(const MacroFunction& function) {
   std::string list, brackets;
   for (const MacroParameter& parameter : function.parameters) {
     const bool texts = parameter.kind == ParameterKind::kTexts;
-    if (parameter.optional) brackets += "]";
-    list += (parameter.optional ? "[" : "") + std::string(list.empty() ? "" : ", ") +
+    if (parameter.Optional()) brackets += "]";
+    list += (parameter.Optional() ? "[" : "") + std::string(list.empty() ? "" : ", ") +
             parameter.name + (texts ? "..." : "");
   }
   return "(" + list + brackets + ")";
 }
 
-std::string MacroFunctionHelp() {
-  std::string help;
-  const char* family = "";
-  for (const MacroFunction& function : MacroFunctions()) {
-    if (std::strcmp(family, function.family) != 0) {
-      family = function.family;
-      help += std::string(family) + ":\n";
-    }
-    std::string call = "  " + (function.name + ParameterList(function));
-    call.resize(std::max<std::size_t>(call.size() + 1, 32), ' ');
-    help += call + function.help + "\n";
-  }
-  return help;
+std::string WordList(const MacroParameter& parameter) {
+  std::string list;
+  for (const std::string_view word : parameter.words)
+    list += (list.empty() ? "" : ", ") + std::string(word);
+  return list;
 }

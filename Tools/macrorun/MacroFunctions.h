@@ -55,14 +55,18 @@ enum class ParameterKind {
   kText,
   kLineText,  // a text without line ends
   kName,      // a text that is not empty
-  kWords,     // options: words with blanks between
+  kWords,     // options: some of the words of the parameter, with blanks between
   kTexts,     // any number of texts; the last parameter
 };
 
 struct MacroParameter {
   const char* name;
   ParameterKind kind;
-  bool optional = false;  // all behind an optional one are optional too
+  // For the user: what holds when it is left out, as all behind it are then. Null: it must be given.
+  const char* otherwise = nullptr;
+  std::vector<std::string_view> words = {};  // of kWords: those that there are
+
+  bool Optional() const { return otherwise != nullptr; }
 };
 
 enum class ResultKind { kNone, kNumber, kText };
@@ -73,7 +77,7 @@ struct MacroFunction {
   const char* name;
   std::vector<MacroParameter> parameters;
   ResultKind result;
-  const char* help;  // one line
+  const char* help;  // one line that can be understood alone; what it answers comes last
   MacroResult (*run)(MacroCall& call);
   const char* family = "";  // filled in by the table
 };
@@ -98,5 +102,5 @@ MacroResult CallMacroFunction(std::uint32_t id, Editor& editor, EditorServices& 
 
 // "(line, column[, count])"
 std::string ParameterList(const MacroFunction& function);
-// One line for each function, under its family.
-std::string MacroFunctionHelp();
+// "ignore_case, whole_word"
+std::string WordList(const MacroParameter& parameter);

@@ -31,6 +31,11 @@ class HelpFormatter : public CLI::Formatter {
   std::string make_usage(const CLI::App*, std::string) const override {
     return kUsage + std::string("\n");
   }
+  // Without the value that a flag stands for.
+  std::string make_option_name(const CLI::Option* option, bool positional) const override {
+    const std::string name = CLI::Formatter::make_option_name(option, positional);
+    return name.substr(0, name.find('{'));
+  }
   std::string make_positionals(const CLI::App*) const override { return {}; }
   std::string make_option_opts(const CLI::Option* option) const override {
     return option->get_type_size() == 0 ? "" : " " + option->get_type_name();
@@ -126,7 +131,11 @@ void AddOtherModes(CLI::App& app, Options& options, Texts& texts) {
   app.add_option("--record", texts.record, "Print a macro of these recorded steps (JSON)")
       ->type_name("STEPS")
       ->group("Instead of running");
-  app.add_flag("--functions", options.functions, "List the macro functions")
+  app.add_flag("--functions{text}", options.functions,
+               "List the macro functions (=markdown: as a page)")
+      ->check(CLI::IsMember({"text", "markdown"}).description(""))
+      ->group("Instead of running");
+  app.add_flag("--stubs", options.stubs, "Write them as Ruby methods, for completion")
       ->group("Instead of running");
   app.add_flag("--version", options.version, "Show the versions of macrorun and of the module")
       ->group("Instead of running");
@@ -160,7 +169,8 @@ void Convert(const Texts& texts, Options& options) {
 // What the library's own rules do not say.
 void CheckCombination(const Options& options) {
   const bool records = !options.record.empty();
-  const bool runs = options.check.empty() && !records && !options.functions && !options.version;
+  const bool runs = options.check.empty() && !records && options.functions.empty() &&
+                    !options.stubs && !options.version;
   if (runs && options.macro.empty()) throw CLI::RequiredError("MACRO");
   if (records && !(options.macro.empty() && options.inputs.empty() && options.check.empty()))
     throw CLI::ValidationError("--record", "takes no macro and no text; -o names the new macro");

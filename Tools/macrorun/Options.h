@@ -36,7 +36,8 @@ struct Options {
 
   std::vector<std::filesystem::path> check;  // the macros to check; nothing is run
   std::filesystem::path record;              // the steps to make a macro of; likewise
-  bool functions = false;
+  std::string functions;  // the form in which to list them, "text" or "markdown"; empty: not at all
+  bool stubs = false;
   bool version = false;
 };
 

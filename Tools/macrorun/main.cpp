@@ -17,10 +17,10 @@
 #include "Console.h"
 #include "ExitCode.h"
 #include "Files.h"
+#include "FunctionReference.h"
 #include "Language.h"
 #include "LanguageTemplates.h"
 #include "MacroComposer.h"
-#include "MacroFunctions.h"
 #include "Options.h"
 #include "Recording.h"
 #include "Reporter.h"
@@ -40,24 +40,24 @@ ExitCode PrintVersions(const Options& options) {
   return kSuccess;
 }
 
-ExitCode PrintFunctions() {
-  std::fputs(MacroFunctionHelp().c_str(), stdout);
+// To --output, or else to standard output.
+ExitCode Write(const Options& options, const std::string& text) {
+  if (options.output.empty()) {
+    WriteStandardOutput(text);
+  } else {
+    RequireReplaceable(options.output, false);
+    ReplaceFileBytes(options.output, text);
+  }
   return kSuccess;
 }
 
 // A macro that does what was recorded; for Ruby unless something else is asked for.
 ExitCode WriteRecorded(const Options& options) {
-  const bool prints = options.output.empty();
-  if (!prints) RequireReplaceable(options.output, false);
   const std::vector<RecordedStep> steps = ReadRecording(options.record);
-  const Language language = ChooseLanguage(options, prints ? "macro.rbs" : options.output);
+  const Language language =
+      ChooseLanguage(options, options.output.empty() ? "macro.rbs" : options.output);
   ScriptModule module(options.module, &language);
-  const std::string macro = MacroComposer(TemplatesOf(module, language)).Compose(steps);
-  if (prints)
-    WriteStandardOutput(macro);
-  else
-    ReplaceFileBytes(options.output, macro);
-  return kSuccess;
+  return Write(options, MacroComposer(TemplatesOf(module, language)).Compose(steps));
 }
 
 // The module reads it when it is loaded.
@@ -69,7 +69,9 @@ void SetLog(const std::filesystem::path& file) {
 
 ExitCode Perform(const Options& options, Reporter& reporter) {
   SetLog(options.log);
-  if (options.functions) return PrintFunctions();
+  if (options.functions == "text") return Write(options, FunctionList());
+  if (options.functions == "markdown") return Write(options, FunctionMarkdown());
+  if (options.stubs) return Write(options, FunctionStubs());
   if (options.version) return PrintVersions(options);
   if (!options.record.empty()) return WriteRecorded(options);
   RunControl::CatchInterrupts();

@@ -54,7 +54,6 @@ MacroResult Unindent(MacroCall& call) {
 }
 
 constexpr ResultKind kNone = ResultKind::kNone, kNumber = ResultKind::kNumber;
-const std::vector<MacroParameter> kBlanks = {{"blanks", Kind::kCount, true}};
 
 const std::vector<MacroFunction> kFunctions = {
     {"upper",
@@ -65,16 +64,23 @@ const std::vector<MacroFunction> kFunctions = {
     {"lower",
      {},
      kNumber,
-     "likewise lower case",
+     "makes the selection, or the word at the cursor, lower case; 1, or 0 without one",
      [](MacroCall& call) { return ChangeCase(call, LetterCase::kLower); }},
     {"title",
      {},
      kNumber,
-     "likewise words that begin with a capital",
+     "capitalises the words of the selection, or the one at the cursor; 1, or 0 without one",
      [](MacroCall& call) { return ChangeCase(call, LetterCase::kTitle); }},
-    {"indent", kBlanks, kNone,
-     "indents the selection's lines, or the cursor's, by blanks or else a tab", Indent},
-    {"unindent", kBlanks, kNone, "takes so many blanks (8), or a tab, from their starts", Unindent},
+    {"indent",
+     {{"blanks", Kind::kCount, "a tab"}},
+     kNone,
+     "indents the selection's lines, or the cursor's, by blanks or a tab",
+     Indent},
+    {"unindent",
+     {{"blanks", Kind::kCount, "8"}},
+     kNone,
+     "unindents the selection's lines, or the cursor's, by a tab or at most so many blanks",
+     Unindent},
 };
 
 }  // namespace

@@ -48,7 +48,7 @@ MacroResult MoveLines(MacroCall& call, bool down) {
   return Signed(count);
 }
 
-const std::vector<MacroParameter> kSteps = {{"count", Kind::kCount, true}};
+const std::vector<MacroParameter> kSteps = {{"count", Kind::kCount, "1"}};
 constexpr ResultKind kNone = ResultKind::kNone, kNumber = ResultKind::kNumber;
 const auto kLeft = [](MacroCall& call) {
   return Repeat(call, [](const Document& document, Position place) {
@@ -105,16 +105,16 @@ const std::vector<MacroFunction> kFunctions = {
      kNone,
      "puts the cursor at the end of the text",
      [](MacroCall& call) { return MoveTo(call, call.document().TextEnd()); }},
-    {"cursor_left", kSteps, kNumber, "moves the cursor by characters; how many it was", kLeft},
-    {"cursor_right", kSteps, kNumber, "moves the cursor by characters; how many it was",
+    {"cursor_left", kSteps, kNumber, "moves the cursor back by characters; how many it was", kLeft},
+    {"cursor_right", kSteps, kNumber, "moves the cursor on by characters; how many it was",
      [](MacroCall& call) { return Repeat(call, NextCharacter); }},
-    {"cursor_up", kSteps, kNumber, "moves the cursor by lines; how many it was",
+    {"cursor_up", kSteps, kNumber, "moves the cursor up by lines; how many it was",
      [](MacroCall& call) { return MoveLines(call, false); }},
-    {"cursor_down", kSteps, kNumber, "moves the cursor by lines; how many it was",
+    {"cursor_down", kSteps, kNumber, "moves the cursor down by lines; how many it was",
      [](MacroCall& call) { return MoveLines(call, true); }},
-    {"word_left", kSteps, kNumber, "moves the cursor to starts of words; how many steps",
+    {"word_left", kSteps, kNumber, "moves the cursor back to starts of words; how many it was",
      [](MacroCall& call) { return Repeat(call, PreviousWord); }},
-    {"word_right", kSteps, kNumber, "moves the cursor to starts of words; how many steps",
+    {"word_right", kSteps, kNumber, "moves the cursor on to starts of words; how many it was",
      [](MacroCall& call) { return Repeat(call, NextWord); }},
 };
 

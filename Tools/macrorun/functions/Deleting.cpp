@@ -27,7 +27,7 @@ MacroResult Delete(MacroCall& call, const Step& step) {
 }
 
 constexpr ResultKind kNone = ResultKind::kNone;
-const std::vector<MacroParameter> kCount = {{"count", Kind::kCount, true}};
+const std::vector<MacroParameter> kCount = {{"count", Kind::kCount, "1"}};
 const auto kBackspace = [](MacroCall& call) {
   return Delete(call, [](const Document& document, Position place) {
     return PreviousCharacter(document, place);
@@ -35,10 +35,11 @@ const auto kBackspace = [](MacroCall& call) {
 };
 
 const std::vector<MacroFunction> kFunctions = {
-    {"delete_char", kCount, kNone, "deletes characters behind the cursor",
+    {"delete_char", kCount, kNone, "deletes the selection, or characters behind the cursor",
      [](MacroCall& call) { return Delete(call, NextCharacter); }},
-    {"backspace", kCount, kNone, "deletes characters before the cursor", kBackspace},
-    {"delete_word", kCount, kNone, "deletes up to the start of the next word",
+    {"backspace", kCount, kNone, "deletes the selection, or characters before the cursor",
+     kBackspace},
+    {"delete_word", kCount, kNone, "deletes the selection, or up to the start of the next word",
      [](MacroCall& call) { return Delete(call, NextWord); }},
     {"delete_selection",
      {},

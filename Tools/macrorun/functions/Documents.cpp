@@ -85,13 +85,13 @@ MacroResult CloseDocument(MacroCall& call) {
 
 constexpr ResultKind kNone = ResultKind::kNone, kNumber = ResultKind::kNumber;
 const MacroParameter kDocument = {"document", Kind::kDocument};
-const MacroParameter kOptionalDocument = {"document", Kind::kDocument, true};
+const MacroParameter kOptionalDocument = {"document", Kind::kDocument, "the current one"};
 
 const std::vector<MacroFunction> kFunctions = {
     {"new_document",
      {},
      kNumber,
-     "opens an empty document and goes there; its number",
+     "opens an empty document and makes it the current one; its number",
      [](MacroCall& call) {
        call.editor.Open(Document(""), {});
        return Number(call);
@@ -99,17 +99,17 @@ const std::vector<MacroFunction> kFunctions = {
     {"open_document",
      {{"path", Kind::kName}},
      kNumber,
-     "opens a file, if it is not open, and goes there; its number",
+     "opens a file, if it is not open, and makes it the current document; its number",
      OpenDocument},
     {"save_document",
-     {{"path", Kind::kName, true}},
+     {{"path", Kind::kName, "its own"}},
      kNone,
-     "writes the current document to a file, by default its own",
+     "writes the current document to a file; document 1 needs a path",
      SaveDocument},
     {"switch_document",
      {kDocument},
      kNone,
-     "goes to a document",
+     "makes a document the current one, which the other functions work on",
      [](MacroCall& call) -> MacroResult {
        call.editor.Switch(call.Number(0));
        return 0;
@@ -129,14 +129,14 @@ const std::vector<MacroFunction> kFunctions = {
     {"document_name",
      {kOptionalDocument},
      ResultKind::kText,
-     "the path of a document's file, empty without one; by default the current document's",
+     "the path of a document's file, empty without one",
      [](MacroCall& call) -> MacroResult {
        return ToUtf8(call.editor.Name(call.Number(0, call.editor.CurrentNumber())));
      }},
     {"close_document",
      {kOptionalDocument},
      kNone,
-     "closes a document, by default the current one; unsaved changes are lost",
+     "closes a document, but not the first; unsaved changes are lost",
      CloseDocument},
 };
 

@@ -54,7 +54,7 @@ Regex MakeRegex(MacroCall& call, bool plain, const std::set<std::string_view>& w
 // Runs `work` with the call's expression. The options follow the parameter `last`.
 template <class Work>
 MacroResult WithRegex(MacroCall& call, bool plain, std::size_t last, const Work& work) try {
-  const auto words = call.Words(last + 1, {"ignore_case", "whole_word", "backward", "wrap"});
+  const auto words = call.Words(last + 1);
   const Regex regex = MakeRegex(call, plain, words);
   return work(regex, words);
 } catch (const RegexError& error) {
@@ -113,7 +113,7 @@ MacroResult Replace(MacroCall& call, bool plain) {
 }
 
 MacroResult ReplaceAll(MacroCall& call, bool plain) try {
-  const auto words = call.Words(2, {"ignore_case", "whole_word", "selection"});
+  const auto words = call.Words(2);
   Document& document = call.document();
   const Regex regex = MakeRegex(call, plain, words);
   const Search search(document, regex);
@@ -141,43 +141,47 @@ MacroResult MatchGroup(MacroCall& call) {
 constexpr ResultKind kNumber = ResultKind::kNumber;
 const MacroParameter kText = {"text", Kind::kName}, kPattern = {"pattern", Kind::kName};
 const MacroParameter kReplacement = {"replacement", Kind::kText};
-const MacroParameter kOptions = {"options", Kind::kWords, true};
+const MacroParameter kOptions = {
+    "options", Kind::kWords, "none", {"ignore_case", "whole_word", "backward", "wrap"}};
+const MacroParameter kAllOptions = {
+    "options", Kind::kWords, "none", {"ignore_case", "whole_word", "selection"}};
 
 const std::vector<MacroFunction> kFunctions = {
     {"find",
      {kText, kOptions},
      kNumber,
-     "selects the next such text (ignore_case, whole_word, backward, wrap); 1, or 0 for none",
+     "selects the next such text; 1, or 0 for none",
      [](MacroCall& call) { return Find(call, true); }},
     {"find_regex",
      {kPattern, kOptions},
      kNumber,
-     "likewise by regular expression",
+     "selects the next match of a regular expression; 1, or 0 for none",
      [](MacroCall& call) { return Find(call, false); }},
     {"match_group",
      {{"group", Kind::kCount}},
      ResultKind::kText,
-     "the text of a group of the last match; of group 0 the whole match",
+     "the text of a group of what was found last; of group 0 the whole match",
      MatchGroup},
     {"replace",
      {kText, kReplacement, kOptions},
      kNumber,
-     "replaces the next such text, options as for find; 1, or 0 for none",
+     "replaces the next such text; 1, or 0 for none",
      [](MacroCall& call) { return Replace(call, true); }},
     {"replace_regex",
      {kPattern, kReplacement, kOptions},
      kNumber,
-     "likewise by regular expression; $1 or \\1 is a group, ${name} a named one",
+     "replaces the next match of a regular expression; $1 or \\1 is a group, ${name} a named one; "
+     "1, or 0 for none",
      [](MacroCall& call) { return Replace(call, false); }},
     {"replace_all",
-     {kText, kReplacement, kOptions},
+     {kText, kReplacement, kAllOptions},
      kNumber,
-     "replaces everywhere (ignore_case, whole_word, selection); how often",
+     "replaces every such text; how often",
      [](MacroCall& call) { return ReplaceAll(call, true); }},
     {"replace_all_regex",
-     {kPattern, kReplacement, kOptions},
+     {kPattern, kReplacement, kAllOptions},
      kNumber,
-     "likewise by regular expression",
+     "replaces every match of a regular expression, with groups as in replace_regex; how often",
      [](MacroCall& call) { return ReplaceAll(call, false); }},
 };
 

@@ -62,7 +62,7 @@ MacroResult MoveLine(MacroCall& call, bool down) {
 }
 
 MacroResult SortLines(MacroCall& call) {
-  const auto words = call.Words(2, {"descending", "ignore_case", "unique"});
+  const auto words = call.Words(2);
   const std::size_t first = call.Number(0), count = call.Number(1) - first + 1;
   std::vector<std::string> keys;
   for (std::size_t i = 0; i < count; ++i) {
@@ -89,7 +89,7 @@ MacroResult SortLines(MacroCall& call) {
 constexpr ResultKind kNone = ResultKind::kNone, kNumber = ResultKind::kNumber;
 const MacroParameter kLine = {"line", Kind::kLine}, kLineOrEnd = {"line", Kind::kLineOrEnd};
 const MacroParameter kLineText = {"text", Kind::kLineText};
-const MacroParameter kOptionalLine = {"line", Kind::kLine, true};
+const MacroParameter kOptionalLine = {"line", Kind::kLine, "the cursor's"};
 const MacroParameter kFirst = {"first", Kind::kLine}, kLast = {"last", Kind::kLastLine};
 
 const std::vector<MacroFunction> kFunctions = {
@@ -130,41 +130,41 @@ const std::vector<MacroFunction> kFunctions = {
        return 0;
      }},
     {"delete_line", {kLine}, kNone, "deletes a line", DeleteLines},
-    {"delete_lines", {kFirst, kLast}, kNone, "deletes lines", DeleteLines},
+    {"delete_lines",
+     {kFirst, kLast},
+     kNone,
+     "deletes the lines from the first to the last",
+     DeleteLines},
     {"replace_lines",
      {kFirst, kLast, {"text", Kind::kText}},
      kNone,
-     "puts a text's lines in the place of others",
+     "puts a text's lines in the place of those from the first to the last",
      ReplaceLines},
     {"join_lines",
-     {kFirst, kLast, {"separator", Kind::kLineText, true}},
+     {kFirst, kLast, {"separator", Kind::kLineText, "a blank"}},
      kNone,
-     "makes one line of several, with a blank or another text between",
+     "makes one line of those from the first to the last, with a text between",
      JoinLines},
     {"split_line",
      {kLine, {"column", Kind::kColumn}},
      kNone,
-     "begins a new line at a column",
+     "begins a new line at a column of a line",
      SplitLine},
-    {"duplicate_line",
-     {kOptionalLine},
-     kNone,
-     "repeats a line, by default the cursor's, behind it",
-     DuplicateLine},
+    {"duplicate_line", {kOptionalLine}, kNone, "repeats a line behind it", DuplicateLine},
     {"move_line_up",
      {kOptionalLine},
      kNumber,
-     "moves a line up; 1, or 0 for the first",
+     "moves a line before the one above; 1, or 0 for the first",
      [](MacroCall& call) { return MoveLine(call, false); }},
     {"move_line_down",
      {kOptionalLine},
      kNumber,
-     "moves a line down; 1, or 0 for the last",
+     "moves a line behind the one below; 1, or 0 for the last",
      [](MacroCall& call) { return MoveLine(call, true); }},
     {"sort_lines",
-     {kFirst, kLast, {"options", Kind::kWords, true}},
+     {kFirst, kLast, {"options", Kind::kWords, "none", {"descending", "ignore_case", "unique"}}},
      kNumber,
-     "sorts lines (descending, ignore_case, unique); how many are left",
+     "sorts the lines from the first to the last; how many are left",
      SortLines},
 };
 

@@ -33,19 +33,20 @@ const std::vector<MacroFunction> kFunctions = {
        return 0;
      }},
     {"prompt",
-     {{"question", Kind::kText}, {"default", Kind::kText, true}},
+     {{"question", Kind::kText}, {"default", Kind::kText, "an empty text"}},
      kText,
-     "asks the user; the answer",
+     "asks the user, for whom an empty line means the default; the answer",
      Prompt},
     {"argument",
-     {{"name", Kind::kName}, {"default", Kind::kText, true}},
+     {{"name", Kind::kName}, {"default", Kind::kText, "the name must have a value"}},
      kText,
      "the value that the macro was given for a name, or the default",
      Argument},
     {"run_macro",
      {{"path", Kind::kName}},
      ResultKind::kNumber,
-     "runs another macro over the same documents; 1, or 0 when it failed",
+     "runs the macro at a path from this one's folder over the same documents; 1, or 0 if it "
+     "failed",
      [](MacroCall& call) -> MacroResult {
        return call.services.RunMacro(PathFromUtf8(call.Text(0))) ? 1 : 0;
      }},

@@ -9,7 +9,7 @@ const std::vector<MacroParameter> kName = {{"name", ParameterKind::kName}};
 constexpr ResultKind kNone = ResultKind::kNone, kNumber = ResultKind::kNumber;
 
 const std::vector<MacroFunction> kFunctions = {
-    {"set_mark", kName, kNone, "sets a mark at the cursor; it moves with the text",
+    {"set_mark", kName, kNone, "sets a mark of that name at the cursor; it moves with the text",
      [](MacroCall& call) -> MacroResult {
        call.document().SetMark(call.Text(0));
        return 0;

@@ -1,0 +1,41 @@
+#!/bin/sh
+# SPDX-License-Identifier: MIT
+# reference.sh MACRORUN FAKE_MODULE: the list of the macro functions, Docs/functions.md and the stubs for
+# completion say the same.
+page=$(cd "$(dirname "$0")/../../Docs" && pwd)/functions.md
+. "$(dirname "$0")/runner.sh"
+
+expect 2 'markdown' --functions=html
+expect 2 'cannot write nowhere' --stubs -o nowhere/tarn.rb
+expect 0 '' --functions=markdown
+diff "$page" out || fail "Docs/functions.md is out of date: scripts/run.sh --functions=markdown -o Docs/functions.md"
+
+# The stubs are Ruby with the list's names and parameters, each with its tag, and leave @tarn alone
+expect 0 '' --functions -o list
+expect 0 '' --stubs -o tarn.rb
+cat > macro.rbs << 'RUBY'
+def call_of(name, parameters)
+  open = ""
+  list = parameters.map do |kind, parameter|
+    before, after = kind == :opt ? ["[", open << "]"] : ["", ""]
+    before + (parameter == parameters[0][1] ? "" : ", ") + parameter.to_s + (kind == :rest ? "..." : "")
+  end
+  "#{name}(#{list.join}#{open})"
+end
+
+load "./tarn.rb"
+comments = File.read("tarn.rb").scan(/((?:^  # .+\n|^  #\n)+)  def (\w+)/).to_h { |text, name| [name.to_sym, text] }
+Tarn.instance_methods(false).sort.each do |name|
+  parameters = Tarn.instance_method(name).parameters
+  tags = comments[name].scan(/@param (\w+) \[[\w<>]+(, nil)?\] \S/)
+  wanted = parameters.map { |kind, parameter| [parameter.to_s, (", nil" if kind == :opt)] }
+  raise "#{name}: #{tags}" unless tags == wanted && comments[name] =~ /@return \[(void|Integer|String)\]$/
+  @tarn.write(call_of(name, parameters) + "\n")
+end
+RUBY
+expect 0 '' macro.rbs
+sed -n 's/^  \([a-z_]*([^)]*)\).*/\1/p' list | LC_ALL=C sort > calls
+[ "$(wc -l < calls)" -ge 70 ] && LC_ALL=C sort out | diff calls - || fail 'the stubs are not those of the list'
+grep -qx '@tarn ||= Tarn.new' tarn.rb || fail 'the stubs have no @tarn'
+
+finish
