@@ -24,6 +24,7 @@ module ActiveScript
     end
 
     def fixed?(global) = @fixed.key?(global)
+    def fix(global) = @fixed[global] = true
 
     # Whether the place of a definition is in a library.
     def library?(location) = location.first.start_with?(@folder)
@@ -46,7 +47,7 @@ module ActiveScript
       ActiveScript.set_global(name, value)
       @globals[name] = value
     rescue StandardError
-      @fixed[name] = true
+      fix(name)
     end
   end
 
@@ -184,17 +185,26 @@ module ActiveScript
       end
     end
 
+    # A name that is new may be an alias, as those of the library English are, and what is set by it
+    # another variable. So all are read before one is set, and those that everybody has are set last.
     def take_globals
-      @globals = {}
-      global_variables.each do |name|
-        next if baseline.fixed?(name)
-        value = ActiveScript.global(name)
-        original = baseline.globals[name]
-        next if value.equal?(original)
-        @globals[name] = value
+      names = global_variables.reject { |name| baseline.fixed?(name) }
+      values = names.to_h { |name| [name, ActiveScript.global(name)] }
+      @globals = values.reject { |name, value| value.equal?(baseline.globals[name]) }
+      @globals.keys.each { |name| clear_global(name) unless baseline.globals.key?(name) }
+      baseline.globals.each do |name, original|
+        next if ActiveScript.global(name).equal?(original)
         untrace_var(name)
         ActiveScript.set_global(name, original)
       end
+    end
+
+    def clear_global(name)
+      untrace_var(name)
+      ActiveScript.set_global(name, nil)
+    rescue NameError, TypeError # an alias of one that takes no such value
+      baseline.fix(name)
+      @globals.delete(name)
     end
 
     # Files of the macro's own are loaded anew by the next one.
