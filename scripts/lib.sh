@@ -12,7 +12,7 @@ LOGS=$BUILD/logs
 PACKAGES=(
   clang-19 lld-19 llvm-19 libclang-rt-19-dev
   g++-mingw-w64-i686-posix mingw-w64-i686-dev g++-multilib
-  cmake ninja-build googletest libcli11-dev nlohmann-json3-dev
+  cmake ninja-build googletest libcli11-dev nlohmann-json3-dev libdtl-dev
   wine wine32:i386
 )
 

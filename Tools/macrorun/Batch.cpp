@@ -42,8 +42,7 @@ class Batch {
 ExitCode Batch::RunOne(const fs::path& input) {
   if (options.inPlace) RequireReplaceable(input, true);
   Editor editor(Document(ReadInput(input)), input == "-" ? fs::path() : input);
-  for (unsigned i = 0; i < options.repeat; ++i)
-    if (const ExitCode code = RunMacro(surroundings, editor); code != kSuccess) return code;
+  if (const ExitCode code = RunMacro(surroundings, editor); code != kSuccess) return code;
   Write(input, editor.First().Bytes());
   return kSuccess;
 }

@@ -25,6 +25,15 @@ std::string EngineOf(const fs::path& description) {
   return WideToUtf8(name);
 }
 
+bool IsRuby(const fs::path& macro) { return _wcsicmp(macro.extension().c_str(), L".rbs") == 0; }
+
+// The description of the language that has the macro's extension; there may be none.
+fs::path DescriptionFor(const fs::path& macro) {
+  const std::wstring extension = macro.extension().wstring();
+  const std::wstring language = extension.empty() ? extension : extension.substr(1);
+  return ProgramFolder() / "languages" / (language + L".qwsh");
+}
+
 Language Described(const fs::path& description) { return {description, EngineOf(description)}; }
 
 }  // namespace
@@ -38,12 +47,14 @@ Language ChooseLanguage(const Options& options, const fs::path& macro) {
     RequireReadable(options.description, "language description (--description)");
     return Described(options.description);
   }
-  const std::wstring extension = macro.extension().wstring();
-  if (_wcsicmp(extension.c_str(), L".rbs") == 0) return {{}, "RubyScript"};
-  const std::wstring language = extension.empty() ? extension : extension.substr(1);
-  const fs::path file = ProgramFolder() / "languages" / (language + L".qwsh");
-  std::error_code error;
-  if (!language.empty() && fs::is_regular_file(file, error)) return Described(file);
+  if (IsRuby(macro)) return {{}, "RubyScript"};
+  const fs::path file = DescriptionFor(macro);
+  if (HasLanguage(macro)) return Described(file);
   throw UsageError("no language description for " + ToUtf8(macro) + " (" + ToUtf8(file) +
                    "); name the engine with --engine, or a description with --description");
+}
+
+bool HasLanguage(const fs::path& macro) {
+  std::error_code error;
+  return IsRuby(macro) || fs::is_regular_file(DescriptionFor(macro), error);
 }

@@ -18,3 +18,6 @@ struct Language {
 // In this order: --engine, --description, the macro's extension (.rbs is Ruby, any other has a
 // description of its name in the program's folder `languages`).
 Language ChooseLanguage(const Options& options, const std::filesystem::path& macro);
+
+// Whether the macro's extension tells the language, in the third of these ways.
+bool HasLanguage(const std::filesystem::path& macro);

@@ -191,5 +191,7 @@ void MacroRun::SetResult(const MacroResult& result) {
 }  // namespace
 
 ExitCode RunMacro(RunSurroundings& surroundings, Editor& editor) {
-  return MacroRun(surroundings, editor).Run();
+  for (unsigned i = 0; i < surroundings.options.repeat; ++i)
+    if (const ExitCode code = MacroRun(surroundings, editor).Run(); code != kSuccess) return code;
+  return kSuccess;
 }

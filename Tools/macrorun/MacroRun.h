@@ -25,5 +25,6 @@ struct RunSurroundings {
   CallProfile& profile;
 };
 
-// Runs the options' macro, which changes the editor's documents, as one step.
+// Runs the options' macro, which changes the editor's documents, as often as they say and until a run
+// fails. Each run is one step.
 ExitCode RunMacro(RunSurroundings& surroundings, Editor& editor);

@@ -17,6 +17,7 @@ namespace {
 constexpr char kUsage[] =
     "usage: macrorun [OPTION...] MACRO [FILE|-]\n"
     "       macrorun [OPTION...] MACRO --each FILE...\n"
+    "       macrorun [OPTION...] --test DIR [--promote]\n"
     "       macrorun --check MACRO...\n"
     "       macrorun --record STEPS [-o MACRO]\n";
 
@@ -49,7 +50,7 @@ class HelpFormatter : public CLI::Formatter {
 
 // What the library hands out as text, before it is what the program wants.
 struct Texts {
-  std::string macro, input, output, description, module, log, record, errors = "text";
+  std::string macro, input, output, description, module, log, test, record, errors = "text";
   std::vector<std::string> each, check, arguments;
 };
 
@@ -122,6 +123,17 @@ void AddReportOptions(CLI::App& app, Options& options, Texts& texts) {
       ->group("Reports, on standard error");
 }
 
+void AddTestOptions(CLI::App& app, Options& options, Texts& texts) {
+  CLI::Option* const test =
+      app.add_option("--test", texts.test, "Run the macros in DIR, each over its NAME.in");
+  test->type_name("DIR")->group("Tests");
+  for (const char* name : {"MACRO", "FILE", "--each", "--output", "--in-place"})
+    test->excludes(app.get_option(name));
+  app.add_flag("--promote", options.promote, "Then make each NAME.out the text of its macro")
+      ->needs(test)
+      ->group("Tests");
+}
+
 void AddOtherModes(CLI::App& app, Options& options, Texts& texts) {
   app.set_help_flag("-h,--help", "Show this help")->group("Instead of running");
   app.add_option("--check", texts.check, "Report syntax errors of these macros")
@@ -160,6 +172,7 @@ void Convert(const Texts& texts, Options& options) {
   options.module =
       texts.module.empty() ? ProgramFolder() / "scriptruby.dll" : PathFromUtf8(texts.module);
   options.log = PathFromUtf8(texts.log);
+  options.test = PathFromUtf8(texts.test);
   options.check = Paths(texts.check);
   options.record = PathFromUtf8(texts.record);
   options.jsonErrors = texts.errors == "json";
@@ -169,8 +182,8 @@ void Convert(const Texts& texts, Options& options) {
 // What the library's own rules do not say.
 void CheckCombination(const Options& options) {
   const bool records = !options.record.empty();
-  const bool runs = options.check.empty() && !records && options.functions.empty() &&
-                    !options.stubs && !options.version;
+  const bool runs = options.check.empty() && options.test.empty() && !records &&
+                    options.functions.empty() && !options.stubs && !options.version;
   if (runs && options.macro.empty()) throw CLI::RequiredError("MACRO");
   if (records && !(options.macro.empty() && options.inputs.empty() && options.check.empty()))
     throw CLI::ValidationError("--record", "takes no macro and no text; -o names the new macro");
@@ -202,6 +215,7 @@ std::optional<int> ParseOptions(Options& options) {
   app.footer(kFooter);
   AddTextOptions(app, options, texts);
   AddMacroOptions(app, options, texts);
+  AddTestOptions(app, options, texts);
   AddReportOptions(app, options, texts);
   AddOtherModes(app, options, texts);
   try {

@@ -34,6 +34,9 @@ struct Options {
   bool profile = false;
   std::filesystem::path log;  // empty: none
 
+  std::filesystem::path test;  // the folder whose macros to test; empty: not given
+  bool promote = false;
+
   std::vector<std::filesystem::path> check;  // the macros to check; nothing is run
   std::filesystem::path record;              // the steps to make a macro of; likewise
   std::string functions;  // the form in which to list them, "text" or "markdown"; empty: not at all

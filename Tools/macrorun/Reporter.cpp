@@ -5,6 +5,33 @@
 
 #include "Console.h"
 
+namespace {
+
+void WriteObject(const char* type, const std::string& macro,
+                 const nlohmann::ordered_json& members) {
+  nlohmann::ordered_json json = {{"type", type}};
+  if (!macro.empty()) json["macro"] = macro;
+  json.update(members);
+  WriteError(json.dump(-1, ' ', false, nlohmann::json::error_handler_t::replace) + "\n");
+}
+
+Colour ColourOf(DiffLine::Kind kind) {
+  switch (kind) {
+    case DiffLine::Kind::kMissing:
+      return Colour::kError;
+    case DiffLine::Kind::kExtra:
+      return Colour::kHighlight;
+    case DiffLine::Kind::kPlace:
+    case DiffLine::Kind::kRemark:
+      return Colour::kFaint;
+    case DiffLine::Kind::kSame:
+      break;
+  }
+  return Colour::kPlain;
+}
+
+}  // namespace
+
 void Reporter::Error(ErrorReport error) {
   EndProgress();
   CompleteSource(error);
@@ -23,12 +50,23 @@ void Reporter::Error(ErrorReport error) {
 
 void Reporter::Line(const char* type, const char* prefix, std::string_view text) {
   EndProgress();
-  if (form == Form::kJson) {
-    const nlohmann::ordered_json json = {{"type", type}, {"text", text}};
-    WriteError(json.dump(-1, ' ', false, nlohmann::json::error_handler_t::replace) + "\n");
-    return;
+  if (form == Form::kJson)
+    WriteObject(type, macro, {{"text", text}});
+  else
+    WriteError(prefix + (macro.empty() ? "" : macro + ": ") + std::string(text) + "\n");
+}
+
+void Reporter::TestEnd(bool passed, const std::vector<DiffLine>& diff) {
+  if (!passed) EndProgress();
+  std::string whole;
+  for (const DiffLine& line : diff) {
+    if (form == Form::kText) WriteError(line.text + "\n", ColourOf(line.kind));
+    whole += line.text + "\n";
   }
-  WriteError(prefix + std::string(text) + "\n");
+  if (form == Form::kText) return;
+  nlohmann::ordered_json json = {{"passed", passed}};
+  if (!diff.empty()) json["diff"] = whole;
+  WriteObject("test", macro, json);
 }
 
 void Reporter::Progress(std::size_t number, std::size_t count, const std::string& name) {

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 // What the program tells its user while macros run, on standard error: for people, or for programs
-// one JSON object a line with the member "type" ("error", "message", "trace", "note", "profile").
+// one JSON object a line with the member "type" ("error", "message", "test", "trace", "note",
+// "profile").
 //
 // Errors: none; what cannot be written is passed over.
 // Threading: any thread.
@@ -8,14 +9,20 @@
 
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "ErrorReport.h"
+#include "TextDiff.h"
 
 class Reporter {
  public:
   enum class Form { kText, kJson };
 
   explicit Reporter(Form reportForm) : form(reportForm) {}
+
+  // Whose messages, traces and notes follow, for each of which it is told; empty: it is not. Not while
+  // a macro runs.
+  void SetMacro(std::string name) { macro = std::move(name); }
 
   void Error(ErrorReport error);
   // What a macro says.
@@ -26,6 +33,10 @@ class Reporter {
   // What the program itself has to say.
   void Note(std::string_view text) { Line("note", "macrorun: ", text); }
 
+  // The outcome of that macro's test, with what its text has other than expected. Of one that has passed
+  // only programs are told.
+  void TestEnd(bool passed, const std::vector<DiffLine>& diff);
+
   // "[2/10] name" on a line of its own that the next one replaces; on a terminal only.
   void Progress(std::size_t number, std::size_t count, const std::string& name);
   void EndProgress();
@@ -34,5 +45,6 @@ class Reporter {
   void Line(const char* type, const char* prefix, std::string_view text);
 
   const Form form;
+  std::string macro;
   std::size_t progressWidth = 0;
 };

@@ -21,6 +21,7 @@
 #include "Language.h"
 #include "LanguageTemplates.h"
 #include "MacroComposer.h"
+#include "MacroTests.h"
 #include "Options.h"
 #include "Recording.h"
 #include "Reporter.h"
@@ -76,6 +77,7 @@ ExitCode Perform(const Options& options, Reporter& reporter) {
   if (!options.record.empty()) return WriteRecorded(options);
   RunControl::CatchInterrupts();
   if (!options.check.empty()) return CheckMacros(options, reporter);
+  if (!options.test.empty()) return RunMacroTests(options, reporter);
   return RunBatch(options, reporter);
 }
 
