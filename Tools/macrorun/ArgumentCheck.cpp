@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "ArgumentCheck.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
 #include <cstring>
@@ -45,6 +46,7 @@ ArgumentCheck::ArgumentCheck(const MacroFunction& called, std::span<const HostAr
       values.push_back(value);
     else
       values[last].text += " " + value.text;
+    if (i <= last && function.parameters[i].kind == ParameterKind::kWords) Words(i);
   }
 }
 
@@ -130,4 +132,20 @@ void ArgumentCheck::Fail(std::size_t index, const std::string& expected) const {
 void ArgumentCheck::Fail(const std::string& expected) const {
   throw WrongCall(function.name, 0, expected,
                   std::string(function.name) + ": expected " + expected);
+}
+
+std::set<std::string_view> ArgumentCheck::Words(std::size_t index) const {
+  std::set<std::string_view> words;
+  if (!Has(index)) return words;
+  std::string_view rest = Text(index);
+  while (rest.find_first_not_of(' ') != rest.npos) {
+    rest.remove_prefix(rest.find_first_not_of(' '));
+    const std::string_view word = rest.substr(0, rest.find(' '));
+    rest.remove_prefix(word.size());
+    const MacroParameter& parameter = function.parameters[index];
+    if (std::find(parameter.words.begin(), parameter.words.end(), word) == parameter.words.end())
+      Fail(index, "words among " + WordList(parameter));
+    words.insert(word);
+  }
+  return words;
 }

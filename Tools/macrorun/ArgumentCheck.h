@@ -6,8 +6,10 @@
 #pragma once
 
 #include <cstddef>
+#include <set>
 #include <span>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "MacroFunctions.h"
@@ -29,6 +31,8 @@ class ArgumentCheck {
     static const std::string none;
     return Has(index) ? values[index].text : none;
   }
+  // The words of an optional argument.
+  std::set<std::string_view> Words(std::size_t index) const;
 
   // Throws WrongCall, with the argument as it was given. Only before a change.
   [[noreturn]] void Fail(std::size_t index, const std::string& expected) const;

@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "MacroCall.h"
 
-#include <algorithm>
-
 #include "Characters.h"
 
 MacroCall::MacroCall(const MacroFunction& called, Editor& owner, EditorServices& runner,
@@ -20,20 +18,4 @@ std::size_t MacroCall::LineOrCursor(std::size_t index) {
   const std::size_t line = document().Cursor().line;
   if (line > document().LineCount()) Fail("the cursor in a line, but it stands behind the last");
   return line;
-}
-
-std::set<std::string_view> MacroCall::Words(std::size_t index) const {
-  std::set<std::string_view> words;
-  if (!Has(index)) return words;
-  std::string_view rest = Text(index);
-  while (rest.find_first_not_of(' ') != rest.npos) {
-    rest.remove_prefix(rest.find_first_not_of(' '));
-    const std::string_view word = rest.substr(0, rest.find(' '));
-    rest.remove_prefix(word.size());
-    const MacroParameter& parameter = function.parameters[index];
-    if (std::find(parameter.words.begin(), parameter.words.end(), word) == parameter.words.end())
-      Fail(index, "words among " + WordList(parameter));
-    words.insert(word);
-  }
-  return words;
 }

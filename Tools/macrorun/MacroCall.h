@@ -3,9 +3,7 @@
 #pragma once
 
 #include <cstddef>
-#include <set>
 #include <span>
-#include <string_view>
 
 #include "ArgumentCheck.h"
 
@@ -23,6 +21,4 @@ class MacroCall : public ArgumentCheck {
   Position At(std::size_t lineIndex) const;
   // The line of an optional argument, by default the cursor's, which must be an existing one.
   std::size_t LineOrCursor(std::size_t index);
-  // The words of an optional argument, each of which must be one of the parameter's.
-  std::set<std::string_view> Words(std::size_t index) const;
 };
