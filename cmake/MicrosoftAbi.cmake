@@ -22,6 +22,7 @@ else()
       "SHELL:-isystem /usr/share/mingw-w64/include"
       -D__USE_MINGW_ANSI_STDIO=0 # formatting by msvcrt.dll, not by 20 KiB of code of our own
       -Wno-microsoft-exception-spec # operator new is declared noexcept, which the compiler minds
+      -fcheck-new # which it does not go by either: a failed one must not be constructed
       -fno-exceptions -fno-rtti -fno-threadsafe-statics -ffunction-sections -fdata-sections)
 endif()
 

@@ -105,7 +105,7 @@ void Call(const wchar_t* name, std::vector<VARIANT> arguments) {
   const bool text = result.vt == VT_BSTR;
   Log("returned " + Hex(outcome) + ", type " + std::to_string(result.vt) + ", " +
       std::to_string(text ? static_cast<int>(SysStringLen(result.bstrVal)) : result.lVal) + " " +
-      Utf8(text ? result.bstrVal : L""));
+      Utf8(text && result.bstrVal ? result.bstrVal : L""));
   for (VARIANT& argument : arguments) VariantClear(&argument);
   VariantClear(&result), item->Release();
 }

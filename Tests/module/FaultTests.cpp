@@ -1,33 +1,15 @@
 // SPDX-License-Identifier: MIT
 // Faults of every kind, inside a macro function of the host and inside the engine: the run ends
 // with -1 and the message, and the next run is as if nothing had been.
+#include "Faults.h"
 #include "ModuleTest.h"
 
 using FaultTest = ModuleTest;
 
-namespace {
-volatile int sink;
-unsigned char data[16] = {0xC3};
-
-void WriteNothing() { *reinterpret_cast<volatile int*>(8) = 1; }
-__attribute__((noinline)) void OverflowStack() {
-  volatile char page[4096] = {1};
-  if (page[0] == 1) OverflowStack();
-  sink = page[0];
-}
-}  // namespace
-
 // A stop is among them: it leaves as much behind, and must stay possible as often.
 TEST_F(FaultTest, EveryKindInTheHostAndInTheEngine) {
-  const std::pair<const char*, std::function<void()>> faults[] = {
-      {"read", [] { sink = *reinterpret_cast<volatile int*>(8); }},
-      {"write", WriteNothing},
-      {"data executed", [] { reinterpret_cast<void (*)()>(reinterpret_cast<void*>(data))(); }},
-      {"division", [] { __asm__ volatile("idivl %0" ::"r"(0), "a"(1), "d"(0)); }},
-      {"illegal instruction", [] { __asm__ volatile("ud2"); }},
-      {"exception", [] { RaiseException(0xE06D7363, EXCEPTION_NONCONTINUABLE, 0, nullptr); }},
-      {"stack overflow", OverflowStack},
-      {"stop", [&] { Stop(host.Engine()); }}};
+  std::vector<std::pair<const char*, std::function<void()>>> faults(kFaults.begin(), kFaults.end());
+  faults.emplace_back("stop", [&] { Stop(host.Engine()); });
   const char* repeats = std::getenv("SCRIPTRUBY_TEST_FAULTS");
   const auto script = on["engine: SetScriptState 2"];
   for (const auto& [kind, fault] : faults)

@@ -7,8 +7,6 @@
 
 namespace fs = std::filesystem;
 
-static std::string transcript;
-
 static std::string Escape(char ch) {
   if (ch == '\n') return "\\n\n    ";
   return ch >= ' ' && ch < 127 ? std::string(1, ch) : "<" + Hex(ch & 0xFF).substr(6) + ">";

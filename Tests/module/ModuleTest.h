@@ -39,6 +39,8 @@ inline void WriteBytes(const std::string& path, const std::string& bytes) {
   std::ofstream(path, std::ios::binary) << bytes;
 }
 
+inline std::string transcript;  // of the running test
+
 class ModuleTest : public testing::Test {
  protected:
   ModuleTest();

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The module with the Ruby engine that ships: keyboard macros, text, stops and faults, nested runs.
 #include "ModuleTest.h"
-// psapi.h must come after windows.h.
-#include <psapi.h>
+#include "Resources.h"
 
 class RubyTest : public ModuleTest {
  protected:
@@ -96,21 +95,6 @@ TEST_F(RubyTest, NestedThreeDeepWithAStopOrAFaultAtEachDepth) {
       on.erase("call 7");
       Run();
     }
-}
-
-struct Resources {
-  unsigned kilobytes;  // private to the process
-  unsigned handles;
-};
-
-// Wine does not count handles, but a new one takes the lowest free number.
-static Resources Used() {
-  PROCESS_MEMORY_COUNTERS counters = {};
-  K32GetProcessMemoryInfo(GetCurrentProcess(), &counters, sizeof counters);
-  const HANDLE lowest = CreateEventA(nullptr, FALSE, FALSE, nullptr);
-  CloseHandle(lowest);
-  return {static_cast<unsigned>(counters.PagefileUsage / 1024),
-          static_cast<unsigned>(reinterpret_cast<uintptr_t>(lowest) / 4)};
 }
 
 // The next macro is right each time, and the process does not grow: at a tenth and at the end.

@@ -1,0 +1,68 @@
+// SPDX-License-Identifier: MIT
+// Each request for memory of a run fails in turn: there is no crash and no leak, the host's record is
+// clean, and the next run is right.
+#include "Imports.h"
+#include "TortureTest.h"
+
+class AllocationTest : public TortureTest {
+ protected:
+  using TortureTest::TortureTest;
+
+  // Does `action` with one request more that succeeds each time, until none of them fails.
+  void FailEach(HMODULE module, const char* what, const std::function<void()>& action) {
+    WatchMemory(module);
+    bool faulted = false;
+    on["report: Tarn has"] = [&] { faulted = true; };
+    bool failed = true;
+    int n = 0;
+    for (; failed && !HasFatalFailure(); ++n) {
+      SCOPED_TRACE(what + " without the request "s + std::to_string(n + 1));
+      const int before = LiveBlocks();
+      FailRequest(n + 1);
+      action();
+      failed = FailRequest(0);
+      EXPECT_FALSE(std::exchange(faulted, false));
+      EXPECT_TRUE(host.IsClean());
+      ExpectRightRun();
+      if (module == dll) EXPECT_EQ(before, LiveBlocks());
+    }
+    Figure("%s: each of %d requests for memory has failed once", what, n - 1);
+    EXPECT_GT(n, 5);
+  }
+};
+
+TEST_F(AllocationTest, OfARunInTheModule) {
+  // Every kind of argument, a list that has to grow, a text result, reports of errors.
+  on["engine: SetScriptState 2"] = [&] {
+    const VARIANT values[] = {Value(VT_I4, 1), Value(VT_R8, 2.5), Value(VT_BOOL, 1),
+                              Value(VT_BSTR, SysAllocString(L"text"))};
+    Call(L"f", {values, values + 4});
+    Call(L"f", std::vector<VARIANT>(51, Value(VT_I4, 1)));
+    Call(L"unknown");
+    IErrorInfo* error = nullptr;
+    IDispatch* const tarn = Item();
+    void** const slots = *reinterpret_cast<void***>(tarn);
+    reinterpret_cast<HRESULT(__stdcall*)(void*)>(slots[9])(tarn);
+    if (GetErrorInfo(0, &error) == S_OK) error->Release();
+  };
+  on["call 7"] = [&] { host.AnswerTexts({std::string(500, 'y'), "z"}); };
+  FailEach(dll, "a run", [&] {
+    Describe("Language=JScript\r\nMacroBegin=" + std::string(400, 'x'));
+    Run();
+  });
+  for (const char* step : {"AddNamedItem tarn 2", "ParseScriptText", "SetScriptState 2"}) {
+    FailEach(dll, step, [&] {
+      results = {{step, E_FAIL}};
+      Run();
+      results.clear();
+    });
+  }
+}
+
+TEST_F(AllocationTest, OfVersion) {
+  FailEach(dll, "version", [&] {
+    Describe("Language=JScript\r\nMacroEnd=a\\nb\r\n" + std::string(3000, 'x'));
+    char record[392] = {'\x88', 1};  // its size
+    CallExport<bool>(dll, "version", &record[0], "C:\\windows\\temp\\torture");
+  });
+}
