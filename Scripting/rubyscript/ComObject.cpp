@@ -45,6 +45,10 @@ VALUE comObjectClass = Qnil;
 
 Wrapped& Unwrap(VALUE object) { return *static_cast<Wrapped*>(rb_check_typeddata(object, &kType)); }
 
+// Not rb_memerror: its mark on the thread stays where no Ruby code is between here and what catches
+// the error, and with the mark set the next one ends the process.
+[[noreturn]] void RaiseNoMemory() { rb_raise(rb_eNoMemError, "failed to allocate memory"); }
+
 // --- Calls ---------------------------------------------------------------------------------------
 
 struct NameLookup final : HostCall {
@@ -153,7 +157,7 @@ HRESULT LookUp(Wrapped& wrapped, const char* name, long length, DISPID& id) {
   NameLookup lookup;
   lookup.dispatch = wrapped.dispatch;
   lookup.name = TextToHost(name, static_cast<UINT>(length), wrapped.form);
-  if (!lookup.name) rb_memerror();
+  if (!lookup.name) RaiseNoMemory();
   const bool goesOn = Interpreter::CallHost(lookup);
   SysFreeString(lookup.name);
   if (!goesOn) LeaveTask();
@@ -230,7 +234,7 @@ VALUE Invoke(const Wrapped& wrapped, VALUE name, DISPID id, WORD flags, int coun
   call.parameters.rgvarg = few;
   if (count > kFewArguments)
     call.parameters.rgvarg = static_cast<VARIANT*>(calloc(static_cast<size_t>(count), sizeof *few));
-  if (!call.parameters.rgvarg) rb_memerror();
+  if (!call.parameters.rgvarg) RaiseNoMemory();
   if (flags == DISPATCH_PROPERTYPUT) {
     call.parameters.cNamedArgs = 1;
     call.parameters.rgdispidNamedArgs = &putId;
@@ -239,7 +243,7 @@ VALUE Invoke(const Wrapped& wrapped, VALUE name, DISPID id, WORD flags, int coun
   const bool goesOn = filled && Interpreter::CallHost(call);
   for (int i = 0; i < count; ++i) VariantClear(&call.parameters.rgvarg[i]);
   if (count > kFewArguments) free(call.parameters.rgvarg);
-  if (!filled) rb_memerror();
+  if (!filled) RaiseNoMemory();
   if (!goesOn) {
     DropResult(call, wrapped.form);
     LeaveTask();
@@ -334,7 +338,7 @@ void DefineComObject(VALUE module) {
 
 VALUE NewComObject(IDispatch* dispatch, TextForm form, VALUE name) {
   Wrapped* const wrapped = static_cast<Wrapped*>(calloc(1, sizeof(Wrapped)));
-  if (!wrapped) rb_memerror();
+  if (!wrapped) RaiseNoMemory();
   *wrapped = {dispatch, Interpreter::Owner(), form, name, Qnil, nullptr, live};
   if (live) live->previous = wrapped;
   live = wrapped;

@@ -9,6 +9,7 @@ class AllocationTest : public TortureTest {
   using TortureTest::TortureTest;
 
   // Does `action` with one request more that succeeds each time, until none of them fails.
+  // An action of the Ruby engine leaves blocks to its collector.
   void FailEach(HMODULE module, const char* what, const std::function<void()>& action) {
     WatchMemory(module);
     bool faulted = false;
@@ -65,4 +66,25 @@ TEST_F(AllocationTest, OfVersion) {
     char record[392] = {'\x88', 1};  // its size
     CallExport<bool>(dll, "version", &record[0], "C:\\windows\\temp\\torture");
   });
+}
+
+class RubyAllocationTest : public AllocationTest {
+ protected:
+  RubyAllocationTest() : AllocationTest((ActivateRuby(), ""), "@tarn.f(1)\n") {}
+};
+
+// Not the interpreter's own: a request that fails there is tried again.
+TEST_F(RubyAllocationTest, OfARunInTheEngine) {
+  on["call 7"] = [&] { host.AnswerTexts({"t\xC3\xA4xt"}); };
+  const std::pair<const char*, const char*> macros[] = {
+      {"a Ruby macro with calls",
+       "@tarn.f(1, 2.5, 'text', :symbol, 2**70, nil, true); @tarn.g('x' * 300, *1..20)\n"},
+      {"a Ruby macro with an error", "Thread.new { 1 }.join\ndef x = 1\nraise 'message'\n"},
+      {"a wrong Ruby macro", "x = = 1\n"},
+      {"a Ruby macro with an unknown name", "@tarn.unknown(1)\n"}};
+  for (const auto& [name, macro] : macros)
+    FailEach(GetModuleHandleA("rubyscript.dll"), name, [&] {
+      WriteBytes(macroPath, macro);
+      Run();
+    });
 }
