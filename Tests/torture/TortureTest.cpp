@@ -35,6 +35,7 @@ TortureTest::TortureTest(const std::string& description, const std::string& macr
   ReplaceImport(dll, "MessageBoxA", reinterpret_cast<void*>(AnswerBox));
   right = RightRun();
   EXPECT_NE(std::string::npos, right.find("execute returned 1,")) << right;
+  on = {{"report: Tarn has", [] { ADD_FAILURE() << "a fault"; }}};
 }
 
 void TortureTest::TearDown() {
@@ -75,7 +76,8 @@ void TortureTest::Repeat(const char* what, int rounds, int often,
   Figure("%d %s: %u KiB and %u handles after a tenth, %u KiB and %u handles at the end", rounds,
          what, early.kilobytes, early.handles, late.kilobytes, late.handles);
   EXPECT_LE(late.handles, early.handles + early.handles / 100) << what;
-  EXPECT_LE(late.kilobytes, early.kilobytes + early.kilobytes / 100) << what;
+  const unsigned warmingUp = Rounds(0, 512);
+  EXPECT_LE(late.kilobytes, early.kilobytes + early.kilobytes / 100 + warmingUp) << what;
 }
 
 std::string TortureTest::Bytes(size_t longest) {

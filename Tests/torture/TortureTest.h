@@ -22,7 +22,7 @@ void ActivateRuby();
 
 class TortureTest : public ModuleTest {
  protected:
-  // A right run is one of `macro` in the language that is described.
+  // Plans that each fault fails the test. A right run is one of `macro` in the language that is described.
   explicit TortureTest(const std::string& description = "Language=JScript\r\n",
                        const std::string& macro = "\n");
   // Nothing was left behind; there is no transcript to compare.
