@@ -22,7 +22,8 @@ void Log(const std::string& line) {
 HMODULE LoadModule(const std::string& folder) {
   const std::string path = folder + "\\scriptruby.dll";
   fs::create_directories(folder);
-  fs::copy_file(SCRIPTRUBY_DLL, path, fs::copy_options::overwrite_existing);
+  const char* const other = std::getenv("SCRIPTRUBY_TEST_DLL");
+  fs::copy_file(other ? other : SCRIPTRUBY_DLL, path, fs::copy_options::overwrite_existing);
   return LoadLibraryA(path.c_str());
 }
 

@@ -16,7 +16,8 @@
 
 using namespace std::string_literals;
 
-// A copy of the DLL in a folder of its own, loaded from there.
+// A copy of the DLL in a folder of its own, loaded from there: the one that ships, or the one that the
+// environment variable SCRIPTRUBY_TEST_DLL names.
 HMODULE LoadModule(const std::string& folder);
 inline HMODULE dll;  // loaded from testFolder
 

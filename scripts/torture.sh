@@ -1,0 +1,103 @@
+#!/usr/bin/env bash
+# SPDX-License-Identifier: MIT
+# The whole length of what ctest does for seconds, and prints its figures:
+#
+#   scripts/torture.sh [memory | values | files | hosts | faults | soak | fuzz | undefined | tidy]...
+#
+# Without arguments all of them, which takes about an hour on an idle machine. The figures go to
+# Docs/reliability.md as well, each under the command that made it. SCRIPTRUBY_TORTURE_SEED repeats a
+# random test by the seed that it printed; FUZZ_SECONDS is the time for each fuzz target (60).
+#
+# Sets the machine up and builds first when needed.
+set -euo pipefail
+source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
+
+PACKAGES+=(clang-tidy-19)
+REPORT=$ROOT/Docs/reliability.md
+ALL=(memory values files hosts faults soak fuzz undefined tidy)
+failed=0
+
+# Puts the standard input in place of the section's block of figures.
+keep_figures() { # keep_figures SECTION
+  awk -v heading="## $1" -v figures=/dev/stdin '
+    /^## / { inside = ($0 == heading) }
+    inside && /^```/ {
+      if (!skipping) { print; while ((getline line < figures) > 0) print line }
+      skipping = !skipping
+    }
+    !skipping || !inside { print }' "$REPORT" >"$REPORT.new"
+  mv "$REPORT.new" "$REPORT"
+}
+
+# record SECTION SHOWN COMMAND...: runs the command from the root; SHOWN is how to repeat it.
+record() {
+  local section=$1 shown=$2 log=$LOGS/torture-$1.log status=0
+  shift 2
+  say "-- $section"
+  mkdir -p "$LOGS"
+  (cd "$ROOT" && "$@") >"$log" 2>&1 </dev/null || status=$?
+  { echo "\$ $shown" && sed -n 's/^figure: //p' "$log" | tr -d '\r'; } |
+    tee /dev/stderr | keep_figures "$section"
+  if [ "$status" != 0 ]; then
+    tail -n 30 "$log" >&2
+    say "error: $section failed (whole output: $log)"
+    failed=1
+  fi
+}
+
+long_test() { # long_test SECTION FILTER
+  record "$1" "SCRIPTRUBY_TORTURE=1 wine build/release/bin/torture_tests.exe --gtest_filter='$2'" \
+    env SCRIPTRUBY_TORTURE=1 timeout 14400 wine build/release/bin/torture_tests.exe "--gtest_filter=$2"
+}
+
+fuzz() {
+  local target found=build/fuzz seconds=${FUZZ_SECONDS:-60} log status=0
+  for target in Tests/fuzz/corpus/*; do
+    target=${target##*/}
+    log=$found/$target.log
+    mkdir -p "$found/$target"
+    build/release/native/bin/"${target}Fuzz" -max_total_time="$seconds" -artifact_prefix="$found/" \
+      "$found/$target" "Tests/fuzz/corpus/$target" >"$log" 2>&1 || status=1
+    cat "$log"
+    sed -En "s/^#([0-9]+)\\s+DONE +cov: ([0-9]+).*/figure: $target: \\1 inputs, \\2 edges, no difference/p" \
+      "$log"
+  done
+  return $status
+}
+
+undefined() {
+  SCRIPTRUBY_TEST_DLL=build/release/bin/trapping/scriptruby.dll \
+    timeout 3600 wine build/release/bin/module_tests.exe --gtest_color=no >"$LOGS/undefined.out" || return
+  sed -n 's/^\[==========\] \(.*\) ran\..*/figure: \1, no trap/p' "$LOGS/undefined.out"
+}
+
+tidy() {
+  local files=(Core/*/*.cpp Scripting/scriptruby/*.cpp)
+  clang-tidy-19 -p build/release --quiet --extra-arg=-Wno-unused-command-line-argument "${files[@]}" &&
+    echo "figure: ${#files[@]} files, no finding"
+}
+
+run() {
+  case $1 in
+  memory) long_test memory '*Allocation*' ;;
+  values) long_test values 'RandomCall*' ;;
+  files) long_test files 'RandomFile*' ;;
+  hosts) long_test hosts 'RandomHost*' ;;
+  faults) long_test faults 'FaultMix*' ;;
+  soak) long_test soak '*Soak*' ;;
+  fuzz) record fuzz "FUZZ_SECONDS=${FUZZ_SECONDS:-60} scripts/torture.sh fuzz" fuzz ;;
+  undefined)
+    record undefined "SCRIPTRUBY_TEST_DLL=build/release/bin/trapping/scriptruby.dll \
+wine build/release/bin/module_tests.exe" undefined
+    ;;
+  tidy) record tidy "clang-tidy-19 -p build/release Core/*/*.cpp Scripting/scriptruby/*.cpp" tidy ;;
+  esac
+}
+
+[ $# -gt 0 ] || set -- "${ALL[@]}"
+for section; do
+  [[ " ${ALL[*]} " == *" $section "* ]] || STATUS=2 die "no such section: $section (there are: ${ALL[*]})"
+done
+prepare torture_tests module_tests scriptruby_trapping core_native
+for section; do run "$section"; done
+exit $failed
