@@ -36,8 +36,9 @@ record() {
   say "-- $section"
   mkdir -p "$LOGS"
   (cd "$ROOT" && "$@") >"$log" 2>&1 </dev/null || status=$?
-  { echo "\$ $shown" && sed -n 's/^figure: //p' "$log" | tr -d '\r'; } |
-    tee /dev/stderr | keep_figures "$section"
+  { echo "\$ $shown" && sed -n 's/^figure: //p' "$log" | tr -d '\r'; } >"$log.figures"
+  cat "$log.figures"
+  keep_figures "$section" <"$log.figures"
   if [ "$status" != 0 ]; then
     tail -n 30 "$log" >&2
     say "error: $section failed (whole output: $log)"

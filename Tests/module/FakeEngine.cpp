@@ -70,6 +70,7 @@ HRESULT __stdcall CreateInstance(void*, IUnknown*, REFIID riid, void** object) {
             AddNamedItem, Unused, Unused, Unused, Unused, Unused, InterruptScriptThread, Unused);
   static auto parser = Table(QueryInterface, AddRef, Release, InitNew, Unused, ParseScriptText);
   static std::deque<FakeEngine> engines;  // kept: a run that was stopped has forgotten its own
+  if (engines.size() > 1000) engines.pop_front();  // is long over
   engines.push_back({script.data(), parser.data(), nullptr});
   return QueryInterface(&engines.back(), riid, object);
 }
