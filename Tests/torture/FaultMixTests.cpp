@@ -57,6 +57,7 @@ class FaultMixTest : public TortureTest {
 TEST_F(FaultMixTest, EachRunEndsAsItShould) {
   on = {{"call 7", [&] { Function(); }}, {"engine: SetScriptState 2", [&] { Script(); }}};
   const int each = Rounds(10000, 20);
+  SCOPED_TRACE("the first trace opens a handle");
   const Resources before = Used();
   int runs = 0;
   // Every ending at every place that often, in random order, and what is nested besides.
