@@ -1,200 +1,208 @@
 // SPDX-License-Identifier: MIT
 #include "CallBenchmark.h"
 
-#include <windows.h>
-// They need windows.h before them, and this order.
-#include <oaidl.h>
-
-#include <activscp.h>
-
 #include <cstdio>
-#include <cwchar>
+#include <cstdlib>
 #include <iterator>
-#include <string>
 
-#include "Comparison.h"
+#include "BareObject.h"
+#include "FakeEngine.h"
+#include "Module.h"
+#include "Section.h"
 
 namespace {
 
-// The parser's 32-bit form; libraries do not carry its identifier.
-constexpr IID kActiveScriptParse = {
-    0xBB1A2AE2, 0xA4F9, 0x11CF, {0x8F, 0x20, 0x00, 0x80, 0x5F, 0x2C, 0xD0, 0x64}};
-
-// Of the called object, in this process only.
-constexpr CLSID kTargetClass = {
-    0x7D4F1B1A, 0x93C6, 0x4E57, {0xA1, 0x0B, 0x5E, 0x0D, 0x2F, 0x64, 0x38, 0x9C}};
-constexpr wchar_t kTargetClassText[] = L"{7D4F1B1A-93C6-4E57-A10B-5E0D2F64389C}";
-
-constexpr char kMacro[] = {
+constexpr char kRubyLoops[] = {
 #embed "calls.rb" suffix(, 0)
 };
 
-// The called object. It is never freed; its count is a formality.
-class Target final : public IDispatch {
- public:
-  // In the order of the macro's loops.
-  Comparison comparisons[2] = {
-      {"call with 3 arguments : win32ole", Comparison::Measure::kRatio, 1},
-      {"call without arguments : win32ole", Comparison::Measure::kRatio, 1}};
+bool Succeeded(HRESULT result, const char* what) {
+  if (SUCCEEDED(result)) return true;
+  std::fprintf(stderr, "%s failed: 0x%08lX\n", what, static_cast<unsigned long>(result));
+  return false;
+}
 
-  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID id, void** object) override {
-    const bool known = id == IID_IUnknown || id == IID_IDispatch;
-    *object = known ? this : nullptr;
-    return known ? S_OK : E_NOINTERFACE;
-  }
-  ULONG STDMETHODCALLTYPE AddRef() override { return 2; }
-  ULONG STDMETHODCALLTYPE Release() override { return 1; }
+std::wstring Wide(const std::string& ascii) { return std::wstring(ascii.begin(), ascii.end()); }
 
-  HRESULT STDMETHODCALLTYPE GetTypeInfoCount(UINT* count) override {
-    *count = 0;
-    return S_OK;
-  }
-  HRESULT STDMETHODCALLTYPE GetTypeInfo(UINT, LCID, ITypeInfo**) override { return E_NOTIMPL; }
-  HRESULT STDMETHODCALLTYPE GetIDsOfNames(REFIID, LPOLESTR* names, UINT, LCID,
-                                          DISPID* ids) override {
-    for (DISPID id = 0; id < static_cast<DISPID>(std::size(kNames)); ++id) {
-      if (std::wcscmp(names[0], kNames[id]) != 0) continue;
-      ids[0] = id;
-      return S_OK;
+// --- From scripts --------------------------------------------------------------------------------
+
+constexpr int kScriptCalls = 20000;
+
+std::string JScriptLoop(const std::string& call) {
+  return "tarn.start(); for (var i = 0; i < " + std::to_string(kScriptCalls) + "; ++i) " + call +
+         "; tarn.finish();";
+}
+
+bool CompareJScript(Section& section, Module& module, const std::string& call, double goal) {
+  const std::string text = JScriptLoop(call);
+  const std::wstring wide = Wide(text);
+  const std::string macro = module.Macro("calls.js", text);
+  BareObject bare;
+  Comparison comparison("JScript, `" + call + "` : bare object", Comparison::Measure::kRatio, goal);
+  const auto own = [&] {
+    return module.TimeRun(macro) < 0 ? -1 : module.host.clock.Seconds() / kScriptCalls;
+  };
+  const auto peer = [&] {
+    const bool ran = Succeeded(RunBare(L"JScript", bare, wide.c_str()), "the bare JScript");
+    return ran ? bare.clock.Seconds() / kScriptCalls : -1;
+  };
+  if (!comparison.Measured(own, peer)) return false;
+  section.Add(comparison);
+  return true;
+}
+
+// The macro measures both by itself, in one interpreter.
+bool CompareRuby(Section& section) {
+  // For the rest of the process: win32ole lets go of the object when Ruby collects it.
+  static BareObject bare;
+  if (!Succeeded(RegisterBareObject(bare), "registering the object")) return false;
+  using Measure = Comparison::Measure;
+  Comparison whole[] = {{"Ruby, `f(1, \"text\", 2.5)` : win32ole", Measure::kRatio, 1},
+                        {"Ruby, `f()` : win32ole", Measure::kRatio, 1}};
+  Comparison engine[] = {
+      {"Ruby engine alone, `f(1, \"text\", 2.5)` : win32ole", Measure::kRatio, 1},
+      {"Ruby engine alone, `f()` : win32ole", Measure::kRatio, 1}};
+  Module module("");
+  module.host.comparisons = whole;
+  bare.comparisons = engine;
+  if (module.TimeRun(module.Macro("calls.rbs", kRubyLoops)) < 0 ||
+      !Succeeded(RunBare(L"RubyScript", bare, Wide(kRubyLoops).c_str()), "the bare Ruby"))
+    return false;
+  for (const Comparison& each : whole) section.Add(each);
+  for (const Comparison& each : engine) section.Add(each);
+  return true;
+}
+
+// --- Straight ------------------------------------------------------------------------------------
+
+constexpr int kDirectCalls = 20000;
+
+bool Lookup(IDispatch& object) {
+  LPOLESTR names[] = {const_cast<LPOLESTR>(L"f")};
+  DISPID id = 0;
+  return object.GetIDsOfNames(IID_NULL, names, 1, LOCALE_USER_DEFAULT, &id) == S_OK && id == kF;
+}
+
+// Arguments in COM's order: the last first.
+bool Invoke(IDispatch& object, DISPID id, std::vector<VARIANT>& arguments) {
+  DISPPARAMS parameters = {arguments.data(), nullptr, static_cast<UINT>(arguments.size()), 0};
+  VARIANT result = {};
+  const HRESULT outcome = object.Invoke(id, IID_NULL, LOCALE_USER_DEFAULT, DISPATCH_METHOD,
+                                        &parameters, &result, nullptr, nullptr);
+  const bool right = outcome == S_OK && result.vt == (id == kText ? VT_BSTR : VT_I4);
+  VariantClear(&result);
+  return right;
+}
+
+struct DirectCase {
+  const char* title;
+  bool lookup;
+  DISPID id;  // kUnknown: no call
+  std::vector<VARIANT> arguments;
+};
+
+// Seconds of one such call; negative when it failed.
+double TimeDirect(IDispatch& object, DirectCase& each) {
+  bool succeeded = true;
+  const double seconds = SecondsPerCall(kDirectCalls, [&] {
+    if (each.lookup) succeeded &= Lookup(object);
+    if (each.id != kUnknown) succeeded &= Invoke(object, each.id, each.arguments);
+  });
+  return succeeded ? seconds : -1;
+}
+
+bool CompareDirect(Section& section, IDispatch& tarn) {
+  VARIANT one = Value(VT_I4, 1);
+  VARIANT real = Value(VT_R8, 2.5);
+  VARIANT text = Value(VT_BSTR, SysAllocString(L"text"));
+  DirectCase cases[] = {
+      {"lookup and `f()`", true, kF, {}},
+      {"lookup and `f(1, \"text\", 2.5)`", true, kF, {real, text, one}},
+      {"lookup alone", true, kUnknown, {}},
+      {"`f()` alone", false, kF, {}},
+      {"`f(1)` alone", false, kF, {one}},
+      {"`f(\"text\")` alone", false, kF, {text}},
+      {"`f(2.5)` alone", false, kF, {real}},
+      {"`text()` alone, a text result", false, kText, {}},
+  };
+  BareObject bare;
+  bool succeeded = true;
+  for (DirectCase& each : cases) {
+    Comparison comparison("C++, " + std::string(each.title) + " : bare object");
+    if (!comparison.Measured([&] { return TimeDirect(tarn, each); },
+                             [&] { return TimeDirect(bare, each); })) {
+      std::fprintf(stderr, "%s failed\n", each.title);
+      succeeded = false;
+      break;
     }
-    ids[0] = DISPID_UNKNOWN;
-    return DISP_E_UNKNOWNNAME;
+    section.Add(comparison);
   }
-  HRESULT STDMETHODCALLTYPE Invoke(DISPID id, REFIID, LCID, WORD, DISPPARAMS* parameters,
-                                   VARIANT* result, EXCEPINFO*, UINT*) override {
-    switch (id) {
-      case kCall:
-        if (result) {
-          result->vt = VT_I4;
-          result->lVal = 42;
-        }
-        return S_OK;
-      case kClassId:
-        if (!result) return S_OK;
-        result->vt = VT_BSTR;
-        result->bstrVal = SysAllocString(kTargetClassText);
-        return S_OK;
-      case kTake: {
-        if (parameters->cArgs != 3) return DISP_E_BADPARAMCOUNT;
-        const VARIANT* const last = parameters->rgvarg;
-        comparisons[last[2].lVal].Add(last[1].dblVal, last[0].dblVal);
-        return S_OK;
-      }
-      default:
-        return DISP_E_MEMBERNOTFOUND;
-    }
-  }
+  SysFreeString(text.bstrVal);
+  return succeeded;
+}
 
- private:
-  enum : DISPID { kCall, kClassId, kTake };
-  static constexpr const wchar_t* kNames[] = {L"f", L"class_id", L"take"};
-};
+void* volatile block;  // keeps the compiler from leaving an allocation out
 
-// Hands out the one object, as if it made it.
-class TargetFactory final : public IClassFactory {
- public:
-  explicit TargetFactory(Target& object) : target(object) {}
+void PrintPart(Section& section, const char* name, void (*part)()) {
+  std::vector<double> seconds;
+  for (int round = 0; round < Comparison::kRounds; ++round)
+    seconds.push_back(SecondsPerCall(kDirectCalls, part));
+  section.Print("| " + std::string(name) + " | " + TimeText(Median(seconds)) + " |\n");
+}
 
-  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID id, void** object) override {
-    const bool known = id == IID_IUnknown || id == IID_IClassFactory;
-    *object = known ? this : nullptr;
-    return known ? S_OK : E_NOINTERFACE;
-  }
-  ULONG STDMETHODCALLTYPE AddRef() override { return 2; }
-  ULONG STDMETHODCALLTYPE Release() override { return 1; }
-  HRESULT STDMETHODCALLTYPE CreateInstance(IUnknown*, REFIID id, void** object) override {
-    return target.QueryInterface(id, object);
-  }
-  HRESULT STDMETHODCALLTYPE LockServer(BOOL) override { return S_OK; }
-
- private:
-  Target& target;
-};
-
-class Site final : public IActiveScriptSite {
- public:
-  explicit Site(Target& object) : target(object) {}
-
-  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID id, void** object) override {
-    const bool known = id == IID_IUnknown || id == IID_IActiveScriptSite;
-    *object = known ? this : nullptr;
-    return known ? S_OK : E_NOINTERFACE;
-  }
-  ULONG STDMETHODCALLTYPE AddRef() override { return 2; }
-  ULONG STDMETHODCALLTYPE Release() override { return 1; }
-
-  HRESULT STDMETHODCALLTYPE GetLCID(LCID*) override { return E_NOTIMPL; }
-  HRESULT STDMETHODCALLTYPE GetItemInfo(LPCOLESTR, DWORD, IUnknown** item, ITypeInfo**) override {
-    *item = &target;
-    return S_OK;
-  }
-  HRESULT STDMETHODCALLTYPE GetDocVersionString(BSTR*) override { return E_NOTIMPL; }
-  HRESULT STDMETHODCALLTYPE OnScriptTerminate(const VARIANT*, const EXCEPINFO*) override {
-    return S_OK;
-  }
-  HRESULT STDMETHODCALLTYPE OnStateChange(SCRIPTSTATE) override { return S_OK; }
-  HRESULT STDMETHODCALLTYPE OnScriptError(IActiveScriptError* error) override {
-    EXCEPINFO exception = {};
-    error->GetExceptionInfo(&exception);
-    std::fprintf(stderr, "%ls\n", exception.bstrDescription);
-    SysFreeString(exception.bstrSource);
-    SysFreeString(exception.bstrDescription);
-    SysFreeString(exception.bstrHelpFile);
-    return S_OK;
-  }
-  HRESULT STDMETHODCALLTYPE OnEnterScript() override { return S_OK; }
-  HRESULT STDMETHODCALLTYPE OnLeaveScript() override { return S_OK; }
-
- private:
-  Target& target;
-};
-
-HRESULT RunMacro(Site& site) {
-  CLSID classId;
-  HRESULT result = CLSIDFromProgID(L"RubyScript", &classId);
-  void* object = nullptr;
-  if (SUCCEEDED(result))
-    result =
-        CoCreateInstance(classId, nullptr, CLSCTX_INPROC_SERVER, __uuidof(IActiveScript), &object);
-  if (FAILED(result)) return result;
-  IActiveScript* const engine = static_cast<IActiveScript*>(object);
-  result = engine->QueryInterface(kActiveScriptParse, &object);
-  if (SUCCEEDED(result)) {
-    IActiveScriptParse* const parser = static_cast<IActiveScriptParse*>(object);
-    const std::wstring text(kMacro, kMacro + std::size(kMacro) - 1);
-    result = engine->SetScriptSite(&site);
-    if (SUCCEEDED(result)) result = parser->InitNew();
-    if (SUCCEEDED(result)) result = engine->AddNamedItem(L"tarn", SCRIPTITEM_ISVISIBLE);
-    if (SUCCEEDED(result))
-      result = parser->ParseScriptText(text.c_str(), nullptr, nullptr, nullptr, 0, 0, 0, nullptr,
-                                       nullptr);
-    if (SUCCEEDED(result)) result = engine->SetScriptState(SCRIPTSTATE_CONNECTED);
-    parser->Release();
-  }
-  engine->Close();
-  engine->Release();
-  return result;
+void PrintParts(Section& section) {
+  section.Print("\nWhat its parts cost by themselves:\n\n| part | time |\n|---|--:|\n");
+  PrintPart(section, "`malloc` and `free` of an argument's 48 bytes", [] {
+    block = std::malloc(48);
+    std::free(block);
+  });
+  PrintPart(section, "`malloc` and `free` of a list of 50 slots, zeroed", [] {
+    block = std::calloc(50, 4);
+    std::free(block);
+  });
+  PrintPart(section, "an integer as text by the C runtime", [] {
+    char text[64];
+    _snprintf(text, sizeof text, "%ld", 1L);
+    block = text;
+  });
+  PrintPart(section, "a real as text by the C runtime", [] {
+    char text[400];
+    _snprintf(text, sizeof text, "%lf", 2.5);
+    block = text;
+  });
+  PrintPart(section, "`SysAllocString` and `SysFreeString` of four characters", [] {
+    const BSTR text = SysAllocString(L"text");
+    SysFreeString(text);
+  });
+  PrintPart(section, "`SetErrorInfo(0, nullptr)`", [] { SetErrorInfo(0, nullptr); });
 }
 
 }  // namespace
 
-bool CompareCalls() {
-  // For the rest of the process: win32ole lets go of the object when Ruby collects it.
-  static Target target;
-  static TargetFactory factory(target);
-  Site site(target);
-  DWORD cookie = 0;
-  HRESULT result = CoRegisterClassObject(kTargetClass, &factory, CLSCTX_INPROC_SERVER,
-                                         REGCLS_MULTIPLEUSE, &cookie);
-  if (SUCCEEDED(result)) {
-    result = RunMacro(site);
-    CoRevokeClassObject(cookie);
-  }
-  if (FAILED(result)) {
-    std::fprintf(stderr, "the benchmark of calls failed: 0x%08lX\n",
-                 static_cast<unsigned long>(result));
-    return false;
-  }
-  for (const Comparison& each : target.comparisons) each.Print();
-  return true;
+bool CompareCalls(Section& section) {
+  section.Begin(
+      "Calls from a script",
+      "One call of a macro function, its share of the script's loop included: by "
+      "`tarn` through the module, and of a COM object that converts nothing in the same "
+      "script engine. \"Ruby engine alone\" is that object as `tarn`, without the module.");
+  section.Head();
+  Module module(JScriptDescription());
+  return CompareJScript(section, module, "tarn.f()", 1.5) &&
+         CompareJScript(section, module, "tarn.f(1, \"text\", 2.5)", 2) && CompareRuby(section);
+}
+
+bool CompareDispatch(Section& section) {
+  section.Begin(
+      "A call without a script",
+      "The same object called from C++ by `GetIDsOfNames` and `Invoke`. The bare object's "
+      "calls are two virtual calls; the differences are the module's share of a call.");
+  section.Head();
+  RegisterFakeEngine();
+  Module module(kShortDescription);
+  bool succeeded = false;
+  on["engine: SetScriptState 2"] = [&] { succeeded = CompareDirect(section, *Item()); };
+  const bool ran = module.TimeRun(module.Macro("empty.js", "")) >= 0;
+  on.clear();
+  PrintParts(section);
+  return ran && succeeded;
 }

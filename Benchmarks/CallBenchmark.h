@@ -1,8 +1,14 @@
 // SPDX-License-Identifier: MIT
-// A call of a bare COM object from Ruby, through the engine and through Ruby's own win32ole, in one
-// interpreter.
+// Calls of macro functions: from scripts, and straight through IDispatch.
 #pragma once
 
-// On a thread with an apartment, for which the engine is activated. False, with the reason on
-// standard error, when it does not run.
-bool CompareCalls();
+class Section;
+
+// On a thread with an apartment, for which the Ruby engine is activated. False, with the reason on
+// standard error, when something does not run; an exception when a file is missing.
+
+// From JScript and from Ruby, against calls of an object that converts nothing.
+bool CompareCalls(Section& section);
+// The module's object against that one from C++, and what the parts of a call cost. For the rest of
+// the process JScript is an engine that does nothing.
+bool CompareDispatch(Section& section);

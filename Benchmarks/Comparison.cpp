@@ -4,27 +4,21 @@
 #include <windows.h>
 
 #include <algorithm>
+#include <cmath>
 #include <cstdio>
 
 namespace {
 
-std::string Time(double seconds) {
-  char text[32];
-  const bool small = seconds < 1e-3 && seconds > -1e-3;
-  std::snprintf(text, sizeof text, small ? "%.3f us" : "%.2f ms", seconds * (small ? 1e6 : 1e3));
-  return text;
-}
-
-std::string Ratio(double ratio) {
+std::string RatioText(double ratio) {
   char text[32];
   std::snprintf(text, sizeof text, "%.2fx", ratio);
   return text;
 }
 
-// "median (least..greatest)"
+// "median (least to greatest)"
 std::string Spread(const std::vector<double>& values, std::string (*format)(double)) {
   const auto [least, greatest] = std::minmax_element(values.begin(), values.end());
-  return format(Median(values)) + " (" + format(*least) + ".." + format(*greatest) + ")";
+  return format(Median(values)) + " (" + format(*least) + " to " + format(*greatest) + ")";
 }
 
 }  // namespace
@@ -43,28 +37,63 @@ double Median(std::vector<double> values) {
   return values.size() % 2 ? values[half] : (values[half - 1] + values[half]) / 2;
 }
 
-void PrintHead() {
-  std::printf("%-34s %10s %10s   %-21s %s\n", "medians (least..greatest)", "time", "peer's",
-              "ratio", "goal");
+std::string TimeText(double seconds) {
+  char text[32];
+  const double size = std::fabs(seconds);
+  const char* const format = size < 1e-3 ? "%.3f us" : size < 1 ? "%.2f ms" : "%.2f s";
+  std::snprintf(text, sizeof text, format, seconds * (size < 1e-3 ? 1e6 : size < 1 ? 1e3 : 1));
+  return text;
 }
 
-void Comparison::Print() const {
-  std::vector<double> times;
-  std::vector<double> peers;
-  std::vector<double> ratios;
-  std::vector<double> differences;
-  for (const Round& round : rounds) {
-    times.push_back(round.time);
-    peers.push_back(round.peer);
-    ratios.push_back(round.time / round.peer);
-    differences.push_back(round.time - round.peer);
-  }
-  const bool isRatio = measure == Measure::kRatio;
-  const bool met = Median(isRatio ? ratios : differences) <= goal;
-  const std::string goalText =
-      isRatio ? Ratio(goal) : Time(goal) + " more, is " + Spread(differences, Time);
-  std::printf("%-34s %10s %10s   %-21s %s %s\n", name.c_str(), Time(Median(times)).c_str(),
-              Time(Median(peers)).c_str(), Spread(ratios, Ratio).c_str(),
-              met ? "met:" : "missed:", goalText.c_str());
-  std::fflush(stdout);
+template <class Function>
+std::vector<double> Comparison::Values(Function function) const {
+  std::vector<double> values;
+  for (const Round& round : rounds) values.push_back(function(round));
+  return values;
+}
+
+std::vector<double> Comparison::Ratios() const {
+  return Values([](const Round& round) { return round.time / round.peer; });
+}
+
+std::vector<double> Comparison::Differences() const {
+  return Values([](const Round& round) { return round.time - round.peer; });
+}
+
+double Comparison::Time() const {
+  return Median(Values([](const Round& round) { return round.time; }));
+}
+
+double Comparison::PeerTime() const {
+  return Median(Values([](const Round& round) { return round.peer; }));
+}
+
+double Comparison::Ratio() const { return Median(Ratios()); }
+
+bool Comparison::IsMet() const {
+  return !goal || (measure == Measure::kRatio ? Ratio() : Median(Differences())) <= *goal;
+}
+
+std::string Comparison::GoalText() const {
+  if (!goal) return "";
+  if (measure == Measure::kRatio) return RatioText(*goal);
+  return TimeText(*goal) + " more; is " + Spread(Differences(), TimeText);
+}
+
+std::string Comparison::Row() const {
+  return "| " + name + " | " + TimeText(Time()) + " | " + TimeText(PeerTime()) + " | " +
+         Spread(Ratios(), RatioText) + " | " + GoalText() + " | " +
+         (!goal     ? ""
+          : IsMet() ? "met"
+                    : "**missed**") +
+         " |\n";
+}
+
+std::string Comparison::ChartLine() const {
+  const std::vector<double> ratios = Ratios();
+  const auto [least, greatest] = std::minmax_element(ratios.begin(), ratios.end());
+  char numbers[128];
+  std::snprintf(numbers, sizeof numbers, "\t%.4f\t%.4f\t%.4f\t", Median(ratios), *least, *greatest);
+  const bool ratioGoal = goal && measure == Measure::kRatio;
+  return name + numbers + (ratioGoal ? std::to_string(*goal) : "?") + "\n";
 }

@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: MIT
-// Times of one thing and of its peer, taken in turns, and the line of the table that they make.
+// Times of one thing and of its peer, taken in turns: what they make in a table and in a chart.
 #pragma once
 
+#include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 // Seconds since some time in the past.
@@ -10,8 +12,8 @@ double Now();
 
 double Median(std::vector<double> values);  // of at least one
 
-// Prints the table's head; the lines of Comparison follow.
-void PrintHead();
+// A time in the unit that suits its size.
+std::string TimeText(double seconds);
 
 class Comparison {
  public:
@@ -19,15 +21,45 @@ class Comparison {
   // the median of the rounds must not be above it.
   enum class Measure { kRatio, kDifference };
 
+  // Fewer rounds make no figure to rely on.
+  static constexpr int kRounds = 11;
+
   Comparison(std::string title, Measure goalMeasure, double goalValue)
       : name(std::move(title)), measure(goalMeasure), goal(goalValue) {}
+  // Without a goal.
+  explicit Comparison(std::string title) : name(std::move(title)) {}
 
   // One round, in seconds.
   void Add(double time, double peerTime) { rounds.push_back({time, peerTime}); }
 
-  // The median of each side, and median, least and greatest of the rounds' ratio and, when the goal
-  // is one, difference. At least one round is needed, and seven or more make a figure to rely on.
-  void Print() const;
+  // Rounds in which the two take turns at being first, so that what the order does evens out. Each
+  // side returns the seconds of one operation, negative when it failed; then the answer is false.
+  template <class Own, class Peer>
+  bool Measured(Own own, Peer peer) {
+    for (int round = 0; round < kRounds; ++round) {
+      double time = round % 2 == 0 ? own() : 0;
+      const double peerTime = peer();
+      if (round % 2 != 0) time = own();
+      if (time < 0 || peerTime < 0) return false;
+      Add(time, peerTime);
+    }
+    return true;
+  }
+
+  double Time() const;
+  double PeerTime() const;
+  double Ratio() const;
+  bool HasGoal() const { return goal.has_value(); }
+  bool IsMet() const;  // true without a goal
+
+  // The row of a table in Markdown under kHead. At least one round is needed.
+  std::string Row() const;
+  static constexpr char kHead[] =
+      "| what : its peer | time | peer's time | ratio (least to greatest) | goal | |\n"
+      "|---|--:|--:|---|---|---|\n";
+  // The line of a chart: name, ratio, least, greatest and goal (a question mark without one), by
+  // tabs.
+  std::string ChartLine() const;
 
  private:
   struct Round {
@@ -35,8 +67,22 @@ class Comparison {
     double peer;
   };
 
+  template <class Function>
+  std::vector<double> Values(Function function) const;
+  std::vector<double> Ratios() const;
+  std::vector<double> Differences() const;
+  std::string GoalText() const;
+
   std::string name;
-  Measure measure;
-  double goal;
+  Measure measure = Measure::kRatio;
+  std::optional<double> goal;
   std::vector<Round> rounds;
 };
+
+// Seconds of one call of `function`, from `count` of them.
+template <class Function>
+double SecondsPerCall(int count, Function function) {
+  const double start = Now();
+  for (int i = 0; i < count; ++i) function();
+  return (Now() - start) / count;
+}

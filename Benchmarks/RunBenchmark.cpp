@@ -1,139 +1,136 @@
 // SPDX-License-Identifier: MIT
 #include "RunBenchmark.h"
 
-#include <windows.h>
-
 #include <cstdio>
-#include <filesystem>
-#include <fstream>
 
-#include "Comparison.h"
-#include "FakeEngine.h"
-#include "RawHost.h"
+#include "BareObject.h"
+#include "Description.h"
+#include "Module.h"
+#include "Process.h"
+#include "Section.h"
 
 namespace fs = std::filesystem;
 
-// The host and the engine that does nothing tell what they see; here nobody listens.
-void Log(const std::string&) {}
-
 namespace {
 
-constexpr char kRuby[] = "RubyScript";
-constexpr char kNothing[] = "JScript";  // whose place the fake engine takes
+constexpr int kRuns = 40;  // a side and a round
 
-// A copy of the module, with the description of a language beside it, and an empty macro.
-class Module {
- public:
-  explicit Module(const std::string& progId)
-      : folder(fs::temp_directory_path() /
-               ("scriptruby-bench-" + std::to_string(GetCurrentProcessId()) + "-" + progId)),
-        macro((folder / "empty.rbs").string()) {
-    fs::create_directories(folder);
-    const fs::path copy = folder / "scriptruby.dll";
-    fs::copy_file(ProgramFolder() / "scriptruby.dll", copy, fs::copy_options::overwrite_existing);
-    std::ofstream(folder / "xMacroWSH.qwsh") << "[Options]\nLanguage=" << progId << "\n";
-    std::ofstream(macro).close();
-    dll = LoadLibraryW(copy.c_str());
-    void* const function = reinterpret_cast<void*>(GetProcAddress(dll, "execute"));
-    execute = reinterpret_cast<Execute>(function);
+// The median of a round's runs; negative when one has failed.
+template <class Run>
+double MedianOf(Run run) {
+  std::vector<double> seconds;
+  for (int i = 0; i < kRuns; ++i) {
+    seconds.push_back(run());
+    if (seconds.back() < 0) return -1;
   }
-  ~Module() {
-    FreeLibrary(dll);
-    std::error_code ignored;
-    fs::remove_all(folder, ignored);
-  }
-  Module(const Module&) = delete;
-  Module& operator=(const Module&) = delete;
-
-  // Seconds of one run; negative when it has failed.
-  double TimeRun() {
-    const double start = Now();
-    if (execute && execute(macro.c_str(), &host) == 1) return Now() - start;
-    std::fprintf(stderr, "the empty macro failed\n");
-    return -1;
-  }
-
- private:
-  using Execute = int(__stdcall*)(const char* file, RawHost* host);
-  const fs::path folder;
-  const std::string macro;
-  HMODULE dll;
-  Execute execute;
-  RawHost host;
-};
-
-struct Process {
-  double seconds;
-  DWORD exitCode;
-};
-
-// From its creation to its end. 259, the code of a process that goes on, also tells of failure.
-Process TimeProcess(std::wstring commandLine) {
-  STARTUPINFOW start = {};
-  start.cb = sizeof start;
-  PROCESS_INFORMATION process = {};
-  const double begin = Now();
-  if (!CreateProcessW(nullptr, commandLine.data(), nullptr, nullptr, FALSE, 0, nullptr, nullptr,
-                      &start, &process))
-    return {0, STILL_ACTIVE};
-  WaitForSingleObject(process.hProcess, INFINITE);
-  Process result = {Now() - begin, STILL_ACTIVE};
-  GetExitCodeProcess(process.hProcess, &result.exitCode);
-  CloseHandle(process.hThread);
-  CloseHandle(process.hProcess);
-  return result;
+  return Median(seconds);
 }
 
-std::wstring CommandLine(const fs::path& program, const char* arguments) {
-  return L"\"" + program.wstring() + L"\" " + fs::path(arguments).wstring();
+double TimeBareSteps(const wchar_t* progId) {
+  static BareObject object;
+  const double start = Now();
+  const HRESULT result = RunBare(progId, object, L"");
+  return SUCCEEDED(result) ? Now() - start : -1;
+}
+
+double TimeReads(const Module& module) {
+  const double start = Now();
+  return ReadDescription(module.DescriptionFile()) ? Now() - start : -1;
+}
+
+// Runs and their peers one by one, so that what disturbs the machine hits both.
+template <class Own, class Peer>
+bool CompareEach(Section& section, Comparison comparison, Own own, Peer peer) {
+  for (int round = 0; round < Comparison::kRounds; ++round) {
+    std::vector<double> peers;
+    const double time = MedianOf([&] {
+      peers.push_back(peer());
+      return peers.back() < 0 ? -1 : own();
+    });
+    if (time < 0) {
+      std::fprintf(stderr, "a run failed\n");
+      return false;
+    }
+    comparison.Add(time, Median(peers));
+  }
+  section.Add(comparison);
+  return true;
+}
+
+bool CompareJScriptRuns(Section& section) {
+  using Measure = Comparison::Measure;
+  Module module(JScriptDescription());
+  const std::string macro = module.Macro("empty.js", "");
+  const auto run = [&] { return module.TimeRun(macro); };
+  const auto steps = [] { return TimeBareSteps(L"JScript"); };
+  const auto stepsAndReads = [&] {
+    const double reads = TimeReads(module);
+    const double time = steps();
+    return reads < 0 || time < 0 ? -1 : reads + time;
+  };
+  if (run() < 0) return false;
+  return CompareEach(section, {"JScript : engine and profile reads", Measure::kRatio, 1}, run,
+                     stepsAndReads) &&
+         CompareEach(section, {"JScript : engine alone", Measure::kRatio, 1.5}, run, steps) &&
+         CompareEach(
+             section, Comparison("(fifteen profile reads : engine alone)"),
+             [&] { return TimeReads(module); }, steps);
+}
+
+constexpr char kEvaluation[] =
+    "start = Process.clock_gettime(Process::CLOCK_MONOTONIC)\n"
+    "1000.times { eval('') }\n"
+    "@tarn.take(0, 0, (Process.clock_gettime(Process::CLOCK_MONOTONIC) - start) / 1000)\n";
+
+bool CompareRubyRuns(Section& section) {
+  Module ruby("");
+  const std::string macro = ruby.Macro("empty.rbs", "");
+  const auto run = [&] { return ruby.TimeRun(macro); };
+  if (run() < 0) return false;  // which starts the engine
+  const std::string evaluation = ruby.Macro("evaluation.rbs", kEvaluation);
+  const auto evaluate = [&] {
+    Comparison told("");
+    ruby.host.comparisons = &told;
+    return ruby.TimeRun(evaluation) < 0 ? -1 : told.PeerTime();
+  };
+  using Measure = Comparison::Measure;
+  Module jscript(JScriptDescription());
+  const std::string other = jscript.Macro("empty.js", "");
+  Comparison evaluated("Ruby, a later run : `eval('')` in Ruby", Measure::kDifference, 1e-3);
+  if (!evaluated.Measured([&] { return MedianOf(run); }, evaluate)) return false;
+  section.Add(evaluated);
+  return CompareEach(section, {"Ruby, a later run : engine alone", Measure::kRatio, 1.5}, run,
+                     [] { return TimeBareSteps(L"RubyScript"); });
 }
 
 }  // namespace
 
-fs::path ProgramFolder() {
-  wchar_t path[MAX_PATH] = L"";
-  GetModuleFileNameW(nullptr, path, MAX_PATH);
-  return fs::path(path).parent_path();
-}
-
-bool CompareLaterRuns() {
-  constexpr int kRounds = 11;
-  constexpr int kRuns = 50;
-  RegisterFakeEngine();
-  Module ruby(kRuby);
-  Module nothing(kNothing);
-  if (ruby.TimeRun() < 0) return false;  // which starts the engine
-  Comparison comparison("later run of a macro : no engine", Comparison::Measure::kDifference, 1e-3);
-  for (int round = 0; round < kRounds; ++round) {
-    std::vector<double> times;
-    std::vector<double> peers;
-    for (int run = 0; run < kRuns; ++run) {
-      times.push_back(ruby.TimeRun());
-      peers.push_back(nothing.TimeRun());
-      if (times.back() < 0 || peers.back() < 0) return false;
-    }
-    comparison.Add(Median(times), Median(peers));
-  }
-  comparison.Print();
-  return true;
+bool CompareRuns(Section& section) {
+  section.Begin("Running an empty macro",
+                "`execute`, from the call to its return. \"Engine\" stands for the engine's steps "
+                "without the module: create it, give it a site and `tarn`, parse, connect, close. "
+                "JScript has the description file that ships with `macrorun`, Ruby none.");
+  section.Head();
+  return CompareJScriptRuns(section) && CompareRubyRuns(section);
 }
 
 unsigned FirstRunMicroseconds() {
-  Module module(kRuby);
-  const double seconds = module.TimeRun();
+  Module module("");
+  const double seconds = module.TimeRun(module.Macro("empty.rbs", ""));
   return seconds < 0 ? 0 : static_cast<unsigned>(seconds * 1e6);
 }
 
-bool CompareFirstRuns() {
-  constexpr int kRounds = 11;
+bool CompareFirstRuns(Section& section) {
   const fs::path folder = ProgramFolder();
-  const std::wstring own = CommandLine(folder / "benchmarks.exe", kFirstRunOption);
-  const std::wstring ruby = CommandLine(folder / "ruby" / "bin" / "ruby.exe", "-e \"\"");
-  Comparison run("first run of a macro : ruby.exe", Comparison::Measure::kRatio, 0.5);
-  Comparison whole("  with its process : ruby.exe", Comparison::Measure::kRatio, 0.5);
-  for (int round = 0; round < kRounds; ++round) {
-    const Process first = TimeProcess(own);
-    const Process peer = TimeProcess(ruby);
+  const std::wstring own =
+      CommandLine(folder / "benchmarks.exe", fs::path(kFirstRunOption).wstring());
+  const std::wstring ruby = CommandLine(folder / "ruby" / "bin" / "ruby.exe", L"-e \"\"");
+  using Measure = Comparison::Measure;
+  Comparison run("Ruby, the first run : process `ruby.exe -e \"\"`", Measure::kRatio, 0.5);
+  Comparison whole("the same with its process : process `ruby.exe -e \"\"`", Measure::kRatio, 0.5);
+  for (int round = 0; round < Comparison::kRounds; ++round) {
+    const ProcessTime first = TimeProcess(own);
+    const ProcessTime peer = TimeProcess(ruby);
     if (first.exitCode == 0 || first.exitCode == STILL_ACTIVE || peer.exitCode != 0) {
       std::fprintf(stderr, "a process failed: exit codes %lu and %lu\n", first.exitCode,
                    peer.exitCode);
@@ -142,7 +139,9 @@ bool CompareFirstRuns() {
     run.Add(first.exitCode / 1e6, peer.seconds);
     whole.Add(first.seconds, peer.seconds);
   }
-  run.Print();
-  whole.Print();
+  section.Begin("Starting Ruby", "The first macro of a process, which starts the interpreter.");
+  section.Head();
+  section.Add(run);
+  section.Add(whole);
   return true;
 }

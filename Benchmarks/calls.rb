@@ -4,7 +4,7 @@
 require "win32ole"
 
 ROUNDS = 11
-CALLS = 100_000
+CALLS = 50_000
 
 def seconds_per_call(object, loop_of_calls)
   GC.start

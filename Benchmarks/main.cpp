@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
-// benchmarks [calls | later | first]: prints the table, or the lines of one of its parts. The exit
-// code tells whether it could, not whether the goals are met.
+// benchmarks GROUP [FILE]: measures one group and prints its section of the results in Markdown;
+// FILE receives the numbers of its chart. Each group wants a process of its own. The exit code tells
+// whether it could be measured, not whether the goals are met.
 #include <windows.h>
 // Needs windows.h before it.
 #include <objbase.h>
@@ -11,10 +12,22 @@
 #include <string>
 
 #include "CallBenchmark.h"
-#include "Comparison.h"
+#include "Module.h"
 #include "RunBenchmark.h"
+#include "Section.h"
 
 namespace fs = std::filesystem;
+
+struct Group {
+  const char* name;
+  bool (*measure)(Section& section);
+};
+static constexpr Group kGroups[] = {
+    {"calls", CompareCalls},
+    {"dispatch", CompareDispatch},
+    {"runs", CompareRuns},
+    {"start", CompareFirstRuns},
+};
 
 // Has the calling thread find the engine beside this program, for the rest of the process.
 static bool ActivateEngine() {
@@ -27,25 +40,27 @@ static bool ActivateEngine() {
   return context != INVALID_HANDLE_VALUE && ActivateActCtx(context, &cookie);
 }
 
-static int Main(const std::string& part) {
-  const bool firstRun = part == kFirstRunOption;
+static int Main(const std::string& name, const std::string& chartFile) {
+  const bool firstRun = name == kFirstRunOption;
   if (FAILED(CoInitialize(nullptr)) || !ActivateEngine()) {
     std::fprintf(stderr, "the engine cannot be activated\n");
     return firstRun ? 0 : 1;
   }
   if (firstRun) return static_cast<int>(FirstRunMicroseconds());
-
-  PrintHead();
-  bool succeeded = true;
-  if (part.empty() || part == "calls") succeeded = CompareCalls() && succeeded;
-  if (part.empty() || part == "later") succeeded = CompareLaterRuns() && succeeded;
-  if (part.empty() || part == "first") succeeded = CompareFirstRuns() && succeeded;
-  return succeeded ? 0 : 1;
+  for (const Group& group : kGroups) {
+    if (name != group.name) continue;
+    Section section(chartFile);
+    return group.measure(section) ? 0 : 1;
+  }
+  std::fprintf(stderr, "usage: benchmarks GROUP [FILE], a group being one of");
+  for (const Group& group : kGroups) std::fprintf(stderr, " %s", group.name);
+  std::fprintf(stderr, "\n");
+  return 2;
 }
 
 int main(int count, char** arguments) {
   try {
-    return Main(count > 1 ? arguments[1] : "");
+    return Main(count > 1 ? arguments[1] : "", count > 2 ? arguments[2] : "");
   } catch (const std::exception& error) {
     std::fprintf(stderr, "%s\n", error.what());
     return 1;
