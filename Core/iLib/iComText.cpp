@@ -4,19 +4,21 @@
 #include <string.h>
 #include <windows.h>
 
-static char narrowBuffer[kNarrowLimit + 1];
+static NarrowText narrowBuffer;
 static wchar_t wideBuffer[kWideLimit];
 
-const char* NarrowFromWide(const wchar_t* text) {
-  memset(narrowBuffer, 0, sizeof narrowBuffer);
-  for (u32 i = 0; text && i < kNarrowLimit && text[i]; ++i)
-    narrowBuffer[i] = static_cast<char>(text[i] & 0xFF);
-  return narrowBuffer;
+const char* NarrowFromWide(const wchar_t* text, NarrowText& out) {
+  u32 size = 0;
+  for (; text && size < kNarrowLimit && (text[size] & 0xFF); ++size)
+    out[size] = static_cast<char>(text[size] & 0xFF);
+  out[size] = 0;
+  return out;
 }
 
+const char* NarrowFromWide(const wchar_t* text) { return NarrowFromWide(text, narrowBuffer); }
+
 const wchar_t* WideFromNarrow(const char* text) {
-  memset(wideBuffer, 0, sizeof wideBuffer);
-  if (!text) return wideBuffer;
+  if (!text) text = "";
   // Four bytes a unit are more than any code page needs, so a character that is cut at the end of
   // what is converted lies behind the last unit that is kept.
   wchar_t units[4 * kWideLimit];
@@ -28,5 +30,6 @@ const wchar_t* WideFromNarrow(const char* text) {
     if (IS_HIGH_SURROGATE(units[kept - 1])) --kept;
   }
   memcpy(wideBuffer, units, kept * sizeof(wchar_t));
+  wideBuffer[kept] = 0;
   return wideBuffer;
 }

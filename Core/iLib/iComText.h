@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // Text at the COM edge, through two module-wide buffers: each result is valid until the next
-// conversion in the same direction, so callers copy it first.
+// conversion in the same direction, so callers copy it first, or give a buffer of their own.
 //
 // Threading: none; the thread of the macro run only.
 #pragma once
@@ -13,6 +13,8 @@ constexpr u32 kWideLimit = 1024;   // units of a wide text, terminator included
 // The low byte of each UTF-16 unit, up to the terminator or kNarrowLimit characters; no code page
 // is involved, so a unit such as U+0100 ends the text. Null gives the empty text. Never null.
 const char* NarrowFromWide(const wchar_t* text);
+using NarrowText = char[kNarrowLimit + 1];
+const char* NarrowFromWide(const wchar_t* text, NarrowText& out);  // returns `out`
 
 // UTF-16 by the system's ANSI code page. A longer text delivers the leading units that convert to
 // whole characters. Null gives the empty text. Never null.

@@ -57,10 +57,10 @@ HRESULT xScript::GetIDsOfNames(REFIID riid, LPOLESTR* names, UINT count, LCID, D
   if (count == 0) return S_OK;
   if (!names || !ids) return E_POINTER;
   for (UINT i = 0; i < count; ++i) {
-    const String name(NarrowFromWide(names[i]));
-    const u32 id = current->FunctionId(name.Text());
+    NarrowText name;
+    const u32 id = current->FunctionId(NarrowFromWide(names[i], name));
     if (id == kUnknownFunction) {
-      const String text = String("Call to unknown macro scripting function:  ") + name.Text();
+      const String text = String("Call to unknown macro scripting function:  ") + name;
       if (host) host->ReportMessage(text.Text());
       return E_FAIL;
     }
@@ -102,21 +102,55 @@ static void SetArgument(xArgument& argument, VARIANT& value) {
   }
 }
 
-// Converts the arguments in the script's order; COM stores them last first. Empty values and
-// objects have no form that the host knows: they are skipped and later arguments move up. False: no
+// Empty values and objects have no form that the host knows: they are skipped and later arguments
+// move up.
+static bool IsSkipped(const VARIANT& value) {
+  return value.vt == VT_EMPTY || value.vt == VT_DISPATCH;
+}
+
+static bool IsPlain(const VARIANT& value) {
+  switch (value.vt) {
+    case VT_BSTR:
+    case VT_I1:
+    case VT_I2:
+    case VT_I4:
+    case VT_INT:
+    case VT_R8:
+      return true;
+    default:
+      return IsSkipped(value);
+  }
+}
+
+static bool ArePlain(const DISPPARAMS& params) {
+  for (UINT i = 0; params.rgvarg && i < params.cArgs; ++i)
+    if (!IsPlain(params.rgvarg[i])) return false;
+  return true;
+}
+
+// The argument for `index`: what a call before has left there, or a new one in its place. Null: no
 // memory.
+static xArgument* ElementAt(Array<xArgument>& arguments, i32 index) {
+  xArgument* const used = arguments.At(index);
+  if (used && used->IsOurs()) return used;
+  xArgument* const argument = new xArgument;
+  if (!argument || arguments.SetAt(argument, index) >= 0) return argument;
+  delete argument;
+  return nullptr;
+}
+
+// Makes the list the arguments in the script's order; COM stores them last first. False: no memory.
 static bool Convert(const DISPPARAMS& params, Array<xArgument>& arguments) {
+  i32 count = 0;
   for (UINT i = params.rgvarg ? params.cArgs : 0; i-- > 0;) {
     VARIANT& value = params.rgvarg[i];
-    if (value.vt == VT_EMPTY || value.vt == VT_DISPATCH) continue;
-    xArgument* argument = new xArgument;
+    if (IsSkipped(value)) continue;
+    xArgument* const argument = ElementAt(arguments, count);
     if (!argument) return false;
     SetArgument(*argument, value);
-    if (arguments.SetAt(argument, arguments.Count()) < 0) {
-      delete argument;
-      return false;
-    }
+    ++count;
   }
+  arguments.Cut(count);
   return true;
 }
 
@@ -129,17 +163,33 @@ static bool Move(Array<xArgument>& from, Array<xArgument>& to) {
   return true;
 }
 
-// Empties the record and fills its argument list. Null: no memory. What it needs is freed before
-// the host is called, which may never return.
-static HostContext* PrepareCall(HostInterface& host, const DISPPARAMS* params) {
-  // Converted before the record is touched: the value of an object may be the script's own code,
-  // whose calls pass through the same record.
+// Null, here and below: no memory. The list keeps its elements for the arguments that are to come,
+// unless a host has them for its own.
+static HostContext* FillPlain(HostInterface& host, const DISPPARAMS& params) {
+  HostContext& context = *host.Context();
+  Array<xArgument>& list = context.ArgumentList();
+  if (!list.OwnsElements()) list.Clear();
+  context.ResultTexts().Clear();
+  return Convert(params, list) ? &context : nullptr;
+}
+
+// The value of an object may be the script's own code, whose calls pass through the same record: it
+// is converted before the record is touched.
+static HostContext* FillFromObjects(HostInterface& host, const DISPPARAMS& params) {
   Array<xArgument> arguments;
-  if (params && !Convert(*params, arguments)) return nullptr;
+  if (!Convert(params, arguments)) return nullptr;
   HostContext& context = *host.Context();
   context.ArgumentList().Clear();
   context.ResultTexts().Clear();
   return Move(arguments, context.ArgumentList()) ? &context : nullptr;
+}
+
+// Empties the record and fills its argument list. What it needs is freed before the host is called,
+// which may never return.
+static HostContext* PrepareCall(HostInterface& host, const DISPPARAMS* params) {
+  static constexpr DISPPARAMS kNone = {};
+  if (!params) params = &kNone;
+  return ArePlain(*params) ? FillPlain(host, *params) : FillFromObjects(host, *params);
 }
 
 // The host's result. A text result of another kind leaves `result` as the caller gave it.

@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: MIT
 // The object `tarn` and the script site, called as an engine calls them.
 #include <climits>
+#include <clocale>
+#include <cmath>
+#include <random>
 
 #include "ModuleTest.h"
 
@@ -45,6 +48,75 @@ TEST_F(DispatchTest, ArgumentsAndResults) {
     }
     on["call 7"] = [&] { At<int>(host.context, 31 + 8) = -3; };  // a negative count: no text
     Call(L"f");
+  });
+}
+
+namespace {
+// What a host has put among the arguments.
+void* foreign[12];
+void* THISCALL DeleteForeign(void* element, unsigned) {
+  EXPECT_TRUE(!foreign[2] && !foreign[3]) << "written to";
+  Log("a host's element was deleted");
+  return element;
+}
+}  // namespace
+
+// Of one call's arguments nothing shows in the next one's.
+TEST_F(DispatchTest, EachCallHasItsArgumentsAlone) {
+  auto table = Table(DeleteForeign);
+  foreign[0] = table.data();
+  const auto text = [](const wchar_t* units) { return Value(VT_BSTR, SysAllocString(units)); };
+  const VARIANT one = Value(VT_I4, 1), real = Value(VT_R8, -2.5);
+  Script([&] {
+    Call(L"f", {real, text(L"a longer text"), one});
+    Call(L"f", {text(L"t"), one, real});
+    Call(L"f", {one});
+    Call(L"f", {text(L"")});
+    Call(L"f");
+    Call(L"f", {real, one, Value(VT_BOOL, 1)});
+    on["call 7"] = [&] { At<void**>(host.context, 51 + 16)[0] = foreign; };
+    Call(L"f", {one});
+    on.erase("call 7");
+    Call(L"f", {real, text(L"text")});
+  });
+}
+
+// Numbers have the texts that the C runtime would write, whatever its decimal point.
+TEST_F(DispatchTest, NumbersAsText) {
+  std::mt19937 random(1);
+  const auto compare = [&](VARIANT value) {
+    char expected[400];
+    if (value.vt == VT_R8)
+      _snprintf(expected, sizeof expected, "%lf", value.dblVal);
+    else
+      _snprintf(expected, sizeof expected, "%ld", value.lVal);
+    on["call 7"] = [&] {
+      void* const argument = At<void**>(host.context, 51 + 16)[0];
+      EXPECT_STREQ(expected, At<char*>(argument, 24 + 8));
+    };
+    Call(L"f", {value});
+  };
+  Script([&] {
+    muted = true;
+    for (const char* locale : {"C", "German"}) {
+      ASSERT_TRUE(std::setlocale(LC_NUMERIC, locale));
+      for (int i = 0; i < 20000; ++i) {
+        const int bits = static_cast<int>(random());
+        compare(Value(VT_I4, bits >> i % 32));
+        // Decimals, ties at the seventh place and their neighbours, and any bits at all.
+        const double decimal = bits / 2e7, tie = (bits | 1) / 128e6 + bits % 1000;
+        compare(Value(VT_R8, decimal));
+        compare(Value(VT_R8, std::ldexp(bits, -7 - i % 30)));
+        for (double each : {tie, std::nextafter(tie, 1e9), std::nextafter(tie, -1e9)})
+          compare(Value(VT_R8, each));
+        compare(Value(VT_R8, std::ldexp(bits, static_cast<int>(random() % 130) - 90)));
+      }
+      for (double each : {0.0, -0.0, -1e-9, 0.9999995, 0.9999996, 2147483646.9999999, 1e300})
+        compare(Value(VT_R8, each));
+    }
+    std::setlocale(LC_NUMERIC, "C");
+    on.erase("call 7");
+    muted = false;
   });
 }
 
