@@ -23,6 +23,7 @@ set(ILIB_SOURCES
     ${CORE}/iLib/iGeneral.cpp
     ${CORE}/iLib/iModule.cpp
     ${CORE}/iLib/iProfile.cpp
+    ${CORE}/iLib/iProfileSection.cpp
     ${CORE}/iLib/iString.cpp)
 
 # What only the compiler of the Microsoft ABI can build.

@@ -4,6 +4,7 @@
 #include <string.h>
 
 #include "iLib/iProfile.h"
+#include "iLib/iProfileSection.h"
 #include "xLib/ScriptInfoRecord.h"
 
 static constexpr char kSection[] = "Options";
@@ -113,16 +114,16 @@ bool xScriptInfo::Write(Profile& profile) {
 }
 
 void xScriptInfo::Read(Profile& profile, const xScriptInfo& defaults) {
+  const ProfileSection section(profile, kSection);
   Description = defaults.Description;
-  profile.ReadString(Language, kSection, "Language", defaults.Language.Text(), false);
-  NoCase = profile.ReadBool(kSection, "NoCase", defaults.NoCase);
+  section.ReadString(Language, "Language", defaults.Language.Text());
+  NoCase = section.ReadBool("NoCase", defaults.NoCase);
   Language.Delete(kLongestLanguage, kLargestSize);
   if (!Language.IsEmpty()) Description.Format("%s WSH Version 1.50", Language.Text());
   for (const TextKey& text : kTextKeys)
-    profile.ReadString(this->*text.member, kSection, text.key, (defaults.*text.member).Text(),
-                       false);
-  FixCRLF = profile.ReadBool(kSection, "FixCRLF", defaults.FixCRLF);
-  FixDelimiter = profile.ReadBool(kSection, "FixDelimiter", defaults.FixDelimiter);
+    section.ReadString(this->*text.member, text.key, (defaults.*text.member).Text());
+  FixCRLF = section.ReadBool("FixCRLF", defaults.FixCRLF);
+  FixDelimiter = section.ReadBool("FixDelimiter", defaults.FixDelimiter);
   OpenBracket = defaults.OpenBracket;
   CloseBracket = defaults.CloseBracket;
   UnescapeTemplates();

@@ -4,12 +4,15 @@
 #define NOMINMAX
 #include <windows.h>
 
+#include <fstream>
+
 #include "../MessageBoxes.h"
 #include "TestSupport.h"
 #include "iLib/iClipboard.h"
 #include "iLib/iCodePage.h"
 #include "iLib/iModule.h"
 #include "iLib/iProfile.h"
+#include "iLib/iProfileSection.h"
 #include "xLib/xApp.h"
 #include "xLib/xScriptInfo.h"
 
@@ -130,4 +133,76 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
   EXPECT_TRUE(profile.ReadString(value, "Options", "Tick", "", false));
   EXPECT_EQ(value.Length(), 511u);
   DeleteFileA(path.c_str());
+}
+
+// Sections of entries that are put together at random, in each encoding: read in one pass they have
+// what the profile functions read key by key.
+TEST_F(SystemText, ReadsASectionAsTheProfileFunctionsDo) {
+  const std::vector<Text> keys = {"Tick",
+                                  "tICK",
+                                  "Tic",
+                                  "Ticks",
+                                  "Fix",
+                                  "\xC4",
+                                  "T\xC9"
+                                  "ck"};
+  const std::vector<Text> pieces = {
+      "\"", "'", "\"a\"", " ",  "  ",   "\t",   "=", ";", "x",     "0",           "1",
+      "-1", "7", "\\n",   "00", "\x80", "\xE9", "]", "[", "Tick=", "12345678901", "yes"};
+  const std::vector<Text> tame = {"x", "'", "\"", "0", "12", " ", "=", ";", "a b"};
+  const std::vector<Text> ends = {"\r\n", "\n", "\r\n\r\n", " \r\n"};
+  const std::vector<Text> defaults = {"",       "d",    "d ",    " d\t",
+                                      "line\n", "\xE9", "\"q\"", Text(600, 'x')};
+  const auto any = [&](const std::vector<Text>& list) { return list[Below(list.size())]; };
+  bool wild = false;
+  const auto entry = [&] {
+    Text line = !wild || Below(8) ? "" : any(pieces);
+    line += (wild ? any(keys) : keys[Below(6)]) + (!wild || Below(6) ? "" : any(pieces)) +
+            (!wild || Below(9) ? "=" : "");
+    for (u32 i = Below(5); i-- > 0;) line += any(wild ? pieces : tame);
+    return line + (Below(40) ? "" : Text(490 + Below(40), 'y')) + any(ends);
+  };
+  int kept = 0;
+  for (int i = 0; i < 600 && !HasFailure(); ++i) {
+    wild = Below(2);
+    Text text = Below(5) ? "" : entry() + "[Other]\r\n" + entry();
+    text += Below(9) ? "[Options]\r\n" : "[oPTIONS ]\r\n";
+    for (u32 lines = Below(i % 100 ? 6 : 400); lines-- > 0;) text += entry();
+    if (Below(4) == 0) text += "[Options]\r\n" + entry() + entry();
+    if (Below(7) == 0) {
+      // The Kelvin sign, which is a small k to whom ignores case, and a wide letter.
+      std::wstring wide = L"\xFEFF";
+      for (char ch : text)
+        wide += ch == 'k' && Below(2) ? L'\x212A'
+                : ch == 'x'           ? L'\xFF34'
+                                      : static_cast<wchar_t>(ch & 0xFF);
+      text.assign(reinterpret_cast<const char*>(wide.data()), wide.size() * 2);
+    } else if (Below(7) == 0) {
+      text = "\xEF\xBB\xBF" + text;
+    }
+    const Text path = testing::TempDir() + "core-section-" + std::to_string(i) + ".ini";
+    if (i % 50) std::ofstream(path, std::ios::binary) << text;
+    const Profile profile(i % 51 ? path.c_str() : "");
+    const ProfileSection section(profile, "Options");
+    std::vector<Text> read;
+    for (const Text& key : keys) {
+      const Text other = any(defaults);
+      String expected, value;
+      const bool some = profile.ReadString(expected, "Options", key.c_str(), other.c_str(), false);
+      EXPECT_EQ(section.ReadString(value, key.c_str(), other.c_str()), some);
+      EXPECT_EQ(Bytes(value), Bytes(expected)) << key << " in\n" << text;
+      read.push_back(Bytes(expected));
+      for (bool flag : {false, true})
+        EXPECT_EQ(section.ReadBool(key.c_str(), flag),
+                  profile.ReadBool("Options", key.c_str(), flag))
+            << key << " in\n"
+            << text;
+    }
+    DeleteFileA(path.c_str());
+    for (size_t k = 0; k < keys.size(); ++k) {
+      String value;
+      kept += section.ReadString(value, keys[k].c_str(), "") && Bytes(value) == read[k];
+    }
+  }
+  EXPECT_GT(kept, 100) << "values that came from the one pass";
 }
