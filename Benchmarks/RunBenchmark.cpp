@@ -38,6 +38,26 @@ double TimeReads(const Module& module) {
   return ReadDescription(module.DescriptionFile()) ? Now() - start : -1;
 }
 
+// Opening, sizing, reading and closing the macro's file.
+double TimeFileRead(const std::string& file) {
+  const double start = Now();
+  const HANDLE handle = CreateFileA(file.c_str(), GENERIC_READ, FILE_SHARE_READ, nullptr,
+                                    OPEN_EXISTING, FILE_ATTRIBUTE_NORMAL, nullptr);
+  char bytes[16];
+  DWORD read = GetFileSize(handle, nullptr);
+  const bool opened = ReadFile(handle, bytes, sizeof bytes, &read, nullptr);
+  CloseHandle(handle);
+  return opened ? Now() - start : -1;
+}
+
+double TimeSectionRead(const Module& module) {
+  const std::wstring file = module.DescriptionFile().wstring();
+  wchar_t entries[4096];
+  const double start = Now();
+  const DWORD size = GetPrivateProfileSectionW(L"Options", entries, 4096, file.c_str());
+  return size ? Now() - start : -1;
+}
+
 // Runs and their peers one by one, so that what disturbs the machine hits both.
 template <class Own, class Peer>
 bool CompareEach(Section& section, Comparison comparison, Own own, Peer peer) {
@@ -74,7 +94,13 @@ bool CompareJScriptRuns(Section& section) {
          CompareEach(section, {"JScript : engine alone", Measure::kRatio, 1.5}, run, steps) &&
          CompareEach(
              section, Comparison("(fifteen profile reads : engine alone)"),
-             [&] { return TimeReads(module); }, steps);
+             [&] { return TimeReads(module); }, steps) &&
+         CompareEach(
+             section, Comparison("(one read of the section : engine alone)"),
+             [&] { return TimeSectionRead(module); }, steps) &&
+         CompareEach(
+             section, Comparison("(one read of the macro file : engine alone)"),
+             [&] { return TimeFileRead(macro); }, steps);
 }
 
 constexpr char kEvaluation[] =

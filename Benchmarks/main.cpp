@@ -12,6 +12,7 @@
 #include <string>
 
 #include "CallBenchmark.h"
+#include "FileBenchmark.h"
 #include "Module.h"
 #include "RunBenchmark.h"
 #include "Section.h"
@@ -23,10 +24,8 @@ struct Group {
   bool (*measure)(Section& section);
 };
 static constexpr Group kGroups[] = {
-    {"calls", CompareCalls},
-    {"dispatch", CompareDispatch},
-    {"runs", CompareRuns},
-    {"start", CompareFirstRuns},
+    {"calls", CompareCalls},     {"dispatch", CompareDispatch}, {"runs", CompareRuns},
+    {"start", CompareFirstRuns}, {"files", CompareMacroFiles},  {"module", CompareModuleFile},
 };
 
 // Has the calling thread find the engine beside this program, for the rest of the process.

@@ -35,10 +35,14 @@ static wchar_t* Widen(const char* bytes, DWORD size) {
   const u32 wideBytes = size * 2 + 20;
   wchar_t* text = static_cast<wchar_t*>(CoTaskMemAlloc(wideBytes));
   if (!text) return nullptr;
-  // Zeroed first: a conversion that fails half-way leaves the rest of its buffer alone.
-  memset(text, 0, wideBytes);
-  mbstowcs(text, bytes, size + 1);
-  text[size] = 0;
+  size_t units = mbstowcs(text, bytes, size + 1);
+  if (units > size) {
+    // It has failed half-way and does not tell where: what it converts is kept, with zeros behind.
+    memset(text, 0, wideBytes);
+    mbstowcs(text, bytes, size + 1);
+    units = size;
+  }
+  memset(text + units, 0, wideBytes - units * sizeof(wchar_t));
   return text;
 }
 

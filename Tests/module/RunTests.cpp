@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 // One run from the host's call to its return: arguments, the order of events, results, failing
 // steps, stops, kill and the engine's table of operations.
+#include <clocale>
 #include <thread>
 
 #include "ModuleTest.h"
@@ -94,4 +95,14 @@ TEST_F(RunTest, MacroFiles) {
       WriteBytes(macroPath, std::string(macro.begin(), macro.end()) + tail), Run();
       EXPECT_TRUE(macro == source);
     }
+
+  // In a host's own locale, and up to where bytes that are no character end the conversion.
+  ASSERT_TRUE(setlocale(LC_CTYPE, "Japanese"));
+  for (const char* macro : {"\x83\x65 ok", "\x83\x65 ok\x81\n more"}) {
+    wchar_t expected[32] = L"";
+    mbstowcs(expected, macro, std::size(expected));
+    WriteBytes(macroPath, macro), Run();
+    EXPECT_EQ(expected, source);
+  }
+  setlocale(LC_CTYPE, "C");
 }
