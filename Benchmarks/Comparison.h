@@ -22,7 +22,7 @@ class Comparison {
   enum class Measure { kRatio, kDifference };
 
   // Fewer rounds make no figure to rely on.
-  static constexpr int kRounds = 11;
+  static constexpr int kRounds = 9;
 
   Comparison(std::string title, Measure goalMeasure, double goalValue)
       : name(std::move(title)), measure(goalMeasure), goal(goalValue) {}

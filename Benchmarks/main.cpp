@@ -13,6 +13,8 @@
 
 #include "CallBenchmark.h"
 #include "FileBenchmark.h"
+#include "LibraryBenchmark.h"
+#include "MacroBenchmark.h"
 #include "Module.h"
 #include "RunBenchmark.h"
 #include "Section.h"
@@ -23,10 +25,13 @@ struct Group {
   const char* name;
   bool (*measure)(Section& section);
 };
+// clang-format off: one a line
 static constexpr Group kGroups[] = {
     {"calls", CompareCalls},     {"dispatch", CompareDispatch}, {"runs", CompareRuns},
     {"start", CompareFirstRuns}, {"files", CompareMacroFiles},  {"module", CompareModuleFile},
+    {"macro", CompareLogMacro},  {"library", CompareLibrary},
 };
+// clang-format on
 
 // Has the calling thread find the engine beside this program, for the rest of the process.
 static bool ActivateEngine() {

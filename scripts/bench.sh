@@ -1,13 +1,75 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: MIT
-# Measures calls, runs and the start of the Ruby engine, each beside a peer's time from the same run,
-# and prints a table; takes about a minute on an idle machine:
+# Measures what ships, each figure beside a peer's from the same run:
 #
-#   scripts/bench.sh [calls | later | first]
+#   scripts/bench.sh            all groups; writes Benchmarks/results.md and a chart of each group
+#   scripts/bench.sh GROUP...   those only, to standard output
 #
-# Sets the machine up and builds first when needed.
+# Groups: calls dispatch runs start files module macro library. Some minutes on an idle machine; a
+# busy one makes the spread wide. Sets the machine up and builds first when needed. The results
+# appear whole or not at all.
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
+PACKAGES+=(gnuplot-nox)
+
+GROUPS_IN_ORDER=(calls dispatch runs start files module macro library)
+
+# measure GROUP [FILE]: the group's section; FILE receives the numbers of its chart. A file in
+# between, since Wine's server keeps a pipe open.
+measure() {
+  local output
+  output=$(mktemp)
+  if ! (cd "$BUILD" && timeout 900 wine release/bin/benchmarks.exe "$@") >"$output" 2>"$output.errors"; then
+    cat "$output" "$output.errors" >&2
+    rm -f "$output" "$output.errors"
+    die "the group $1 could not be measured"
+  fi
+  tr -d '\r' <"$output"
+  rm -f "$output" "$output.errors"
+}
+
+describe_machine() {
+  local processor
+  processor=$(sed -n 's/^model name[^:]*: *//p' /proc/cpuinfo | head -n 1)
+  cat <<END
+# Results
+
+Written by \`scripts/bench.sh\` on $(date -u +%Y-%m-%d), from $(git -C "$ROOT" describe --always --dirty).
+
+$(nproc) cores ($processor), $(wine --version), load average at the start $(cut -d ' ' -f 1 /proc/loadavg).
+
+A ratio is the median of the rounds' own ratios, with the least and the greatest; the two sides of a
+round are measured in turns, so that what else the machine does hits both. A goal is met when the
+median is not above it.
+END
+}
+
+draw() { # draw GROUP: its chart from its numbers
+  local settings="data='$WORK/$1.tsv'; result='$WORK/$1.svg'; caption='$1'"
+  local kind=bars
+  [ "$1" != library ] || kind=curves
+  gnuplot -e "$settings" "$ROOT/Benchmarks/$kind.gp"
+}
+
+write_results() {
+  local group
+  WORK=$(mktemp -d "$BUILD/bench-XXXXXX")
+  trap 'rm -rf "$WORK"' EXIT
+  describe_machine >"$WORK/results.md"
+  for group in "${GROUPS_IN_ORDER[@]}"; do
+    say "-- measuring $group"
+    measure "$group" "$(basename "$WORK")/$group.tsv" >>"$WORK/results.md"
+    step "drawing $group" draw "$group"
+    printf '\n![%s](%s.svg)\n' "$group" "$group" >>"$WORK/results.md"
+  done
+  mv "$WORK"/{results.md,*.svg} "$ROOT/Benchmarks/"
+  cat "$ROOT/Benchmarks/results.md"
+}
+
 prepare benchmarks
-exec timeout 600 wine "$BUILD/release/bin/benchmarks.exe" "$@"
+if [ $# -eq 0 ]; then
+  write_results
+else
+  for group in "$@"; do measure "$group"; done
+fi

@@ -458,16 +458,29 @@ u32 String::ReplaceAll(const char* needle, const char* replacement) {
   const u32 usual = AddSizes(to.size, MultiplySizes(2, start));
   if (!Reserve(result > usual ? result : usual)) return 0;
 
-  u32 offset = 0;
-  for (u32 i = 0; i < occurrences; ++i) {
-    offset = static_cast<u32>(strstr(text + offset, from.bytes) - text);
-    ReplaceAt(offset, from.size, to.bytes, to.size);
-    offset += to.size;
-    // The text fits already; this keeps the grow step in line with the work done.
-    Reserve(AddSizes(start, to.size));
-  }
+  // The text fits already; this keeps the grow step in line with the work done.
+  for (u32 i = 0; i < occurrences; ++i) Reserve(AddSizes(start, to.size));
+  ReplaceEach(occurrences, from, to, result);
   length = LengthOf(text);
   return occurrences;
+}
+
+// In one pass: where the text becomes longer it is first moved to the end of the room that it will
+// take, so that what is read always lies behind what has been written.
+void String::ReplaceEach(u32 occurrences, const Argument& from, const Argument& to, u32 result) {
+  const char* const end = text + (result > length ? result : length);
+  const char* source =
+      static_cast<const char*>(memmove(text + (end - text) - length, text, length + 1));
+  char* target = text;
+  for (u32 i = 0; i < occurrences; ++i) {
+    const char* const found = strstr(source, from.bytes);
+    const u32 kept = static_cast<u32>(found - source);
+    memmove(target, source, kept);
+    memcpy(target + kept, to.bytes, to.size);
+    source = found + from.size;
+    target += kept + to.size;
+  }
+  memmove(target, source, static_cast<u32>(end - source) + 1);
 }
 
 void String::AddToChars(u8 k) {

@@ -173,7 +173,8 @@ TEST_F(SystemText, ReadsASectionAsTheProfileFunctionsDo) {
     } else if (Below(7) == 0) {
       text = "\xEF\xBB\xBF" + text;
     }
-    const Text path = testing::TempDir() + "core-section-" + std::to_string(i) + ".ini";
+    const Text path = testing::TempDir() + "core-section-" + std::to_string(GetCurrentProcessId()) +
+                      "-" + std::to_string(i) + ".ini";
     if (i % 50) std::ofstream(path, std::ios::binary) << text;
     const Profile profile(i % 51 ? path.c_str() : "");
     const ProfileSection section(profile, "Options");
