@@ -26,7 +26,8 @@ std::wstring Wide(const std::string& ascii) { return std::wstring(ascii.begin(),
 
 // --- From scripts --------------------------------------------------------------------------------
 
-constexpr int kScriptCalls = 20000;
+constexpr int kTurns = 9;
+constexpr int kScriptCalls = 2000;
 
 std::string JScriptLoop(const std::string& call) {
   return "tarn.start(); for (var i = 0; i < " + std::to_string(kScriptCalls) + "; ++i) " + call +
@@ -46,7 +47,7 @@ bool CompareJScript(Section& section, Module& module, const std::string& call, d
     const bool ran = Succeeded(RunBare(L"JScript", bare, wide.c_str()), "the bare JScript");
     return ran ? bare.clock.Seconds() / kScriptCalls : -1;
   };
-  if (!comparison.Measured(own, peer)) return false;
+  if (!comparison.Measured(own, peer, kTurns)) return false;
   section.Add(comparison);
   return true;
 }
@@ -75,7 +76,7 @@ bool CompareRuby(Section& section) {
 
 // --- Straight ------------------------------------------------------------------------------------
 
-constexpr int kDirectCalls = 20000;
+constexpr int kDirectCalls = 2000;
 
 bool Lookup(IDispatch& object) {
   LPOLESTR names[] = {const_cast<LPOLESTR>(L"f")};
@@ -130,7 +131,7 @@ bool CompareDirect(Section& section, IDispatch& tarn) {
   for (DirectCase& each : cases) {
     Comparison comparison("C++, " + std::string(each.title) + " : bare object");
     if (!comparison.Measured([&] { return TimeDirect(tarn, each); },
-                             [&] { return TimeDirect(bare, each); })) {
+                             [&] { return TimeDirect(bare, each); }, 5 * kTurns)) {
       std::fprintf(stderr, "%s failed\n", each.title);
       succeeded = false;
       break;
@@ -145,7 +146,7 @@ void* volatile block;  // keeps the compiler from leaving an allocation out
 
 void PrintPart(Section& section, const char* name, void (*part)()) {
   std::vector<double> seconds;
-  for (int round = 0; round < Comparison::kRounds; ++round)
+  for (int round = 0; round < 9 * Comparison::kRounds; ++round)
     seconds.push_back(SecondsPerCall(kDirectCalls, part));
   section.Print("| " + std::string(name) + " | " + TimeText(Median(seconds)) + " |\n");
 }

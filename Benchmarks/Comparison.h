@@ -32,16 +32,23 @@ class Comparison {
   // One round, in seconds.
   void Add(double time, double peerTime) { rounds.push_back({time, peerTime}); }
 
-  // Rounds in which the two take turns at being first, so that what the order does evens out. Each
-  // side returns the seconds of one operation, negative when it failed; then the answer is false.
+  // Rounds of so many turns on each side, whose medians count: with short turns, what interrupts one
+  // of them does not show. Each side returns the seconds of one operation, negative when it failed;
+  // then the answer is false.
   template <class Own, class Peer>
-  bool Measured(Own own, Peer peer) {
+  bool Measured(Own own, Peer peer, int turns = 1) {
     for (int round = 0; round < kRounds; ++round) {
-      double time = round % 2 == 0 ? own() : 0;
-      const double peerTime = peer();
-      if (round % 2 != 0) time = own();
-      if (time < 0 || peerTime < 0) return false;
-      Add(time, peerTime);
+      std::vector<double> times;
+      std::vector<double> peerTimes;
+      for (int turn = 0; turn < turns; ++turn) {
+        // Who is first changes, so that what the order does evens out.
+        const bool ownFirst = (round + turn) % 2 == 0;
+        if (ownFirst) times.push_back(own());
+        peerTimes.push_back(peer());
+        if (!ownFirst) times.push_back(own());
+        if (times.back() < 0 || peerTimes.back() < 0) return false;
+      }
+      Add(Median(times), Median(peerTimes));
     }
     return true;
   }

@@ -116,7 +116,7 @@ bool CompareMacroFiles(Section& section) {
     Comparison comparison(std::to_string(megabytes) + " MB : one read and conversion",
                           Comparison::Measure::kRatio, 1.2);
     if (!comparison.Measured([&] { return TimeLoad(file); },
-                             [&] { return TimeBareLoad(file, size); })) {
+                             [&] { return TimeBareLoad(file, size); }, megabytes < 10 ? 15 : 3)) {
       std::fprintf(stderr, "%s cannot be read\n", file.c_str());
       return false;
     }
@@ -151,8 +151,8 @@ bool CompareModuleFile(Section& section) {
     return ReadDescription(module.DescriptionFile()) ? Now() - start : -1;
   };
   if (!load.Measured([&] { return TimeLibrary(copy); },
-                     [&] { return TimeLibrary(folder / "benchmark-empty.dll"); }) ||
-      !version.Measured([&] { return module.TimeVersion(); }, reads)) {
+                     [&] { return TimeLibrary(folder / "benchmark-empty.dll"); }, 9) ||
+      !version.Measured([&] { return module.TimeVersion(); }, reads, 15)) {
     std::fprintf(stderr, "loading or version failed\n");
     return false;
   }

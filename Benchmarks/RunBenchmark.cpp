@@ -13,18 +13,7 @@ namespace fs = std::filesystem;
 
 namespace {
 
-constexpr int kRuns = 40;  // a side and a round
-
-// The median of a round's runs; negative when one has failed.
-template <class Run>
-double MedianOf(Run run) {
-  std::vector<double> seconds;
-  for (int i = 0; i < kRuns; ++i) {
-    seconds.push_back(run());
-    if (seconds.back() < 0) return -1;
-  }
-  return Median(seconds);
-}
+constexpr int kRuns = 30;  // a side and a round
 
 double TimeBareSteps(const wchar_t* progId) {
   static BareObject object;
@@ -58,20 +47,11 @@ double TimeSectionRead(const Module& module) {
   return size ? Now() - start : -1;
 }
 
-// Runs and their peers one by one, so that what disturbs the machine hits both.
 template <class Own, class Peer>
 bool CompareEach(Section& section, Comparison comparison, Own own, Peer peer) {
-  for (int round = 0; round < Comparison::kRounds; ++round) {
-    std::vector<double> peers;
-    const double time = MedianOf([&] {
-      peers.push_back(peer());
-      return peers.back() < 0 ? -1 : own();
-    });
-    if (time < 0) {
-      std::fprintf(stderr, "a run failed\n");
-      return false;
-    }
-    comparison.Add(time, Median(peers));
+  if (!comparison.Measured(own, peer, kRuns)) {
+    std::fprintf(stderr, "a run failed\n");
+    return false;
   }
   section.Add(comparison);
   return true;
@@ -105,8 +85,8 @@ bool CompareJScriptRuns(Section& section) {
 
 constexpr char kEvaluation[] =
     "start = Process.clock_gettime(Process::CLOCK_MONOTONIC)\n"
-    "1000.times { eval('') }\n"
-    "@tarn.take(0, 0, (Process.clock_gettime(Process::CLOCK_MONOTONIC) - start) / 1000)\n";
+    "100.times { eval('') }\n"
+    "@tarn.take(0, 0, (Process.clock_gettime(Process::CLOCK_MONOTONIC) - start) / 100)\n";
 
 bool CompareRubyRuns(Section& section) {
   Module ruby("");
@@ -120,12 +100,10 @@ bool CompareRubyRuns(Section& section) {
     return ruby.TimeRun(evaluation) < 0 ? -1 : told.PeerTime();
   };
   using Measure = Comparison::Measure;
-  Module jscript(JScriptDescription());
-  const std::string other = jscript.Macro("empty.js", "");
-  Comparison evaluated("Ruby, a later run : `eval('')` in Ruby", Measure::kDifference, 1e-3);
-  if (!evaluated.Measured([&] { return MedianOf(run); }, evaluate)) return false;
-  section.Add(evaluated);
-  return CompareEach(section, {"Ruby, a later run : engine alone", Measure::kRatio, 1.5}, run,
+  return CompareEach(section,
+                     {"Ruby, a later run : `eval('')` in Ruby", Measure::kDifference, 1e-3}, run,
+                     evaluate) &&
+         CompareEach(section, {"Ruby, a later run : engine alone", Measure::kRatio, 1.5}, run,
                      [] { return TimeBareSteps(L"RubyScript"); });
 }
 

@@ -5,7 +5,6 @@
 #include <string.h>
 #include <windows.h>
 
-#include "cLib/cCompat.h"
 #include "iLib/iCodePage.h"
 #include "iLib/iProfile.h"
 
@@ -15,6 +14,15 @@ static constexpr u32 kLongestInteger = 9;  // digits that fit whatever they are
 static bool IsBlank(char ch) { return ch == ' ' || ch == '\t'; }
 
 static bool IsQuote(char ch) { return ch == '"' || ch == '\''; }
+
+static char Lower(char ch) { return ch >= 'A' && ch <= 'Z' ? static_cast<char>(ch + 32) : ch; }
+
+// Of printable ASCII, in which case is nobody's locale's affair.
+static bool BeginsWith(const char* text, const char* beginning, u32 size) {
+  u32 same = 0;
+  while (same < size && Lower(text[same]) == Lower(beginning[same])) ++same;
+  return same == size;
+}
 
 static bool EndsInBlank(const char* text, u32 size) { return size && IsBlank(text[size - 1]); }
 
@@ -38,6 +46,8 @@ bool ProfileSection::Load() {
     entries[i] = static_cast<char>(units[i]);
   }
   entries[size] = entries[size + 1] = 0;
+  for (const char* entry = entries; *entry; entry += strlen(entry) + 1)
+    if (IsBlank(*entry) || !strchr(entry, '=')) return false;
   return true;
 }
 
@@ -46,8 +56,7 @@ ProfileSection::Answer ProfileSection::Find(const char* key, const char*& value)
   if (!loaded) return Answer::kUnknown;
   const u32 size = static_cast<u32>(strlen(key));
   for (const char* entry = entries; *entry; entry += strlen(entry) + 1) {
-    if (IsBlank(*entry) || !strchr(entry, '=')) return Answer::kUnknown;
-    if (CompareIgnoringCase(entry, key, size) != 0) continue;
+    if (!BeginsWith(entry, key, size)) continue;
     if (IsBlank(entry[size])) return Answer::kUnknown;
     if (entry[size] != '=') continue;
     value = entry + size + 1;

@@ -42,7 +42,7 @@ static char DecimalPoint() {
 
 // As %lf writes it, in `number`; null when the C runtime has to do it.
 static const char* WriteReal(double value, char (&number)[kNumberSize]) {
-  const bool negative = __builtin_signbit(value);
+  const bool negative = value < 0 || (value == 0 && 1 / value < 0);
   const char point = DecimalPoint();
   Decimal decimal;
   if (!point || !Round(negative ? -value : value, decimal)) return nullptr;
