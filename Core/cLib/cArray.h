@@ -55,10 +55,7 @@ class Array {
 
   // Deletes the elements (owning) and sets the count to 0. Each element leaves its slot before it
   // is deleted, so a second call after a fault in a destructor goes on with the next one.
-  void Clear() { Cut(0); }
-
-  // The same for the elements from `newCount` (0 or above) on, when there are so many.
-  void Cut(i32 newCount);
+  void Clear();
 
   // Sets the count to 0 without looking at the elements.
   void Forget() { count = 0; }
@@ -134,15 +131,15 @@ T* Array<T>::Detach(i32 index) {
 }
 
 template <class T>
-void Array<T>::Cut(i32 newCount) {
-  for (i32 i = newCount; ownsElements && i < count; ++i) {
+void Array<T>::Clear() {
+  for (i32 i = 0; ownsElements && i < count; ++i) {
     if (!HasSlot(i)) {
       REPORT_ASSERT("cArray", "Count beyond capacity");
       break;
     }
     delete Detach(i);
   }
-  if (newCount < count || count < 0) count = newCount;
+  count = 0;
 }
 
 // An Array used as a sequence.

@@ -55,34 +55,34 @@ static const char* WriteReal(double value, char (&number)[kNumberSize]) {
   return start;
 }
 
-// The text of an element that is used again goes first: where there is no memory for the new one,
-// the argument has none.
-void xArgument::Take(Kind newKind, i32 newInteger, double newReal, const char* newText) {
-  kind = newKind;
-  integer = newInteger;
-  real = newReal;
-  text.Assign("");
-  if (newText) text.Assign(newText);
+void xArgument::SetText(const char* value) {
+  kind = kText;
+  text.Assign(value);
 }
 
-void xArgument::SetText(const char* value) { Take(kText, 0, 0, value); }
-
 void xArgument::SetInteger(i32 value) {
+  kind = kInteger;
+  integer = value;
+  real = value;
   char number[kNumberSize];
   char* start = number + kNumberSize - 1;
   *start = 0;
   const u32 bits = static_cast<u32>(value);
   start = WriteDigits(start, value < 0 ? 0 - bits : bits, 1);
   if (value < 0) *--start = '-';
-  Take(kInteger, value, value, start);
+  text.Assign(start);
 }
 
 void xArgument::SetReal(double value) {
+  kind = kReal;
   // The conversion of a value that does not fit is undefined in C++; this is what the processor's
   // own instruction answers. The comparison is false for a value that is not a number.
   const bool fits = value > -2147483649.0 && value < 2147483648.0;
+  integer = fits ? static_cast<i32>(value) : INT32_MIN;
+  real = value;
   char number[kNumberSize];
-  const char* const written = WriteReal(value, number);
-  Take(kReal, fits ? static_cast<i32>(value) : INT32_MIN, value, written);
-  if (!written) text.Format("%lf", value);
+  if (const char* const written = WriteReal(value, number))
+    text.Assign(written);
+  else
+    text.Format("%lf", value);
 }

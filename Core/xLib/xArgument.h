@@ -3,8 +3,7 @@
 // where the kind has them (a text argument carries only its text).
 //
 // The host reads these records by byte offset through the context record's argument list, which
-// owns them. Elements that this module made serve one call after another: the operations leave
-// nothing of what they held before. Threading: the macro run's thread.
+// owns them for one call. Threading: the macro run's thread.
 #pragma once
 
 #include <stddef.h>
@@ -16,10 +15,6 @@ class xArgument {
  public:
   enum Kind : u32 { kText = 1, kInteger = 2, kReal = 3 };
 
-  xArgument() { const_cast<u32&>(Mark()) = kMark; }
-  xArgument(const xArgument&) = delete;
-  xArgument& operator=(const xArgument&) = delete;
-
   SLOTS_FROM(0);
   SLOT(0) ~xArgument() = default;
 
@@ -27,21 +22,10 @@ class xArgument {
   void SetInteger(i32 value);
   void SetReal(double value);
 
-  // False for what only stands in an argument's place: an element that a host has made.
-  bool IsOurs() const { return Mark() == kMark; }
-
   u32 kind = kText;
   i32 integer = 0;  // a real's is truncated toward zero, -2147483648 when it does not fit
   double real = 0;
-  String text;  // an integer's in decimal, a real's with six decimals; empty without memory for it
-
- private:
-  static constexpr u32 kMark = 0x74677261;
-
-  // In the padding behind the table pointer, which the host does not look at.
-  const u32& Mark() const { return reinterpret_cast<const u32*>(this)[1]; }
-
-  void Take(Kind newKind, i32 newInteger, double newReal, const char* newText);
+  String text;  // an integer's in decimal, a real's with six decimals
 };
 
 #if CORE_MICROSOFT_ABI

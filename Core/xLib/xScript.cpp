@@ -128,29 +128,19 @@ static bool ArePlain(const DISPPARAMS& params) {
   return true;
 }
 
-// The argument for `index`: what a call before has left there, or a new one in its place. Null: no
-// memory.
-static xArgument* ElementAt(Array<xArgument>& arguments, i32 index) {
-  xArgument* const used = arguments.At(index);
-  if (used && used->IsOurs()) return used;
-  xArgument* const argument = new xArgument;
-  if (!argument || arguments.SetAt(argument, index) >= 0) return argument;
-  delete argument;
-  return nullptr;
-}
-
-// Makes the list the arguments in the script's order; COM stores them last first. False: no memory.
+// Appends the arguments in the script's order; COM stores them last first. False: no memory.
 static bool Convert(const DISPPARAMS& params, Array<xArgument>& arguments) {
-  i32 count = 0;
   for (UINT i = params.rgvarg ? params.cArgs : 0; i-- > 0;) {
     VARIANT& value = params.rgvarg[i];
     if (IsSkipped(value)) continue;
-    xArgument* const argument = ElementAt(arguments, count);
+    xArgument* const argument = new xArgument;
     if (!argument) return false;
     SetArgument(*argument, value);
-    ++count;
+    if (arguments.SetAt(argument, arguments.Count()) < 0) {
+      delete argument;
+      return false;
+    }
   }
-  arguments.Cut(count);
   return true;
 }
 
@@ -163,14 +153,12 @@ static bool Move(Array<xArgument>& from, Array<xArgument>& to) {
   return true;
 }
 
-// Null, here and below: no memory. The list keeps its elements for the arguments that are to come,
-// unless a host has them for its own.
+// Null, here and below: no memory.
 static HostContext* FillPlain(HostInterface& host, const DISPPARAMS& params) {
   HostContext& context = *host.Context();
-  Array<xArgument>& list = context.ArgumentList();
-  if (!list.OwnsElements()) list.Clear();
+  context.ArgumentList().Clear();
   context.ResultTexts().Clear();
-  return Convert(params, list) ? &context : nullptr;
+  return Convert(params, context.ArgumentList()) ? &context : nullptr;
 }
 
 // The value of an object may be the script's own code, whose calls pass through the same record: it
