@@ -51,10 +51,10 @@ print_cached() {
     [[ $CACHE != *[[:space:]]* ]] || die "$name cannot be built in a folder with a blank: set SCRIPTRUBY_CACHE"
     mkdir -p "$BUILD" "$CACHE"
     exec 9>"$BUILD/.lock"
-    flock 9
+    lock
     set_up
     exec 9>"$CACHE/.lock"
-    flock 9
+    lock
     [ -d "$result" ] || build_into_cache "$name" "$result"
   fi
   printf '%s\n' "$result"

@@ -81,6 +81,13 @@ make_wine_prefix() {
     touch "$WINEPREFIX/.complete"
 }
 
+# Waits for the descriptor 9, which a command holds while it sets up or builds.
+lock() {
+  flock -n 9 && return
+  say "-- waiting for another command that builds"
+  flock 9
+}
+
 # set_up: everything a fresh machine needs before a build, each part only when it is missing.
 set_up() {
   command -v dpkg >/dev/null || die "this is not a Debian system: install by hand ${PACKAGES[*]}"
@@ -116,7 +123,7 @@ build_release() {
       "-DSCRIPTRUBY_CRUBY=$cruby" "-DSCRIPTRUBY_PCRE2=$pcre2"
   fi
   ninja -C "$BUILD/release" -n "$@" 2>/dev/null | grep -q 'no work to do' ||
-    step "building" cmake --build "$BUILD/release" ${1:+--target "$@"}
+    step "building (some minutes the first time)" cmake --build "$BUILD/release" ${1:+--target "$@"}
 }
 
 # prepare [TARGET...]: set-up, build and Wine's server; one process at a time. CRuby and PCRE2 come
@@ -127,7 +134,7 @@ prepare() {
   pcre2=$("$ROOT/scripts/build-pcre2.sh")
   mkdir -p "$BUILD"
   exec 9>"$BUILD/.lock"
-  flock 9
+  lock
   set_up
   build_release "$cruby" "$pcre2" "$@"
   exec 9>&-

@@ -8,6 +8,8 @@
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
+[[ ${1:-} != -* ]] || STATUS=2 die "usage: scripts/package.sh [FILE.zip]"
+
 VERSION=$(sed -n 's/^project(scriptruby VERSION \([0-9.]*\).*/\1/p' "$ROOT/CMakeLists.txt")
 NAME=scriptruby-$VERSION
 RESULT=$(readlink -m "${1:-$BUILD/$NAME.zip}")

@@ -1,13 +1,14 @@
 /* SPDX-License-Identifier: MIT */
 /*
  * The smallest host of scriptruby.dll that is worth the name: it runs one macro, which calls
- * functions of ours, and Ctrl+C stops it. Plain C, one file, no header of the module's.
+ * functions of ours, and Ctrl+C stops it at the next one. Plain C, one file, no header of the
+ * module's.
  *
  *   minimal_host.exe FULL-PATH-OF-scriptruby.dll MACRO
  *
  * Build it for 32-bit Windows with any compiler:
  *   i686-w64-mingw32-gcc minimal_host.c -o minimal_host.exe
- *   clang --target=i686-w64-mingw32 minimal_host.c -o minimal_host.exe
+ *   clang-19 --target=i686-w64-mingw32 minimal_host.c -o minimal_host.exe
  *   cl /std:c11 minimal_host.c
  *
  * The module calls C++ member functions of the Microsoft ABI: the object in ecx, the arguments on
@@ -270,6 +271,10 @@ int main(int count, char** arguments) {
   HMODULE module;
   if (count != 3) {
     fprintf(stderr, "usage: minimal_host FULL-PATH-OF-scriptruby.dll MACRO\n");
+    return 2;
+  }
+  if (!strchr(arguments[1], ':') && strncmp(arguments[1], "\\\\", 2) != 0) {
+    fprintf(stderr, "%s is not a full path\n", arguments[1]); /* the engine would not be found */
     return 2;
   }
   ActivateEngine(arguments[1]);

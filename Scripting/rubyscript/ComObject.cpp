@@ -252,12 +252,21 @@ VALUE Invoke(const Wrapped& wrapped, VALUE name, DISPID id, WORD flags, int coun
   return flags & DISPATCH_PROPERTYGET ? TakeResult(call, wrapped.form) : arguments[count - 1];
 }
 
+// The bridge of an 8-bit host leaves out what has no form there, and later arguments would move up.
+void CheckPlaces(const VALUE* passable, int count) {
+  for (int i = 0; i + 1 < count; ++i)
+    if (NIL_P(passable[i]) || IsComObject(passable[i]))
+      rb_raise(rb_eArgError, "argument %d is %s, which the editor would leave out", i + 1,
+               NIL_P(passable[i]) ? "nil" : "an object");
+}
+
 VALUE InvokeWith(const Wrapped& wrapped, VALUE name, DISPID id, WORD flags, int count,
                  const VALUE* arguments) {
   if (rb_block_given_p()) rb_raise(rb_eArgError, "a call of a COM object takes no block");
   VALUE buffer = Qnil;
   VALUE* const passable = ALLOCV_N(VALUE, buffer, count + 1);
   for (int i = 0; i < count; ++i) passable[i] = Passable(arguments[i], wrapped.form);
+  if (wrapped.form == TextForm::kBytes) CheckPlaces(passable, count);
   CheckCallable(wrapped);  // conversions may have run anything
   const VALUE result = Invoke(wrapped, name, id, flags, count, passable);
   ALLOCV_END(buffer);

@@ -57,7 +57,10 @@ VALUE PassableText(VALUE text, TextForm form) {
 
 VALUE PassableValue(VALUE value, TextForm form, int nesting);
 
+// The bridge of an 8-bit host would make an empty text of an array.
 VALUE PassableArray(VALUE array, TextForm form, int nesting) {
+  if (form == TextForm::kBytes)
+    rb_raise(rb_eTypeError, "no Array can be passed to the editor; make a text of it, with join");
   if (nesting > kMostNesting)
     rb_raise(rb_eArgError, "array nested more than %d deep, or in itself", kMostNesting);
   const VALUE result = rb_ary_new_capa(RARRAY_LEN(array));

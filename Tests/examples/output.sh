@@ -35,6 +35,7 @@ expect_lines each/3 3+
 source='raise "no" if @tarn.get_line(1) == "2"; @tarn.write("x")'
 echo "$source" > some.rbs
 expect 1 '2 of 3 files done, 1 failed' -i some.rbs --each each/1 each/2 each/3
+grep -qx 'macrorun: each/2: failed' err || fail 'which text an error is about'
 expect_lines each/2 2
 expect_lines each/1 x1+
 expect 4 '0 of 2 files done, 1 failed, 1 not begun' --module "$fake" -i macro.rbs --each each/1 each/2
@@ -56,6 +57,9 @@ unchanged 'write-protected'
 chmod u+w input.txt
 expect 2 'missing.txt' -i macro.rbs missing.txt
 expect 2 'it is a folder' macro.rbs input.txt -o each
+expect 2 'it is a folder' macro.rbs each
+echo text > aux.c
+expect 2 'takes the name for a device' macro.rbs aux.c
 expect 2 'cannot write nowhere' macro.rbs input.txt -o nowhere/new.txt
 
 # The macro fails, calls wrongly, is stopped or faults

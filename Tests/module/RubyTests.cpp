@@ -54,10 +54,12 @@ TEST_F(RubyTest, KeyboardMacrosAndText) {
       "\xEF\xBB\xBFtext = @tarn.f(1.5, :symbol, true, 2**40)\n"
       "@tarn.g(text, 'Gr\xC3\xBC\xC3\x9F"
       "e'.length, 'Gr\xC3\xBC\xC3\x9F"
-      "e'.upcase, nil, -1)\n"
+      "e'.upcase, -1, nil)\n"
       "@tarn.g(text.bytes == (1..255).to_a, text.encoding.name)\n");
   RunMacro("x = \n");
   RunMacro("def deeper = @tarn.f(Object.new)\n\ndeeper\n");
+  for (const char* argument : {"[1]", "nil, 1", "@tarn, 1"})
+    RunMacro("@tarn.f(" + std::string(argument) + ")\n");
   RunMacro("@tarn.nothing('a')\n");
   RunMacro("exit\n");
   RunMacro("abort\n");

@@ -109,7 +109,7 @@ std::size_t ArgumentCheck::CheckNumber(std::size_t index, std::size_t first, std
 std::string ArgumentCheck::CheckText(std::size_t index, ParameterKind kind) const {
   std::string text(arguments[index].text);
   if (text.size() >= kNarrowLimit)
-    Fail(index, "at most 511 characters (the text may have been cut at 512)");
+    Fail(index, "at most 511 bytes (the text may have been cut)");
   if (kind == ParameterKind::kLineText && text.find('\n') != text.npos)
     Fail(index, "one line without a line end");
   if (kind == ParameterKind::kName && text.empty()) Fail(index, "a text that is not empty");

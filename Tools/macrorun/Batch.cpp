@@ -75,6 +75,7 @@ ExitCode Batch::RunEach() {
     reporter.Progress(++done, options.inputs.size(), ToUtf8(input));
     const ExitCode code = RunGuarded(input);
     succeeded += code == kSuccess;
+    if (code != kSuccess) reporter.Note(ToUtf8(input) + ": failed");
     worst = std::max(worst, code);
     if (code == kStopped || code == kFault) break;
   }

@@ -23,12 +23,21 @@ using File = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
 
 constexpr wchar_t kTemporarySuffix[] = L".macrorun~";
 
+// NUL, AUX and the like are devices in every folder, whatever lies there.
+bool IsDevice(const fs::path& path) {
+  using Function = ULONG(WINAPI*)(const wchar_t*);
+  void* const found = reinterpret_cast<void*>(
+      GetProcAddress(GetModuleHandleW(L"ntdll.dll"), "RtlIsDosDeviceName_U"));
+  return found && reinterpret_cast<Function>(found)(path.c_str()) != 0;
+}
+
 File Open(const fs::path& path, const char* what) {
+  const std::string refused = std::string("cannot read the ") + what + " " + ToUtf8(path) + ": ";
+  if (IsDevice(path)) throw UsageError(refused + "Windows takes the name for a device");
+  std::error_code ignored;
+  if (fs::is_directory(path, ignored)) throw UsageError(refused + "it is a folder");
   File file(_wfopen(path.c_str(), L"rb"), std::fclose);
-  if (!file) {
-    const std::string reason = std::strerror(errno);
-    throw UsageError(std::string("cannot read the ") + what + " " + ToUtf8(path) + ": " + reason);
-  }
+  if (!file) throw UsageError(refused + std::strerror(errno));
   return file;
 }
 
