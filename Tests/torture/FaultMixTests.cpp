@@ -57,8 +57,7 @@ class FaultMixTest : public TortureTest {
 TEST_F(FaultMixTest, EachRunEndsAsItShould) {
   on = {{"call 7", [&] { Function(); }}, {"engine: SetScriptState 2", [&] { Script(); }}};
   const int each = Rounds(10000, 20);
-  SCOPED_TRACE("the first trace opens a handle");
-  const Resources before = Used();
+  Resources early = {};  // after a tenth
   int runs = 0;
   // Every ending at every place that often, in random order, and what is nested besides.
   std::vector<Ending> endings;
@@ -70,17 +69,18 @@ TEST_F(FaultMixTest, EachRunEndsAsItShould) {
     SCOPED_TRACE("run " + std::to_string(runs));
     ExpectEnd(ending);
     if (++runs % 50 == 0) ExpectRightRun();
+    if (runs == static_cast<int>(endings.size()) / 10) early = Used();
     if (HasFailure()) break;
   }
-  const Resources after = Used();
+  const Resources late = Used();
   for (unsigned how = 0; how <= kNothing; ++how)
     Figure("%s: %d in the host, %d in the engine",
            how < kStop    ? kFaults[how].first
            : how == kStop ? "stop"
                           : "no fault",
            done[how][kInHost], done[how][kInEngine]);
-  Figure("%d runs, %u handles before and %u after, %d bytes left behind by each", runs,
-         before.handles, after.handles,
-         static_cast<int>(after.kilobytes - before.kilobytes) * 1024 / runs);
-  EXPECT_EQ(before.handles, after.handles);
+  Figure("%d runs, %u handles after a tenth and %u at the end, %d bytes left behind by each", runs,
+         early.handles, late.handles,
+         static_cast<int>(late.kilobytes - early.kilobytes) * 1024 / (runs - runs / 10));
+  EXPECT_LE(late.handles, early.handles + kOwnHandles);
 }

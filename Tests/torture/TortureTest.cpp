@@ -75,7 +75,7 @@ void TortureTest::Repeat(const char* what, int rounds, int often,
   const Resources late = Used();
   Figure("%d %s: %u KiB and %u handles after a tenth, %u KiB and %u handles at the end", rounds,
          what, early.kilobytes, early.handles, late.kilobytes, late.handles);
-  EXPECT_LE(late.handles, early.handles + early.handles / 100) << what;
+  EXPECT_LE(late.handles, early.handles + kOwnHandles) << what;
   const unsigned more = Rounds(0, 512) + rounds * grows / 1024;
   EXPECT_LE(late.kilobytes, early.kilobytes + early.kilobytes / 100 + more) << what;
 }

@@ -14,6 +14,9 @@
 // The message boxes that the module has shown; they are answered at once.
 inline int boxes = 0;
 
+// The system opens some handles late, for itself.
+constexpr unsigned kOwnHandles = 4;
+
 // The figures of a long test: one line each, collected by scripts/torture.sh.
 void Figure(const char* format, ...) __attribute__((format(printf, 1, 2)));
 
