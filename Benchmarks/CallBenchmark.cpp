@@ -157,6 +157,12 @@ void PrintParts(Section& section) {
     block = std::malloc(48);
     std::free(block);
   });
+  PrintPart(section, "the same of three arguments and their texts, all six blocks at once", [] {
+    void* blocks[6];
+    for (int i = 0; i < 6; ++i) blocks[i] = std::malloc(i % 2 ? 13 : 48);
+    for (void* each : blocks) std::free(each);
+    block = blocks[0];
+  });
   PrintPart(section, "`malloc` and `free` of a list of 50 slots, zeroed", [] {
     block = std::calloc(50, 4);
     std::free(block);

@@ -3,15 +3,34 @@
 
 #include <locale.h>
 
-// Room for a whole number of 32 bits, a sign, a point and six decimals.
-static constexpr u32 kNumberSize = 24;
+// A number being written from its end, so that the text can be made at its full size at once.
+class NumberText {
+ public:
+  explicit NumberText(i32 value);
+  explicit NumberText(double value);
+  NumberText(const NumberText&) = delete;
+  NumberText& operator=(const NumberText&) = delete;
 
-// Writes the digits of `value` so that they end before `end`, at least `least` of them, and returns
-// where they begin.
-static char* WriteDigits(char* end, u32 value, int least) {
+  const char* Text() const { return start; }  // empty when the C runtime has to write it
+
+ private:
+  void Prepend(char ch) { *--start = ch; }
+  void PrependDigits(u32 value, int least);
+
+  char characters[24] = "";  // a whole number of 32 bits, a sign, a point and six decimals
+  char* start = characters + sizeof characters - 1;
+};
+
+// At least `least` digits.
+void NumberText::PrependDigits(u32 value, int least) {
   for (; value != 0 || least > 0; value /= 10, --least)
-    *--end = static_cast<char>('0' + value % 10);
-  return end;
+    Prepend(static_cast<char>('0' + value % 10));
+}
+
+NumberText::NumberText(i32 value) {
+  const u32 bits = static_cast<u32>(value);
+  PrependDigits(value < 0 ? 0 - bits : bits, 1);
+  if (value < 0) Prepend('-');
 }
 
 // A real's size, rounded to six decimals.
@@ -40,49 +59,28 @@ static char DecimalPoint() {
   return point[0] && !point[1] ? point[0] : '\0';
 }
 
-// As %lf writes it, in `number`; null when the C runtime has to do it.
-static const char* WriteReal(double value, char (&number)[kNumberSize]) {
+NumberText::NumberText(double value) {
   const bool negative = value < 0 || (value == 0 && 1 / value < 0);
   const char point = DecimalPoint();
   Decimal decimal;
-  if (!point || !Round(negative ? -value : value, decimal)) return nullptr;
-  char* start = number + kNumberSize - 1;
-  *start = 0;
-  start = WriteDigits(start, decimal.millionths, 6);
-  *--start = point;
-  start = WriteDigits(start, decimal.whole, 1);
-  if (negative) *--start = '-';
-  return start;
+  if (!point || !Round(negative ? -value : value, decimal)) return;
+  PrependDigits(decimal.millionths, 6);
+  Prepend(point);
+  PrependDigits(decimal.whole, 1);
+  if (negative) Prepend('-');
 }
 
-void xArgument::SetText(const char* value) {
-  kind = kText;
-  text.Assign(value);
-}
-
-void xArgument::SetInteger(i32 value) {
-  kind = kInteger;
-  integer = value;
-  real = value;
-  char number[kNumberSize];
-  char* start = number + kNumberSize - 1;
-  *start = 0;
-  const u32 bits = static_cast<u32>(value);
-  start = WriteDigits(start, value < 0 ? 0 - bits : bits, 1);
-  if (value < 0) *--start = '-';
-  text.Assign(start);
-}
-
-void xArgument::SetReal(double value) {
-  kind = kReal;
-  // The conversion of a value that does not fit is undefined in C++; this is what the processor's
-  // own instruction answers. The comparison is false for a value that is not a number.
+// The conversion of a value that does not fit is undefined in C++; this is what the processor's own
+// instruction answers. The comparison is false for a value that is not a number.
+static i32 Truncated(double value) {
   const bool fits = value > -2147483649.0 && value < 2147483648.0;
-  integer = fits ? static_cast<i32>(value) : INT32_MIN;
-  real = value;
-  char number[kNumberSize];
-  if (const char* const written = WriteReal(value, number))
-    text.Assign(written);
-  else
-    text.Format("%lf", value);
+  return fits ? static_cast<i32>(value) : INT32_MIN;
+}
+
+xArgument::xArgument(i32 value)
+    : kind(kInteger), integer(value), real(value), text(NumberText(value).Text()) {}
+
+xArgument::xArgument(double value)
+    : kind(kReal), integer(Truncated(value)), real(value), text(NumberText(value).Text()) {
+  if (text.IsEmpty()) text.Format("%lf", value);
 }

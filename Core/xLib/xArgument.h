@@ -15,12 +15,12 @@ class xArgument {
  public:
   enum Kind : u32 { kText = 1, kInteger = 2, kReal = 3 };
 
+  explicit xArgument(const char* value) : text(value) {}
+  explicit xArgument(i32 value);
+  explicit xArgument(double value);
+
   SLOTS_FROM(0);
   SLOT(0) ~xArgument() = default;
-
-  void SetText(const char* value);
-  void SetInteger(i32 value);
-  void SetReal(double value);
 
   u32 kind = kText;
   i32 integer = 0;  // a real's is truncated toward zero, -2147483648 when it does not fit

@@ -70,35 +70,31 @@ HRESULT xScript::GetIDsOfNames(REFIID riid, LPOLESTR* names, UINT count, LCID, D
 }
 
 // A value of any other type as text; the text stays empty when the system cannot convert it.
-static void SetConvertedText(xArgument& argument, VARIANT& value) {
+static xArgument* NewFromText(VARIANT& value) {
   VARIANT text = {};
   VariantChangeType(&text, &value, 0, VT_BSTR);
-  argument.SetText(NarrowFromWide(text.bstrVal));
+  xArgument* const argument = new xArgument(NarrowFromWide(text.bstrVal));
   VariantClear(&text);
+  return argument;
 }
 
-static void SetArgument(xArgument& argument, VARIANT& value) {
+// Null: no memory.
+static xArgument* NewArgument(VARIANT& value) {
   switch (value.vt) {
     case VT_BSTR:
-      argument.SetText(NarrowFromWide(value.bstrVal));
-      break;
+      return new xArgument(NarrowFromWide(value.bstrVal));
     case VT_I1:
-      argument.SetInteger(static_cast<signed char>(value.cVal));
-      break;
+      return new xArgument(i32{static_cast<signed char>(value.cVal)});
     case VT_I2:
-      argument.SetInteger(value.iVal);
-      break;
+      return new xArgument(i32{value.iVal});
     case VT_I4:
-      argument.SetInteger(value.lVal);
-      break;
+      return new xArgument(static_cast<i32>(value.lVal));
     case VT_INT:
-      argument.SetInteger(value.intVal);
-      break;
+      return new xArgument(i32{value.intVal});
     case VT_R8:
-      argument.SetReal(value.dblVal);
-      break;
+      return new xArgument(value.dblVal);
     default:
-      SetConvertedText(argument, value);
+      return NewFromText(value);
   }
 }
 
@@ -133,9 +129,8 @@ static bool Convert(const DISPPARAMS& params, Array<xArgument>& arguments) {
   for (UINT i = params.rgvarg ? params.cArgs : 0; i-- > 0;) {
     VARIANT& value = params.rgvarg[i];
     if (IsSkipped(value)) continue;
-    xArgument* const argument = new xArgument;
+    xArgument* const argument = NewArgument(value);
     if (!argument) return false;
-    SetArgument(*argument, value);
     if (arguments.SetAt(argument, arguments.Count()) < 0) {
       delete argument;
       return false;

@@ -30,7 +30,7 @@ FIFO<String> history(3);
 Stack<String> stack;
 cHashTable<String> table;
 StringDZ lines;
-xArgument argument;
+xArgument argument("");
 xScriptInfo info(false);
 MacroRuby engine;
 xScriptExecutor site(nullptr, false, false, 0);
