@@ -95,5 +95,8 @@ std::string Comparison::ChartLine() const {
   char numbers[128];
   std::snprintf(numbers, sizeof numbers, "\t%.4f\t%.4f\t%.4f\t", Median(ratios), *least, *greatest);
   const bool ratioGoal = goal && measure == Measure::kRatio;
-  return name + numbers + (ratioGoal ? std::to_string(*goal) : "?") + "\n";
+  std::string label;
+  for (const char ch : name)
+    if (ch != '`') label += ch == '"' ? '\'' : ch;  // gnuplot has its own use for quotes
+  return label + numbers + (ratioGoal ? std::to_string(*goal) : "?") + "\n";
 }

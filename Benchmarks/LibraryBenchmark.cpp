@@ -212,7 +212,7 @@ struct Curve {
 };
 
 void CompareCase(Section& section, const Case& each) {
-  section.Chart(std::string(each.name) + "\tsize\town\t" + each.peerName + "\n");
+  std::string lines;
   std::string row = "| `" + std::string(each.name) + "` |";
   Curve curve;
   for (const int size : kSizes) {
@@ -228,12 +228,14 @@ void CompareCase(Section& section, const Case& each) {
     row += text;
     std::snprintf(text, sizeof text, "\t%d\t%.3f\t%.3f\n", size, nanoseconds,
                   comparison.PeerTime() * 1e9);
-    section.Chart(each.name + std::string(text));
+    lines += each.name + std::string(text);
   }
-  section.Chart("\n\n");
   for (std::size_t left = curve.times.size(); left < std::size(kSizes); ++left) row += " - |";
   const int from = curve.GrowsFrom();
-  section.Print(row + (from ? " from " + SizeText(from) + ": " + each.design : "") + " |\n");
+  const std::string grows = from ? " from " + SizeText(from) + ": " + each.design : "";
+  section.Print(row + grows + " |\n");
+  const std::string title = each.name + (from ? ", grows" + grows : "");
+  section.Chart(title + "\tsize\town\t" + each.peerName + "\n" + lines + "\n\n");
 }
 
 }  // namespace

@@ -4,6 +4,6 @@
 
 class Section;
 
-// The chart's file has a line for each case and size: case, size, nanoseconds for each element, the
-// peer's, by tabs; an empty line ends a case.
+// The chart's file has a block for each case: a line with its title and its peer's, then one for each
+// size: case, size, nanoseconds for each element, the peer's, by tabs. Two empty lines end it.
 bool CompareLibrary(Section& section);

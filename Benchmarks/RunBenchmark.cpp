@@ -113,7 +113,9 @@ bool CompareRuns(Section& section) {
   section.Begin("Running an empty macro",
                 "`execute`, from the call to its return. \"Engine\" stands for the engine's steps "
                 "without the module: create it, give it a site and `tarn`, parse, connect, close. "
-                "JScript has the description file that ships with `macrorun`, Ruby none.");
+                "JScript has the description file that ships with `macrorun`, Ruby none. "
+                "The module reads two files for each run, the description and the macro: the rows "
+                "in brackets tell what opening each costs by itself.");
   section.Head();
   return CompareJScriptRuns(section) && CompareRubyRuns(section);
 }

@@ -1,7 +1,8 @@
 # SPDX-License-Identifier: MIT
-# What log-macro.rbs does, as a program that reads the file by itself.
+# What log-macro.rbs does, as a program that reads the file by itself: log-plain.rb FILE MODE, the mode
+# being "r", which looks for line ends of two characters, or "rb", which does not.
 kept = []
-File.foreach(ARGV.fetch(0), chomp: true) do |line|
+File.foreach(ARGV.fetch(0), mode: ARGV.fetch(1), chomp: true) do |line|
   kept << line if line.include?(" ERROR ")
 end
 $stdout.binmode
