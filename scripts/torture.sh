@@ -74,7 +74,9 @@ undefined() {
 
 tidy() {
   local files=(Core/*/*.cpp Scripting/scriptruby/*.cpp)
-  clang-tidy-19 -p build/release --quiet --extra-arg=-Wno-unused-command-line-argument "${files[@]}" &&
+  printf '%s\0' "${files[@]}" |
+    xargs -0 -n 1 -P "$(nproc)" \
+      clang-tidy-19 -p build/release --quiet --extra-arg=-Wno-unused-command-line-argument &&
     echo "figure: ${#files[@]} files, no finding"
 }
 
