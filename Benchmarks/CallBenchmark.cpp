@@ -192,8 +192,8 @@ bool CompareCalls(Section& section) {
       "One call of a macro function, its share of the script's loop included: by "
       "`tarn` through the module, and of a COM object that converts nothing in the same "
       "script engine. \"Ruby engine alone\" is that object as `tarn`, without the module. "
-      "Each argument takes two blocks of memory, which hosts count on being made and freed "
-      "for each call; what they cost is among the parts of the next section.");
+      "An argument is made in the block of the last call's; its text takes a block of its own, "
+      "whose cost is among the parts of the next section.");
   section.Head();
   Module module(JScriptDescription());
   return CompareJScript(section, module, "tarn.f()", 1.5) &&

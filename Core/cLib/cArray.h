@@ -55,7 +55,10 @@ class Array {
 
   // Deletes the elements (owning) and sets the count to 0. Each element leaves its slot before it
   // is deleted, so a second call after a fault in a destructor goes on with the next one.
-  void Clear();
+  void Clear() { Truncate(0); }
+
+  // As Clear, but keeps the first `size` slots. `size` is at most Count(), or 0.
+  void Truncate(i32 size);
 
   // Sets the count to 0 without looking at the elements.
   void Forget() { count = 0; }
@@ -131,15 +134,15 @@ T* Array<T>::Detach(i32 index) {
 }
 
 template <class T>
-void Array<T>::Clear() {
-  for (i32 i = 0; ownsElements && i < count; ++i) {
+void Array<T>::Truncate(i32 size) {
+  for (i32 i = size; ownsElements && i < count; ++i) {
     if (!HasSlot(i)) {
       REPORT_ASSERT("cArray", "Count beyond capacity");
       break;
     }
     delete Detach(i);
   }
-  count = 0;
+  count = size;
 }
 
 // An Array used as a sequence.

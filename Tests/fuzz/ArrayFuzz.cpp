@@ -53,9 +53,11 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, size_t size) {
           CHECK(real.Capacity() == before + (slots > 0 ? static_cast<u32>(slots) : 0));
           break;
         }
-        case 4:
-          real.Clear(), model.clear();
+        case 4: {
+          const size_t kept = input.ConsumeIntegralInRange<size_t>(0, model.size());
+          real.Truncate(static_cast<int>(kept)), model.resize(kept);
           break;
+        }
         default:
           // Not owning, its elements are somebody else's.
           real.SetOwnsElements(false);

@@ -66,6 +66,7 @@ TEST_F(DispatchTest, EachCallHasItsArgumentsAlone) {
   auto table = Table(DeleteForeign);
   foreign[0] = table.data();
   const auto text = [](const wchar_t* units) { return Value(VT_BSTR, SysAllocString(units)); };
+  const auto items = [&] { return At<void**>(host.context, 51 + 16); };
   const VARIANT one = Value(VT_I4, 1), real = Value(VT_R8, -2.5);
   Script([&] {
     Call(L"f", {real, text(L"a longer text"), one});
@@ -74,10 +75,30 @@ TEST_F(DispatchTest, EachCallHasItsArgumentsAlone) {
     Call(L"f", {text(L"")});
     Call(L"f");
     Call(L"f", {real, one, Value(VT_BOOL, 1)});
-    on["call 7"] = [&] { At<void**>(host.context, 51 + 16)[0] = foreign; };
-    Call(L"f", {one});
-    on.erase("call 7");
-    Call(L"f", {real, text(L"text")});
+    for (int place : {0, 1}) {
+      on["call 7"] = [&] { items()[place] = foreign; };
+      Call(L"f", {one, one});
+      on.erase("call 7");
+      Call(L"f", {real});
+    }
+
+    // What the host takes out of the list, or does not let the list own, stays as it is.
+    std::vector<void*> kept;
+    for (unsigned owns : {1u, 0u}) {
+      on["call 7"] = [&] {
+        kept.push_back(items()[0]);
+        At<unsigned>(host.context, 51 + 12) = owns;
+        if (owns) items()[0] = nullptr;
+      };
+      Call(L"f", {text(L"kept")});
+      on.erase("call 7");
+      Call(L"f", {text(L"new")});
+    }
+    At<unsigned>(host.context, 51 + 12) = 1;
+    for (void* each : kept) {
+      EXPECT_STREQ("kept", At<char*>(each, 24 + 8));
+      CallSlot<void*>(each, 0, 1);
+    }
   });
 }
 
