@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: MIT
-# Prints the lines of code of each folder, and those of the tests as a share of the rest.
+# Prints the lines of code of each folder, and those of the tests as a share of the rest and of all.
 #
 # What counts: the lines of C, C++ and Ruby files known to git that are neither blank nor a comment.
 # A line is a comment when it starts, behind any blanks, with // or #; so preprocessor lines do not
@@ -19,4 +19,5 @@ for folder in Core Scripting Tools Benchmarks Tests; do
   printf '%-10s%6d\n' "$folder" "$lines"
   [ "$folder" = Tests ] || code=$((code + lines))
 done
-echo "Tests are $lines lines to $code of code: $(((1000 * lines / code + 5) / 10))%"
+percent() { echo "$(((1000 * lines / $1 + 5) / 10))%"; }
+echo "Tests are $lines lines to $code of code, $(percent "$code"), and $(percent $((code + lines))) of both"

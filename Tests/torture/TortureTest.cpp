@@ -64,7 +64,7 @@ std::string TortureTest::RightRun() {
 void TortureTest::ExpectRightRun() { ASSERT_EQ(right, RightRun()); }
 
 void TortureTest::Repeat(const char* what, int rounds, int often,
-                         const std::function<void(int)>& round, unsigned grows) {
+                         const std::function<void(int)>& round) {
   Resources early = {};
   for (int i = 0; i < rounds && !HasFatalFailure(); ++i) {
     SCOPED_TRACE("round " + std::to_string(i));
@@ -76,7 +76,8 @@ void TortureTest::Repeat(const char* what, int rounds, int often,
   Figure("%d %s: %u KiB and %u handles after a tenth, %u KiB and %u handles at the end", rounds,
          what, early.kilobytes, early.handles, late.kilobytes, late.handles);
   EXPECT_LE(late.handles, early.handles + kOwnHandles) << what;
-  const unsigned more = Rounds(0, 512) + rounds * grows / 1024;
+  // A short test ends while the heaps still find their size.
+  const unsigned more = Rounds(0, 512);
   EXPECT_LE(late.kilobytes, early.kilobytes + early.kilobytes / 100 + more) << what;
 }
 

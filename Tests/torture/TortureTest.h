@@ -39,9 +39,7 @@ class TortureTest : public ModuleTest {
 
   // Does `round` for 0 to `rounds`, each followed by a right run every `often` rounds, and prints what
   // the process holds after a tenth and at the end, which has to be the same within 1 %.
-  // `grows` is what each round may leave behind, in bytes.
-  void Repeat(const char* what, int rounds, int often, const std::function<void(int)>& round,
-              unsigned grows = 0);
+  void Repeat(const char* what, int rounds, int often, const std::function<void(int)>& round);
 
   unsigned Below(size_t n) { return static_cast<unsigned>(random() % n); }
   bool OneIn(size_t n) { return Below(n) == 0; }
