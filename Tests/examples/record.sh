@@ -57,6 +57,7 @@ done << CASES
 [{"text": "a"}, 5]|step 2: expected an object with "text", "bytes", "key" or "call", got 5
 [{}]|step 1: expected an object
 [{"txt": "a"}]|step 1: "txt": no key of a step
+[{"call": "find", "args": ["a"]}]|step 1: "args": no key of a call, beside which "arguments" may stand
 [{"text": "a", "key": "Enter"}]|step 1: "text": cannot stand beside "key"
 [{"text": "a", "arguments": []}]|step 1: "arguments": stands beside "call" only
 [{"text": 5}]|step 1: "text": expected a text, got 5
@@ -70,7 +71,8 @@ done << CASES
 [{"call": "undo", "arguments": 5}]|step 1: "arguments": expected a list, got 5
 [{"call": "write", "arguments": [null]}]|step 1: "arguments": argument 1: expected a number, a text
 [{"call": "goto_line"}]|step 1: "arguments": goto_line: expected 1 argument (line), got 0
-[{"call": "goto_line", "arguments": [0]}]|step 1: "arguments": goto_line: argument 1 of (line)
+[{"call": "goto_line", "arguments": [0]}]|step 1: "arguments": goto_line: argument 1 of (line): expected a line number from 1 to 2147483647, got "0"
+[{"call": "goto_line", "arguments": [2147483648]}]|step 1: "arguments": goto_line: argument 1 of (line)
 [{"call": "goto_line", "arguments": [1.5]}]|step 1: "arguments": goto_line: argument 1 of (line)
 [{"call": "delete_lines", "arguments": [3, 2]}]|step 1: "arguments": delete_lines: argument 2
 [{"call": "set_line", "arguments": [1, "a\nb"]}]|step 1: "arguments": set_line: argument 2

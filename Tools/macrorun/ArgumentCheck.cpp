@@ -99,6 +99,7 @@ std::size_t ArgumentCheck::Length(std::size_t line) const {
 
 std::size_t ArgumentCheck::CheckNumber(std::size_t index, std::size_t first, std::size_t last,
                                        const std::string& what) const {
+  last = std::min(last, kMost);
   const std::optional<std::int64_t> number = WholeNumber(arguments[index]);
   if (!number || *number < static_cast<std::int64_t>(first) ||
       *number > static_cast<std::int64_t>(last))
@@ -108,8 +109,7 @@ std::size_t ArgumentCheck::CheckNumber(std::size_t index, std::size_t first, std
 
 std::string ArgumentCheck::CheckText(std::size_t index, ParameterKind kind) const {
   std::string text(arguments[index].text);
-  if (text.size() >= kNarrowLimit)
-    Fail(index, "at most 511 bytes (the text may have been cut)");
+  if (text.size() >= kNarrowLimit) Fail(index, "at most 511 bytes (the text may have been cut)");
   if (kind == ParameterKind::kLineText && text.find('\n') != text.npos)
     Fail(index, "one line without a line end");
   if (kind == ParameterKind::kName && text.empty()) Fail(index, "a text that is not empty");

@@ -98,7 +98,8 @@ std::string StepReader::Kind() const {
   for (const auto& [key, value] : step.items()) {
     if (key == "arguments") continue;
     if (key != "text" && key != "bytes" && key != "key" && key != "call")
-      Fail(key, std::string("no key of a step: ") + kExpected);
+      Fail(key, step.contains("call") ? "no key of a call, beside which \"arguments\" may stand"
+                                      : std::string("no key of a step: ") + kExpected);
     if (!kind.empty()) Fail(key, "cannot stand beside \"" + kind + "\"");
     kind = key;
   }
