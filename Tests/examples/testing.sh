@@ -8,8 +8,9 @@
 mkdir empty folder folder/inner.rbs
 expect 2 'no macros in empty' --test empty
 expect 2 'folder missing' --test missing
-echo '@tarn.write("x")' > macro.rbs
-expect 2 'folder macro.rbs' --test macro.rbs
+echo '@tarn.write("x")' | tee macro.rbs > macro.txt
+expect 2 'folder missing.rbs' --test missing.rbs
+expect 2 'macro.txt' --test macro.txt
 expect 2 '--test' --test folder macro.rbs
 expect 2 '--test' --test folder -o out.txt
 expect 2 '--test' --test folder --each macro.rbs
@@ -100,6 +101,28 @@ chmod a-r bad/c.out
 [ -r bad/c.out ] || expect 2 'cannot read the file bad/c.out' --test bad
 chmod a+r bad/c.out
 expect 2 'missing.dll' --test bad --module missing.dll
+
+# Several texts for a macro, in each of its languages; a macro that has no other; texts of none
+mkdir cases
+echo 'tarn.document_end(); tarn.write("!");' > cases/a.js
+echo '@tarn.message("Ruby"); raise "oops" if @tarn.get_text == "c"; @tarn.document_end; @tarn.write("!")' | tee cases/a.rbs > cases/b.rbs
+echo '@tarn.write("own ")' > cases/a.own.rbs
+printf a > cases/A.In; printf 'a!' > cases/a.out
+printf b > cases/a.long.in; printf 'b!' > cases/A.long.out
+printf '!' > cases/a.empty.out
+printf o > cases/a.own.in; printf 'own o' > cases/a.own.out
+printf c | tee cases/b.first.in cases/c.in > cases/a..in
+expect 1 'macrorun: 7 passed, 1 failed' --test cases
+grep -qx 'cases/a.rbs (long): Ruby' err && grep -qx 'macrorun: cases/b.rbs (first): failed' err || fail "cases: $(cat err)"
+[ "$(grep -c 'cases/\(c\|a\.\).in belongs to no macro' err)" -eq 2 ] && [ "$(grep -c belongs err)" -eq 2 ] || fail "orphans: $(cat err)"
+rm cases/a.empty.out
+expect 0 'macrorun: 2 passed, 0 failed' --test cases/a.js
+[ "$(wc -l < err)" -eq 1 ] || fail "one macro: $(cat err)"
+printf d > cases/b.first.in
+expect 0 'macrorun: promoted cases/b.first.out' --test cases/b.rbs --promote
+cd cases || exit 1
+expect 0 '{"type":"test","macro":"A.js","case":"long","passed":true}' --test A.js --errors json
+cd .. || exit 1
 
 # --promote: what ran without an error and is another text or has none; whole, or as it was
 mkdir new

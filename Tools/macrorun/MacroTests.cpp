@@ -1,71 +1,36 @@
 // SPDX-License-Identifier: MIT
 #include "MacroTests.h"
 
-#include <windows.h>
-
 #include <algorithm>
 #include <map>
 #include <memory>
-#include <tuple>
 
 #include "Encoding.h"
 #include "Files.h"
 #include "Language.h"
 #include "MacroRun.h"
+#include "TestFolder.h"
 #include "TextDiff.h"
 
 namespace fs = std::filesystem;
 
 namespace {
 
-struct Test {
+struct Test : MacroTest {
   enum class State { kNotBegun, kFailed, kDiffers, kPassed, kPromoted };
 
-  fs::path Beside(const char* extension) const {
-    return fs::path(macro).replace_extension(extension);
-  }
-  fs::path Input() const { return Beside(".in"); }
-  fs::path Expected() const { return Beside(".out"); }
+  explicit Test(const MacroTest& found) : MacroTest(found) {}
   // Whether `made` is the macro's whole work.
   bool Ran() const { return state == State::kDiffers || state == State::kPassed; }
 
-  fs::path macro;
   State state = State::kNotBegun;
   ExitCode code = kSuccess;
   std::string made;
 };
 
-// The same for all spellings of a file's name.
-std::wstring Folded(const fs::path& path) {
-  std::wstring text = path.wstring();
-  CharLowerBuffW(text.data(), static_cast<DWORD>(text.size()));
-  return text;
-}
-
 bool Exists(const fs::path& path) {
   std::error_code error;
   return fs::exists(path, error);
-}
-
-// By language, then by name.
-std::vector<Test> TestsIn(const fs::path& folder) {
-  std::vector<Test> tests;
-  std::error_code error;
-  for (fs::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
-    std::error_code ignored;
-    if (!HasLanguage(entry->path()) || entry->is_directory(ignored)) continue;
-    tests.emplace_back().macro = (folder / entry->path().filename()).generic_wstring();
-  }
-  if (error)
-    throw UsageError("cannot read the folder " + ToUtf8(folder) + " (--test): " + error.message());
-  if (tests.empty()) throw UsageError("no macros in " + ToUtf8(folder) + " (--test)");
-  const auto key = [](const Test& test) {
-    return std::make_tuple(Folded(test.macro.extension()), Folded(test.macro));
-  };
-  std::sort(tests.begin(), tests.end(),
-            [&](const Test& left, const Test& right) { return key(left) < key(right); });
-  return tests;
 }
 
 // What runs the macros of one language; one at a time.
@@ -79,8 +44,7 @@ struct LanguageHost {
 
 class MacroTests {
  public:
-  MacroTests(const Options& given, Reporter& runReporter)
-      : options(given), reporter(runReporter), tests(TestsIn(given.test)) {}
+  MacroTests(const Options& given, Reporter& runReporter);
 
   ExitCode Run();
 
@@ -109,6 +73,14 @@ class MacroTests {
   std::unique_ptr<LanguageHost> host;
 };
 
+MacroTests::MacroTests(const Options& given, Reporter& runReporter)
+    : options(given), reporter(runReporter) {
+  const TestFolder folder(given.test);
+  for (const MacroTest& found : folder.tests) tests.emplace_back(found);
+  for (const fs::path& text : folder.orphans)
+    reporter.Note(ToUtf8(text.generic_wstring()) + " belongs to no macro");
+}
+
 ExitCode MacroTests::Run() {
   const bool whole = RunAll();
   // The other half of a test in two languages may be among those not begun.
@@ -124,12 +96,13 @@ ExitCode MacroTests::Run() {
 bool MacroTests::RunAll() {
   std::size_t number = 0;
   for (Test& test : tests) {
-    const std::string name = ToUtf8(test.macro);
-    reporter.Progress(++number, tests.size(), name);
+    const std::string name = ToUtf8(test.macro), textCase = ToUtf8(test.textCase);
+    reporter.Progress(++number, tests.size(),
+                      name + (textCase.empty() ? "" : " (" + textCase + ")"));
     UseLanguageOf(test.macro);
-    reporter.SetMacro(name);
+    reporter.SetMacro(name, textCase);
     RunOne(test);
-    reporter.SetMacro({});
+    reporter.SetMacro({}, {});
     if (test.code == kStopped || test.code == kFault) return false;
   }
   return true;
@@ -146,7 +119,10 @@ void MacroTests::UseLanguageOf(const fs::path& macro) {
 void MacroTests::RunOne(Test& test) {
   test.state = State::kFailed;
   test.code = RunGuarded(test);
-  if (!test.Ran()) reporter.TestEnd(false, {});
+  if (test.Ran()) return;
+  // The error itself says which macro.
+  if (!test.textCase.empty()) reporter.Note("failed");
+  reporter.TestEnd(false, {});
 }
 
 // A file that cannot be read keeps no other test from its turn.

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Runs the macros of a folder as tests: each over the text in NAME.in, or an empty one, and its text
-// compared with the one in NAME.out. What a macro says or does besides is not looked at.
+// Runs the macros of a folder as tests (TestFolder.h): each over the text in NAME.in, or an empty one, and
+// its text compared with the one in NAME.out. What a macro says or does besides is not looked at.
 //
 // All run in this process, language by language. Nothing in the folder is written, except what
 // --promote asks for and what the macros themselves write.

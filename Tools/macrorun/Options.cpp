@@ -17,7 +17,7 @@ namespace {
 constexpr char kUsage[] =
     "usage: macrorun [OPTION...] MACRO [FILE|-]\n"
     "       macrorun [OPTION...] MACRO --each FILE...\n"
-    "       macrorun [OPTION...] --test DIR [--promote]\n"
+    "       macrorun [OPTION...] --test DIR|MACRO [--promote]\n"
     "       macrorun --check MACRO...\n"
     "       macrorun --record STEPS [-o MACRO]\n";
 
@@ -125,8 +125,8 @@ void AddReportOptions(CLI::App& app, Options& options, Texts& texts) {
 
 void AddTestOptions(CLI::App& app, Options& options, Texts& texts) {
   CLI::Option* const test =
-      app.add_option("--test", texts.test, "Run the macros in DIR, each over its NAME.in");
-  test->type_name("DIR")->group("Tests");
+      app.add_option("--test", texts.test, "Run all macros in DIR, or one, over NAME.in");
+  test->type_name("DIR|MACRO")->group("Tests");
   for (const char* name : {"MACRO", "FILE", "--each", "--output", "--in-place"})
     test->excludes(app.get_option(name));
   app.add_flag("--promote", options.promote, "Then make each NAME.out the text of its macro")

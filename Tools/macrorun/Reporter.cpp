@@ -7,10 +7,11 @@
 
 namespace {
 
-void WriteObject(const char* type, const std::string& macro,
+void WriteObject(const char* type, const std::string& macro, const std::string& macroCase,
                  const nlohmann::ordered_json& members) {
   nlohmann::ordered_json json = {{"type", type}};
   if (!macro.empty()) json["macro"] = macro;
+  if (!macroCase.empty()) json["case"] = macroCase;
   json.update(members);
   WriteError(json.dump(-1, ' ', false, nlohmann::json::error_handler_t::replace) + "\n");
 }
@@ -51,9 +52,10 @@ void Reporter::Error(ErrorReport error) {
 void Reporter::Line(const char* type, const char* prefix, std::string_view text) {
   EndProgress();
   if (form == Form::kJson)
-    WriteObject(type, macro, {{"text", text}});
+    WriteObject(type, macro, macroCase, {{"text", text}});
   else
-    WriteError(prefix + (macro.empty() ? "" : macro + ": ") + std::string(text) + "\n");
+    WriteError(prefix + macro + (macroCase.empty() ? "" : " (" + macroCase + ")") +
+               (macro.empty() ? "" : ": ") + std::string(text) + "\n");
 }
 
 void Reporter::TestEnd(bool passed, const std::vector<DiffLine>& diff) {
@@ -66,7 +68,7 @@ void Reporter::TestEnd(bool passed, const std::vector<DiffLine>& diff) {
   if (form == Form::kText) return;
   nlohmann::ordered_json json = {{"passed", passed}};
   if (!diff.empty()) json["diff"] = whole;
-  WriteObject("test", macro, json);
+  WriteObject("test", macro, macroCase, json);
 }
 
 void Reporter::Progress(std::size_t number, std::size_t count, const std::string& name) {

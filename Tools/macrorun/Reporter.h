@@ -20,9 +20,12 @@ class Reporter {
 
   explicit Reporter(Form reportForm) : form(reportForm) {}
 
-  // Whose messages, traces and notes follow, for each of which it is told; empty: it is not. Not while
-  // a macro runs.
-  void SetMacro(std::string name) { macro = std::move(name); }
+  // Whose messages, traces and notes follow, and over which of its texts it is tested, both of which are
+  // told with each unless they are empty. Not while a macro runs.
+  void SetMacro(std::string name, std::string textCase) {
+    macro = std::move(name);
+    macroCase = std::move(textCase);
+  }
 
   void Error(ErrorReport error);
   // What a macro says.
@@ -45,6 +48,6 @@ class Reporter {
   void Line(const char* type, const char* prefix, std::string_view text);
 
   const Form form;
-  std::string macro;
+  std::string macro, macroCase;
   std::size_t progressWidth = 0;
 };
