@@ -46,16 +46,12 @@ class Search {
   const Regex& regex;
 };
 
-Regex MakeRegex(MacroCall& call, bool plain, const std::set<std::string_view>& words) {
-  return Regex(call.Text(0), {plain, words.contains("ignore_case"), words.contains("whole_word"),
-                              call.document().Flat().utf8});
-}
-
 // Runs `work` with the call's expression. The options follow the parameter `last`.
 template <class Work>
 MacroResult WithRegex(MacroCall& call, bool plain, std::size_t last, const Work& work) try {
   const auto words = call.Words(last + 1);
-  const Regex regex = MakeRegex(call, plain, words);
+  const Regex regex(call.Text(0), {plain, words.contains("ignore_case"),
+                                   words.contains("whole_word"), call.document().Flat().utf8});
   return work(regex, words);
 } catch (const RegexError& error) {
   call.Fail(0, std::string("a regular expression that works (") + error.what() + ")");
@@ -112,22 +108,20 @@ MacroResult Replace(MacroCall& call, bool plain) {
   });
 }
 
-MacroResult ReplaceAll(MacroCall& call, bool plain) try {
-  const auto words = call.Words(2);
-  Document& document = call.document();
-  const Regex regex = MakeRegex(call, plain, words);
-  const Search search(document, regex);
-  Range area = {{}, document.TextEnd()};
-  if (words.contains("selection")) area = document.Selection();
-  const std::size_t end = document.FlatOffset(area.to);
-  std::vector<Replacement> replacements;
-  for (std::optional<Match> match = search.Next(document.FlatOffset(area.from), false);
-       match && match->To() <= end; match = search.Next(match->To(), true))
-    replacements.push_back({search.RangeOf(*match), NewText(call, search, *match, plain)});
-  document.Replace(replacements);
-  return static_cast<std::int32_t>(replacements.size());
-} catch (const RegexError& error) {
-  call.Fail(0, std::string("a regular expression that works (") + error.what() + ")");
+MacroResult ReplaceAll(MacroCall& call, bool plain) {
+  return WithRegex(call, plain, 1, [&](const Regex& regex, const auto& words) -> MacroResult {
+    Document& document = call.document();
+    const Search search(document, regex);
+    Range area = {{}, document.TextEnd()};
+    if (words.contains("selection")) area = document.Selection();
+    const std::size_t end = document.FlatOffset(area.to);
+    std::vector<Replacement> replacements;
+    for (std::optional<Match> match = search.Next(document.FlatOffset(area.from), false);
+         match && match->To() <= end; match = search.Next(match->To(), true))
+      replacements.push_back({search.RangeOf(*match), NewText(call, search, *match, plain)});
+    document.Replace(replacements);
+    return static_cast<std::int32_t>(replacements.size());
+  });
 }
 
 MacroResult MatchGroup(MacroCall& call) {
