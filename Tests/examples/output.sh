@@ -38,6 +38,10 @@ expect 1 '2 of 3 files done, 1 failed' -i some.rbs --each each/1 each/2 each/3
 grep -qx 'macrorun: each/2: failed' err || fail 'which text an error is about'
 expect_lines each/2 2
 expect_lines each/1 x1+
+echo > each/4.txt && touch each/4.txt~ && mkdir each/5.TXT
+expect 0 '4 of 4 files done' macro.rbs --each 'each\?' 'each/*.txt'
+rm -r each/4* each/5*
+expect 2 'each/*.xyz: there is no such file' macro.rbs --each 'each/*.xyz'
 expect 4 '0 of 2 files done, 1 failed, 1 not begun' --module "$fake" -i macro.rbs --each each/1 each/2
 ! grep -q '\[1/3\]' err || fail 'progress without a terminal'
 if command -v script > /dev/null; then

@@ -4,6 +4,8 @@
 #include <fcntl.h>
 #include <io.h>
 #include <windows.h>
+// shlwapi.h needs windows.h before it.
+#include <shlwapi.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -125,6 +127,23 @@ void Replacement::TakeOverPermissions() {
 }
 
 }  // namespace
+
+// By the long names: the system's own search finds "a.rbs~" for "*.rbs", too.
+std::vector<fs::path> FilesMatching(const fs::path& pattern) {
+  if (pattern.filename().wstring().find_first_of(L"*?") == std::wstring::npos) return {pattern};
+  const fs::path folder = pattern.parent_path();
+  std::vector<fs::path> files;
+  std::error_code error;
+  for (fs::directory_iterator entry(folder.empty() ? "." : folder, error), end;
+       !error && entry != end; entry.increment(error)) {
+    const fs::path name = entry->path().filename();
+    std::error_code ignored;
+    if (!entry->is_directory(ignored) && PathMatchSpecW(name.c_str(), pattern.filename().c_str()))
+      files.push_back(folder / name);
+  }
+  std::sort(files.begin(), files.end());
+  return files;
+}
 
 std::string ReadInput(const fs::path& path) {
   if (path.empty()) return {};

@@ -8,6 +8,11 @@
 
 #include <filesystem>
 #include <string>
+#include <vector>
+
+// The files that a name with * or ? in its last part stands for, by name: the system's shell leaves them
+// to the program. Any other name stands for itself.
+std::vector<std::filesystem::path> FilesMatching(const std::filesystem::path& pattern);
 
 // "-" is standard input, an empty path an empty text.
 std::string ReadInput(const std::filesystem::path& path);
@@ -15,7 +20,7 @@ std::string ReadInput(const std::filesystem::path& path);
 // Fails unless the file can be read. `what` says what it is for.
 void RequireReadable(const std::filesystem::path& path, const char* what);
 
-// Fails unless ReplaceFile could begin: an existing file has to be there (or may be, without
+// Fails unless ReplaceFileBytes could begin: an existing file has to be there (or may be, without
 // `mustExist`) and must not be write-protected.
 void RequireReplaceable(const std::filesystem::path& path, bool mustExist);
 

@@ -11,6 +11,7 @@
 
 #include "Encoding.h"
 #include "ExitCode.h"
+#include "Files.h"
 
 namespace {
 
@@ -67,7 +68,11 @@ std::vector<std::string> ReversedArguments() {
 
 std::vector<std::filesystem::path> Paths(const std::vector<std::string>& texts) {
   std::vector<std::filesystem::path> paths;
-  for (const std::string& text : texts) paths.push_back(PathFromUtf8(text));
+  for (const std::string& text : texts) {
+    const std::vector<std::filesystem::path> files = FilesMatching(PathFromUtf8(text));
+    if (files.empty()) throw CLI::ValidationError(text, "there is no such file");
+    paths.insert(paths.end(), files.begin(), files.end());
+  }
   return paths;
 }
 
