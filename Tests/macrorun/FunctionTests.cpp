@@ -251,6 +251,9 @@ TEST(FunctionTest, Documents) {
   std::ifstream saved(file, std::ios::binary);
   EXPECT_EQ(std::string(std::istreambuf_iterator<char>(saved), {}), "a\r\nb\r\nc");
   saved.close();
+  fs::permissions(file, fs::perms::owner_read);
+  EXPECT_THROW(call("save_document"), WrongCall) << "write-protected";
+  fs::permissions(file, fs::perms::owner_write, fs::perm_options::add);
   EXPECT_EQ(std::distance(fs::directory_iterator(folder), {}), 1);
 
   call("close_document", {"3"});

@@ -1,15 +1,9 @@
 // SPDX-License-Identifier: MIT
 // Several documents. Paths count from the process's current directory. Document 1 is the run's,
 // which alone decides where it goes: it needs a path to be saved and cannot be closed.
-#include <windows.h>
-
-#include <cerrno>
-#include <cstdio>
-#include <cstring>
-#include <memory>
-#include <optional>
-
 #include "../Encoding.h"
+#include "../ExitCode.h"
+#include "../Files.h"
 #include "../MacroCall.h"
 #include "Families.h"
 
@@ -18,37 +12,12 @@ namespace fs = std::filesystem;
 namespace {
 
 using Kind = ParameterKind;
-using File = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
-
-std::optional<std::string> ReadFile(const fs::path& path) {
-  const File file(_wfopen(path.c_str(), L"rb"), std::fclose);
-  if (!file) return {};
-  std::string bytes;
-  char block[16384];
-  while (const std::size_t count = std::fread(block, 1, sizeof block, file.get()))
-    bytes.append(block, count);
-  if (std::ferror(file.get())) return {};
-  return bytes;
-}
-
-// The file is the old or the whole new one: it is written beside and renamed.
-bool WriteFile(const fs::path& path, const std::string& bytes) {
-  fs::path beside = path;
-  beside += L".macrorun-" + std::to_wstring(GetCurrentProcessId());
-  File file(_wfopen(beside.c_str(), L"wb"), std::fclose);
-  if (!file) return false;
-  bool done = std::fwrite(bytes.data(), 1, bytes.size(), file.get()) == bytes.size();
-  done = std::fclose(file.release()) == 0 && done;
-  done = done && MoveFileExW(beside.c_str(), path.c_str(), MOVEFILE_REPLACE_EXISTING);
-  if (!done) DeleteFileW(beside.c_str());
-  return done;
-}
 
 MacroResult Number(const MacroCall& call) {
   return static_cast<std::int32_t>(call.editor.CurrentNumber());
 }
 
-MacroResult OpenDocument(MacroCall& call) {
+MacroResult OpenDocument(MacroCall& call) try {
   std::error_code error;
   const fs::path path = fs::absolute(PathFromUtf8(call.Text(0)), error);
   for (std::size_t number = 1; number <= call.editor.DocumentCount(); ++number) {
@@ -56,14 +25,13 @@ MacroResult OpenDocument(MacroCall& call) {
     call.editor.Switch(number);
     return Number(call);
   }
-  errno = 0;
-  const std::optional<std::string> bytes = ReadFile(path);
-  if (!bytes) call.Fail(0, std::string("a file that can be read (") + std::strerror(errno) + ")");
-  call.editor.Open(Document(*bytes), path);
+  call.editor.Open(Document(ReadInput(path)), path);
   return Number(call);
+} catch (const UsageError& error) {
+  call.Fail(0, std::string("a file that can be read (") + error.what() + ")");
 }
 
-MacroResult SaveDocument(MacroCall& call) {
+MacroResult SaveDocument(MacroCall& call) try {
   const std::size_t number = call.editor.CurrentNumber();
   fs::path path = call.editor.Name(number);
   std::error_code error;
@@ -71,9 +39,12 @@ MacroResult SaveDocument(MacroCall& call) {
     path = fs::absolute(PathFromUtf8(call.Text(0)), error);
   else if (number == 1 || path.empty())
     call.Fail(0, "the path of a file, since this document has none of its own to be saved in");
-  if (!WriteFile(path, call.document().Bytes())) call.Fail(0, "a file that can be written");
+  RequireReplaceable(path, false);
+  ReplaceFileBytes(path, call.document().Bytes());
   if (number != 1) call.editor.SetName(number, path);
   return 0;
+} catch (const UsageError& error) {
+  call.Fail(0, std::string("a file that can be written (") + error.what() + ")");
 }
 
 MacroResult CloseDocument(MacroCall& call) {
