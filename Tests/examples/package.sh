@@ -47,8 +47,16 @@ wine reg query "$class" > "$folder/log" 2>&1 || fail "register.cmd has not regis
 timeout 60 wine cmd /c unregister.cmd < /dev/null > "$folder/out" 2>&1 || fail "unregister.cmd: $(cat "$folder/out")"
 ! wine reg query "$class" > "$folder/log" 2>&1 || fail "unregister.cmd has not unregistered"
 
-# What has to travel with it
-for file in LICENSE README.md licenses/pcre2-LICENCE ruby/licenses/COPYING Docs/macrorun.md; do
+# What has to travel with it: the licences of all that is inside, and what the documents link to
+for file in LICENSE ruby/licenses/COPYING ruby/licenses/gcc-copyright ruby/licenses/mingw-w64-copyright \
+  licenses/pcre2-LICENCE licenses/libcli11-dev-copyright licenses/libdtl-dev-copyright \
+  licenses/nlohmann-json3-dev-copyright licenses/mingw-w64-common-copyright \
+  licenses/gcc-mingw-w64-base-copyright; do
   [ -s "$file" ] || fail "no $file in the package"
+done
+for page in README.md Docs/*.md; do
+  for link in $(sed 's/](/\n](/g' "$page" | sed -n 's/^](\([^):#]*\)[)#].*/\1/p'); do
+    [ -e "$(dirname "$page")/$link" ] || fail "$page links to $link, which is not there"
+  done
 done
 exit $failed
