@@ -76,6 +76,9 @@ i=0
 while [ $i -lt 256 ]; do printf "\\$(printf %03o $i)"; i=$((i + 1)); done > input.txt
 printf '\r\nCR LF\r\n\n\r\nno end' >> input.txt
 expect_same 'tarn.line_count();'
+printf '%s\n' '[Options]' Language=RubyScript FixCRLF=1 FixDelimiter=1 > flags.qwsh
+expect_rbs 0 '' '@tarn.set_line(2, @tarn.get_line(2))' --description flags.qwsh
+cmp input.txt out || fail 'a flag of the description changes the text'
 printf '%01023d\n%0511d' 1 2 > input.txt
 expect_same 'tarn.get_line(1); tarn.set_line(2, tarn.get_line(2));'
 

@@ -1,9 +1,10 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# guide.sh MACRORUN FAKE_MODULE: what the guide for authors of macros shows does what it says.
+# guide.sh MACRORUN FAKE_MODULE: what the guide for authors of macros shows does what it says; so do the
+# recordings in the manual.
+docs=$(cd "$(dirname "$0")/../../Docs" && pwd)
+guide=$docs/writing-macros.md
 . "$(dirname "$0")/runner.sh"
-guide=$(dirname "$0")/../../Docs/writing-macros.md
-[ "${guide#/}" != "$guide" ] || guide=$OLDPWD/$guide
 
 # Macros, and the texts before and after that follow some of them
 awk '/^```ruby$/ { n++; file = n ".rbs"; next }
@@ -36,5 +37,17 @@ run 0 '' prefix --arg 'prefix=| '
 expect_lines out '| one' '| two'
 printf '{"a": [1' > text
 run 1 'This is no JSON' JSON.parse
+
+# Recordings
+awk '/^```json$/ { n++; file = n ".json"; next }
+     /^```/ { file = ""; next }
+     file { print > file }' "$guide" "$docs/macrorun.md"
+for steps in 1.json 2.json; do
+  expect 0 '' --record $steps -o "$steps.rbs"
+  expect 0 '' --check "$steps.rbs"
+done
+printf 'one\ntwo\n' > text
+expect 0 '' 1.json.rbs text
+expect_lines out one '- said "hello"' two
 
 finish
