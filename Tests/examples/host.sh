@@ -24,6 +24,8 @@ run() {
 
 run greeting.rbs 0 'Hello, '
 run greeting.rbs 0 '2 + 40 is 42'
+echo '@tarn.add(1, 2); @tarn.print("then ", @tarn.pause(0))' > nothing.rbs
+run nothing.rbs 0 'then 0'
 echo '@tarn.nothing' > unknown.rbs
 run unknown.rbs 1 'unknown macro scripting function:  nothing'
 run missing.rbs 1 'could not be read'

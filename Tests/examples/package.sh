@@ -47,6 +47,8 @@ wine reg query "$class" > "$folder/log" 2>&1 || fail "register.cmd has not regis
 timeout 60 wine cmd /c unregister.cmd < /dev/null > "$folder/out" 2>&1 || fail "unregister.cmd: $(cat "$folder/out")"
 ! wine reg query "$class" > "$folder/log" 2>&1 || fail "unregister.cmd has not unregistered"
 
+! grep -v "$(printf '\r')\$" ./*.cmd > "$folder/out" || fail "lines that cmd may not take: $(cat "$folder/out")"
+
 # What has to travel with it: the licences of all that is inside, and what the documents link to
 for file in LICENSE ruby/licenses/COPYING ruby/licenses/gcc-copyright ruby/licenses/mingw-w64-copyright \
   licenses/pcre2-LICENCE licenses/libcli11-dev-copyright licenses/libdtl-dev-copyright \

@@ -8,7 +8,8 @@ page=$(cd "$(dirname "$0")/../../Docs" && pwd)/functions.md
 expect 2 'markdown' --functions=html
 expect 2 'cannot write nowhere' --stubs -o nowhere/tarn.rb
 expect 0 '' --functions=markdown
-diff "$page" out || fail "Docs/functions.md is out of date: scripts/run.sh --functions=markdown -o Docs/functions.md"
+cp out page
+diff "$page" page || fail "Docs/functions.md is out of date: scripts/run.sh --functions=markdown -o Docs/functions.md"
 
 # The stubs are Ruby with the list's names and parameters, each with its tag, and leave @tarn alone
 expect 0 '' --functions -o list
@@ -24,18 +25,22 @@ def call_of(name, parameters)
 end
 
 load "./tarn.rb"
+page = File.read("page")
+types = {"nothing" => "void", "a number" => "Integer", "a text" => "String"}
 comments = File.read("tarn.rb").scan(/((?:^  # .+\n|^  #\n)+)  def (\w+)/).to_h { |text, name| [name.to_sym, text] }
 Tarn.instance_methods(false).sort.each do |name|
   parameters = Tarn.instance_method(name).parameters
   tags = comments[name].scan(/@param (\w+) \[[\w<>]+(, nil)?\] \S/)
   wanted = parameters.map { |kind, parameter| [parameter.to_s, (", nil" if kind == :opt)] }
-  raise "#{name}: #{tags}" unless tags == wanted && comments[name] =~ /@return \[(void|Integer|String)\]$/
+  type = types[page[/^### #{name}\n.*?^Result: (.*?)\.$/m, 1]]
+  raise "#{name}: #{tags}" unless tags == wanted && comments[name].end_with?("# @return [#{type}]\n")
   @tarn.write(call_of(name, parameters) + "\n")
 end
 RUBY
 expect 0 '' macro.rbs
 sed -n 's/^  \([a-z_]*([^)]*)\).*/\1/p' list | LC_ALL=C sort > calls
 [ "$(wc -l < calls)" -ge 70 ] && LC_ALL=C sort out | diff calls - || fail 'the stubs are not those of the list'
+grep -q '^  sort_lines.* (options: descending, ignore_case, unique)$' list || fail 'the list has no options'
 grep -qx '@tarn ||= Tarn.new' tarn.rb || fail 'the stubs have no @tarn'
 
 finish

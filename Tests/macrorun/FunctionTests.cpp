@@ -117,6 +117,7 @@ TEST(FunctionTest, DeletingCaseAndIndent) {
       {"[a\n\nb\n|c", {{"indent", {"2"}}}, "  [a\n\n  b\n|c"},
       {"a|b", {{"indent"}}, "\ta|b"},
       {"[   a\n\tb\nc|", {{"unindent", {"2"}}}, "[ a\nb\nc|"},
+      {"         a|", {{"unindent"}}, " a|"},
   });
 }
 
@@ -141,6 +142,7 @@ TEST(FunctionTest, FindAndReplace) {
       {"|ab\ncd", {{"find_regex", {"^(c)(x)?d$"}}, {"match_group", {"2"}}}, "ab\n[cd|", ""},
       {"a|\nb\nc", {{"find_regex", {"^"}}, {"find_regex", {"^"}}}, "a\nb\n|c", "1"},
       {"|a b b", {{"replace", {"b", "x\ny"}}}, "a x\ny| b", "1"},
+      {"|ab", {{"replace_regex", {"(a)", "x"}}, {"match_group", {"1"}}}, "x|b", "a"},
       {"a [b| b",
        {{"replace", {"b", "x", "wrap"}}, {"replace", {"b", "y", "wrap"}}},
        "a y| x",
