@@ -41,6 +41,7 @@ expect 0 '' macro.rbs
 sed -n 's/^  \([a-z_]*([^)]*)\).*/\1/p' list | LC_ALL=C sort > calls
 [ "$(wc -l < calls)" -ge 70 ] && LC_ALL=C sort out | diff calls - || fail 'the stubs are not those of the list'
 grep -q '^  sort_lines.* (options: descending, ignore_case, unique)$' list || fail 'the list has no options'
+grep -qx '  # @param count \[Integer, nil\] 0 or more; left out: all that follow' tarn.rb || fail 'a stub does not tell what holds without an argument'
 grep -qx '@tarn ||= Tarn.new' tarn.rb || fail 'the stubs have no @tarn'
 
 finish

@@ -247,6 +247,9 @@ TEST(FunctionTest, Documents) {
   EXPECT_EQ(call("document_name"), "");
   EXPECT_THROW(call("save_document"), WrongCall);
   EXPECT_THROW(call("save_document", {"no such folder/x"}), WrongCall);
+  call("save_document", {name + ".new"});
+  EXPECT_EQ(call("document_name"), name + ".new");
+  fs::remove(folder / "t.txt.new");
   EXPECT_EQ(call("open_document", {name}), "2");
   EXPECT_EQ(call("get_line", {"3"}), "c");
   call("save_document");
