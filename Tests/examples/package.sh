@@ -28,7 +28,7 @@ cmp "$folder/out" csv-to-table.out || fail "macrorun: $(cat "$folder/err")"
 timeout 60 wine ../macrorun.exe sort-unique.js sort-unique.in > "$folder/out" 2> "$folder/err"
 cmp "$folder/out" sort-unique.out || fail "macrorun with JScript: $(cat "$folder/err")"
 
-# By double click and by dropping a macro, which both have the shell start a file
+# By double click, for which the shell calls cmd; by dropping a macro, as the shell starts the file
 cd .. || exit 1
 timeout 60 wine cmd /c try-example.cmd < /dev/null > "$folder/out" 2>&1
 grep -q '| Jürgen Groß ' "$folder/out" || fail "try-example.cmd: $(cat "$folder/out")"

@@ -116,10 +116,6 @@ bool IsWordAt(std::string_view text, std::size_t offset) {
   return character.valid && IsWordCharacter(character.code);
 }
 
-bool IsBlankAt(std::string_view text, std::size_t offset) {
-  return text[offset] == ' ' || text[offset] == '\t';
-}
-
 std::string WithCase(std::string_view text, LetterCase letterCase) {
   std::string result;
   bool inWord = false;

@@ -22,9 +22,8 @@ std::size_t CharacterCount(std::string_view text);
 std::size_t OffsetOfCharacter(std::string_view text, std::size_t count);
 bool IsValidUtf8(std::string_view text);
 
-// Letters, digits, marks on them and the underscore make words; blank are space and tab.
+// Letters, digits, marks on them and the underscore make words.
 bool IsWordAt(std::string_view text, std::size_t offset);
-bool IsBlankAt(std::string_view text, std::size_t offset);
 
 enum class LetterCase { kUpper, kLower, kTitle };  // title: words begin with a capital
 // One character becomes one character, so "ß" has no capital. Invalid bytes stay.

@@ -7,6 +7,9 @@
 
 #include "ArgumentCheck.h"
 
+// A number that fits: no document is as long as a script's integers go.
+inline MacroResult Answer(std::size_t number) { return static_cast<std::int32_t>(number); }
+
 class MacroCall : public ArgumentCheck {
  public:
   // Checks the arguments. Throws WrongCall.

@@ -11,8 +11,6 @@ namespace {
 
 using Kind = ParameterKind;
 
-std::int32_t Signed(std::size_t number) { return static_cast<std::int32_t>(number); }
-
 MacroResult MoveTo(MacroCall& call, Position place) {
   call.document().MoveCursor(place);
   return 0;
@@ -30,7 +28,7 @@ MacroResult Repeat(MacroCall& call, const Step& step) {
     place = next;
   }
   MoveTo(call, place);
-  return Signed(taken);
+  return Answer(taken);
 }
 
 // The column is kept as far as the line has it.
@@ -45,7 +43,7 @@ MacroResult MoveLines(MacroCall& call, bool down) {
   std::size_t offset = 0;
   if (line <= document.LineCount()) offset = OffsetOfCharacter(document.Line(line), before);
   MoveTo(call, {line, offset});
-  return Signed(count);
+  return Answer(count);
 }
 
 const std::vector<MacroParameter> kSteps = {{"count", Kind::kCount, "1"}};
@@ -61,14 +59,12 @@ const std::vector<MacroFunction> kFunctions = {
      {},
      kNumber,
      "the cursor's line",
-     [](MacroCall& call) -> MacroResult { return Signed(call.document().Cursor().line); }},
+     [](MacroCall& call) { return Answer(call.document().Cursor().line); }},
     {"cursor_column",
      {},
      kNumber,
      "the cursor's column, in characters",
-     [](MacroCall& call) -> MacroResult {
-       return Signed(ColumnOf(call.document(), call.document().Cursor()));
-     }},
+     [](MacroCall& call) { return Answer(ColumnOf(call.document(), call.document().Cursor())); }},
     {"goto",
      {{"line", Kind::kLineOrEnd}, {"column", Kind::kColumn}},
      kNone,

@@ -13,9 +13,7 @@ namespace {
 
 using Kind = ParameterKind;
 
-MacroResult Number(const MacroCall& call) {
-  return static_cast<std::int32_t>(call.editor.CurrentNumber());
-}
+MacroResult CurrentNumber(const MacroCall& call) { return Answer(call.editor.CurrentNumber()); }
 
 MacroResult OpenDocument(MacroCall& call) try {
   std::error_code error;
@@ -23,10 +21,10 @@ MacroResult OpenDocument(MacroCall& call) try {
   for (std::size_t number = 1; number <= call.editor.DocumentCount(); ++number) {
     if (!fs::equivalent(call.editor.Name(number), path, error)) continue;
     call.editor.Switch(number);
-    return Number(call);
+    return CurrentNumber(call);
   }
   call.editor.Open(Document(ReadInput(path)), path);
-  return Number(call);
+  return CurrentNumber(call);
 } catch (const UsageError& error) {
   call.Fail(0, std::string("a file that can be read (") + error.what() + ")");
 }
@@ -65,7 +63,7 @@ const std::vector<MacroFunction> kFunctions = {
      "opens an empty document and makes it the current one; its number",
      [](MacroCall& call) {
        call.editor.Open(Document(""), {});
-       return Number(call);
+       return CurrentNumber(call);
      }},
     {"open_document",
      {{"path", Kind::kName}},
@@ -89,14 +87,12 @@ const std::vector<MacroFunction> kFunctions = {
      {},
      kNumber,
      "the number of the current document",
-     [](MacroCall& call) { return Number(call); }},
+     [](MacroCall& call) { return CurrentNumber(call); }},
     {"document_count",
      {},
      kNumber,
      "the number of documents",
-     [](MacroCall& call) -> MacroResult {
-       return static_cast<std::int32_t>(call.editor.DocumentCount());
-     }},
+     [](MacroCall& call) { return Answer(call.editor.DocumentCount()); }},
     {"document_name",
      {kOptionalDocument},
      ResultKind::kText,

@@ -120,7 +120,7 @@ MacroResult ReplaceAll(MacroCall& call, bool plain) {
          match && match->To() <= end; match = search.Next(match->To(), true))
       replacements.push_back({search.RangeOf(*match), NewText(call, search, *match, plain)});
     document.Replace(replacements);
-    return static_cast<std::int32_t>(replacements.size());
+    return Answer(replacements.size());
   });
 }
 

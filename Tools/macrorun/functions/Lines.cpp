@@ -83,7 +83,7 @@ MacroResult SortLines(MacroCall& call) {
   call.document().ReorderLines(first, std::move(order));
   for (auto line = repeated.rbegin(); line != repeated.rend(); ++line)
     call.document().ReplaceLines(*line, 1, {});
-  return static_cast<std::int32_t>(count - repeated.size());
+  return Answer(count - repeated.size());
 }
 
 constexpr ResultKind kNone = ResultKind::kNone, kNumber = ResultKind::kNumber;
@@ -97,9 +97,7 @@ const std::vector<MacroFunction> kFunctions = {
      {},
      kNumber,
      "the number of lines",
-     [](MacroCall& call) -> MacroResult {
-       return static_cast<std::int32_t>(call.document().LineCount());
-     }},
+     [](MacroCall& call) { return Answer(call.document().LineCount()); }},
     {"get_line",
      {kLine},
      ResultKind::kText,
@@ -109,10 +107,7 @@ const std::vector<MacroFunction> kFunctions = {
      {kLine},
      kNumber,
      "the number of a line's characters",
-     [](MacroCall& call) -> MacroResult {
-       const std::string& text = call.document().Line(call.Number(0));
-       return static_cast<std::int32_t>(CharacterCount(text));
-     }},
+     [](MacroCall& call) { return Answer(CharacterCount(call.document().Line(call.Number(0)))); }},
     {"set_line",
      {kLine, kLineText},
      kNone,

@@ -8,8 +8,6 @@ namespace {
 
 using Kind = ParameterKind;
 
-std::int32_t Signed(std::size_t number) { return static_cast<std::int32_t>(number); }
-
 MacroResult Select(MacroCall& call, Range range) {
   call.document().Select(range);
   return 0;
@@ -75,13 +73,13 @@ const std::vector<MacroFunction> kFunctions = {
      {},
      kNumber,
      "the line in which the selection begins",
-     [](MacroCall& call) -> MacroResult { return Signed(call.document().Selection().from.line); }},
+     [](MacroCall& call) { return Answer(call.document().Selection().from.line); }},
     {"selection_column",
      {},
      kNumber,
      "the column at which the selection begins",
-     [](MacroCall& call) -> MacroResult {
-       return Signed(ColumnOf(call.document(), call.document().Selection().from));
+     [](MacroCall& call) {
+       return Answer(ColumnOf(call.document(), call.document().Selection().from));
      }},
     {"replace_selection",
      {{"text", Kind::kText}},

@@ -77,9 +77,7 @@ const std::vector<MacroFunction> kFunctions = {
      {},
      kNumber,
      "the number of characters; a line end is one",
-     [](MacroCall& call) -> MacroResult {
-       return static_cast<std::int32_t>(CharacterCount(call.document().Flat().text));
-     }},
+     [](MacroCall& call) { return Answer(CharacterCount(call.document().Flat().text)); }},
 };
 
 }  // namespace
