@@ -2,7 +2,7 @@
 # SPDX-License-Identifier: MIT
 # The whole length of what ctest does for seconds, and prints its figures:
 #
-#   scripts/torture.sh [memory | values | files | hosts | faults | soak | fuzz | undefined | tidy]...
+#   scripts/torture.sh [memory | values | files | hosts | faults | soak | recordings | fuzz | undefined | tidy]...
 #
 # Without arguments all of them, which takes about an hour on an idle machine. The figures go to
 # Docs/reliability.md as well, each under the command that made it. SCRIPTRUBY_TORTURE_SEED repeats a
@@ -14,7 +14,7 @@ source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 PACKAGES+=(clang-tidy-19)
 REPORT=$ROOT/Docs/reliability.md
-ALL=(memory values files hosts faults soak fuzz undefined tidy)
+ALL=(memory values files hosts faults soak recordings fuzz undefined tidy)
 failed=0
 
 # Puts the standard input in place of the section's block of figures.
@@ -88,6 +88,10 @@ run() {
   hosts) long_test hosts 'RandomHost*' ;;
   faults) long_test faults 'FaultMix*' ;;
   soak) long_test soak '*Soak*' ;;
+  recordings)
+    record recordings "SCRIPTRUBY_TEST_RECORDINGS=10000 wine build/release/bin/recording_tests.exe" \
+      env SCRIPTRUBY_TEST_RECORDINGS=10000 timeout 3600 wine build/release/bin/recording_tests.exe
+    ;;
   fuzz) record fuzz "FUZZ_SECONDS=${FUZZ_SECONDS:-60} scripts/torture.sh fuzz" fuzz ;;
   undefined)
     record undefined "SCRIPTRUBY_TEST_DLL=build/release/bin/trapping/scriptruby.dll \
@@ -101,6 +105,6 @@ wine build/release/bin/module_tests.exe" undefined
 for section; do
   [[ " ${ALL[*]} " == *" $section "* ]] || STATUS=2 die "no such section: $section (there are: ${ALL[*]})"
 done
-prepare torture_tests module_tests scriptruby_trapping core_native
+prepare torture_tests recording_tests module_tests scriptruby_trapping core_native
 for section; do run "$section"; done
 exit $failed

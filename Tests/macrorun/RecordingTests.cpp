@@ -245,8 +245,8 @@ TEST_P(RecordingTest, MacroDoesWhatWasRecorded) {
     steps += recording.steps.size();
     calls += recording.calls;
   }
-  std::printf("%u recordings from seed %u: %zu steps, %zu of them calls\n", count, first, steps,
-              calls);
+  std::printf("figure: %s: %u recordings from seed %u, %zu steps, %zu of them calls\n",
+              language.c_str(), count, first, steps, calls);
   EXPECT_GT(calls, count);
 }
 
