@@ -6,7 +6,7 @@
 # The command line
 printf 'text\n' > input.txt
 echo 'tarn.line_count();' > macro.js
-touch macro.xyz
+touch macro.xyz macro.rb
 expect 0 'set_line(line, text)' --functions
 expect 0 '--in-place' --help
 [ "$(wc -l < out)" -le 50 ] && ! grep -q '.\{81\}' out || fail '--help does not fit a screen'
@@ -16,13 +16,23 @@ expect 2 'MACRO is required'
 expect 2 '--bogus' --bogus macro.js
 expect 2 'usage: macrorun' --bogus macro.js
 expect 2 'expected NAME=VALUE' --arg name macro.js
-expect 2 '--repeat' --repeat 0 macro.js
-expect 2 '--timeout' --timeout never macro.js
+expect 2 '--repeat: expected a whole number from 1 on, got "0"' --repeat 0 macro.js
+for time in 2s -1 0 nan; do
+  expect 2 "--timeout: expected a number of seconds above 0, as in 2 or 0.5, got \"$time\"" \
+    --timeout "$time" macro.js
+done
 expect 2 '--errors' --errors xml macro.js
 expect 2 'needs a FILE' --in-place macro.js
 expect 2 'standard input' --in-place macro.js -
 expect 2 '--output' -o out.txt --in-place macro.js input.txt
 expect 2 '--output' -o out.txt macro.js --each input.txt
+expect 2 'not expected: third (several files stand behind --each)' macro.js input.txt third
+expect 2 'not expected: --third' macro.js input.txt --third
+! grep -q 'several files' err || fail '--each is hinted at for an option'
+expect 2 'FILE: expected a name, got an empty one' macro.js ''
+expect 2 '--output: expected a name, got an empty one' macro.js input.txt -o ''
+expect 2 '--stubs and --check are two things to do' --check macro.js --stubs
+expect 2 '--check: reports only' --check macro.js -o out.txt
 expect 2 'name all macros behind it' macro.js --check macro.js
 expect 2 '18 characters' --engine A.Name.Of.Nineteen. macro.js
 expect 2 'macro missing.js' missing.js
@@ -31,6 +41,7 @@ expect 2 'missing.dll' --module missing.dll macro.js
 expect 2 'input.txt' --module input.txt macro.js
 expect 2 'missing.qwsh' --description missing.qwsh macro.js
 expect 2 'xyz.qwsh' macro.xyz
+expect 2 'macro.rb: the names of Ruby macros end in .rbs' macro.rb
 
 # How a macro ends
 expect_js 0 'text' 'tarn.message("done");'

@@ -50,6 +50,10 @@ Language ChooseLanguage(const Options& options, const fs::path& macro) {
   if (IsRuby(macro)) return {{}, "RubyScript"};
   const fs::path file = DescriptionFor(macro);
   if (HasLanguage(macro)) return Described(file);
+  if (_wcsicmp(macro.extension().c_str(), L".rb") == 0)
+    throw UsageError(ToUtf8(macro) +
+                     ": the names of Ruby macros end in .rbs; rename it, or name the "
+                     "engine with --engine RubyScript");
   throw UsageError("no language description for " + ToUtf8(macro) + " (" + ToUtf8(file) +
                    "); name the engine with --engine, or a description with --description");
 }

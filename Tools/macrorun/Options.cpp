@@ -55,6 +55,24 @@ struct Texts {
   std::vector<std::string> each, check, arguments;
 };
 
+// The library's own check tells the range of a text that is no number at all, and lets NaN pass.
+template <class Number>
+CLI::Validator Between(Number least, Number most, const std::string& expected) {
+  const auto check = [=](const std::string& text) -> std::string {
+    Number number{};
+    if (CLI::detail::lexical_cast(text, number) && number >= least && number <= most) return {};
+    return "expected " + expected + ", got \"" + text + "\"";
+  };
+  return CLI::Validator(check, "");
+}
+
+// As an unset variable of a shell makes it; elsewhere an empty path stands for none.
+const CLI::Validator kNotEmpty(
+    [](const std::string& text) {
+      return std::string(text.empty() ? "expected a name, got an empty one" : "");
+    },
+    "");
+
 // In the order that CLI::App::parse wants: the last argument first, without the program.
 std::vector<std::string> ReversedArguments() {
   std::vector<std::string> arguments;
@@ -78,14 +96,16 @@ std::vector<std::filesystem::path> Paths(const std::vector<std::string>& texts) 
 
 void AddTextOptions(CLI::App& app, Options& options, Texts& texts) {
   app.add_option("MACRO", texts.macro);
-  CLI::Option* const file = app.add_option("FILE", texts.input);
+  CLI::Option* const file = app.add_option("FILE", texts.input)->check(kNotEmpty);
   CLI::Option* const each = app.add_option("--each", texts.each, "Work on each of these files")
                                 ->type_name("FILE...")
                                 ->expected(1, 1 << 20)
+                                ->check(kNotEmpty)
                                 ->excludes(file)
                                 ->group("Text");
   CLI::Option* const output = app.add_option("-o,--output", texts.output, "Write the text to FILE")
                                   ->type_name("FILE")
+                                  ->check(kNotEmpty)
                                   ->excludes(each)
                                   ->group("Text");
   app.add_flag("-i,--in-place", options.inPlace, "Replace the file, in one step at the end")
@@ -102,9 +122,9 @@ void AddMacroOptions(CLI::App& app, Options& options, Texts& texts) {
   add("--answer", options.answers, "TEXT", "Answer to its next prompt; may be repeated")
       ->allow_extra_args(false);
   add("--repeat", options.repeat, "N", "Run it N times over the same text")
-      ->check(CLI::Range(1u, 1000000000u).description(""));
+      ->check(Between(1u, 1000000000u, "a whole number from 1 on"));
   add("--timeout", options.timeout, "SECONDS", "Stop it; prompts do not count")
-      ->check(CLI::Range(0.001, 1e9).description(""));
+      ->check(Between(0.001, 1e9, "a number of seconds above 0, as in 2 or 0.5"));
   app.add_flag("--keep-going", options.keepGoing, "Do not stop it for a wrong call")
       ->group("Macro");
   add("--engine", options.engine, "PROGID", "Script engine (default: by the extension)");
@@ -184,20 +204,50 @@ void Convert(const Texts& texts, Options& options) {
   ReadArguments(texts.arguments, options);
 }
 
+// What there is to do instead of running a macro; nothing for running.
+std::string Mode(const Options& options) {
+  const std::pair<const char*, bool> modes[] = {{"--test", !options.test.empty()},
+                                                {"--record", !options.record.empty()},
+                                                {"--functions", !options.functions.empty()},
+                                                {"--stubs", options.stubs},
+                                                {"--version", options.version},
+                                                {"--check", !options.check.empty()}};
+  std::string mode;
+  for (const auto& [name, given] : modes) {
+    if (given && !mode.empty())
+      throw CLI::ParseError(mode + " and " + name + " are two things to do", kWrongUsage);
+    if (given) mode = name;
+  }
+  return mode;
+}
+
 // What the library's own rules do not say.
 void CheckCombination(const Options& options) {
-  const bool records = !options.record.empty();
-  const bool runs = options.check.empty() && options.test.empty() && !records &&
-                    options.functions.empty() && !options.stubs && !options.version;
-  if (runs && options.macro.empty()) throw CLI::RequiredError("MACRO");
-  if (records && !(options.macro.empty() && options.inputs.empty() && options.check.empty()))
-    throw CLI::ValidationError("--record", "takes no macro and no text; -o names the new macro");
-  if (!options.check.empty() && !options.macro.empty())
-    throw CLI::ValidationError("--check", "name all macros behind it");
+  const std::string mode = Mode(options);
+  const bool records = mode == "--record";
+  if (mode.empty() && options.macro.empty()) throw CLI::RequiredError("MACRO");
+  if (records && !(options.macro.empty() && options.inputs.empty()))
+    throw CLI::ValidationError(mode, "takes no macro and no text; -o names the new macro");
+  if (mode == "--check" && !options.macro.empty())
+    throw CLI::ValidationError(mode, "name all macros behind it");
+  if (mode == "--check" && !(options.inputs.empty() && options.output.empty()))
+    throw CLI::ValidationError(mode, "reports only: it takes no text and no -o");
   if (!options.inPlace) return;
   if (options.inputs.empty()) throw CLI::ValidationError("--in-place", "needs a FILE to replace");
   for (const std::filesystem::path& input : options.inputs)
     if (input == "-") throw CLI::ValidationError("--in-place", "cannot replace standard input");
+}
+
+// What may have been meant by arguments that have no place.
+std::string HintAt(const std::vector<std::string>& rest, const Texts& texts) {
+  const bool files = !texts.input.empty() && !rest.empty() && !rest.front().starts_with('-');
+  return files ? " (several files stand behind --each)" : "";
+}
+
+int Refuse(const std::string& text) {
+  std::fprintf(stderr, "macrorun: %s\n%smacrorun --help lists the options.\n", text.c_str(),
+               kUsage);
+  return kWrongUsage;
 }
 
 }  // namespace
@@ -229,10 +279,10 @@ std::optional<int> ParseOptions(Options& options) {
     CheckCombination(options);
   } catch (const CLI::Success& request) {
     return app.exit(request);
+  } catch (const CLI::ExtrasError& error) {
+    return Refuse(error.what() + HintAt(app.remaining(), texts));
   } catch (const CLI::ParseError& error) {
-    std::fprintf(stderr, "macrorun: %s\n%smacrorun --help lists the options.\n", error.what(),
-                 kUsage);
-    return kWrongUsage;
+    return Refuse(error.what());
   }
   return std::nullopt;
 }
