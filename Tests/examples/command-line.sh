@@ -93,6 +93,17 @@ cmp input.txt out || fail 'a flag of the description changes the text'
 printf '%01023d\n%0511d' 1 2 > input.txt
 expect_same 'tarn.get_line(1); tarn.set_line(2, tarn.get_line(2));'
 
+# Standard input that is named, and that was forgotten
+echo 'tarn.line_count();' > macro.js
+for case in 'macro.js - < input.txt' 'macro.js < /dev/null' 'macro.js input.txt < input.txt'; do
+  source=$case
+  eval "expect 0 '' $case"
+  [ ! -s err ] || fail "$case: $(cat err)"
+done
+forgotten='macrorun: standard input was not read; to work on it name - behind the macro'
+expect 0 "$forgotten" macro.js < input.txt
+cat input.txt | { sleep 0.1; expect 0 "$forgotten" macro.js; finish; } || fail 'a pipe'
+
 # To Ruby a text is bytes: every line passes there and back, unless it is too long or has a zero byte
 copy_lines='1.upto(@tarn.line_count) { |line| @tarn.set_line(line, @tarn.get_line(line)) }'
 i=1

@@ -78,8 +78,15 @@ grep -qx 'a line of the module' module.log || fail '--log: the module has not fo
 # Messages, arguments, answers and macros in macros
 echo '@tarn.write(@tarn.argument("name") + @tarn.argument("other", "-") + @tarn.prompt("?") + @tarn.prompt("?"))' > ask.rbs
 expect 0 'a=b-12' ask.rbs --arg name=a=b --answer 1 --answer 2
-expect 1 'prompt: ' ask.rbs --arg name=x --answer 1 < /dev/null
-expect 1 'argument: argument 1' ask.rbs
+! grep -q asked err || fail "an argument was read: $(cat err)"
+expect 1 'prompt: expected an answer, but there is none (--answer' ask.rbs --arg name=x --answer 1 < /dev/null
+expect 1 'argument: argument 1' ask.rbs --arg nmae=x
+! grep -q asked err || fail "a macro that failed may have been about to ask: $(cat err)"
+expect 0 'macrorun: --arg nmae: the macro has not asked for it' ask.rbs --arg name=x --arg nmae=x --answer 1 --answer 2
+echo '@tarn.write(@tarn.prompt("?", "d") + @tarn.prompt("?", ""))' > ask.rbs
+expect 0 'd' ask.rbs < /dev/null
+[ ! -s err ] || fail "defaults of prompts: $(cat err)"
+printf 'd' | cmp - out || fail "defaults of prompts: $(cat out)"
 mkdir inner
 echo '@tarn.write("<"); ok = @tarn.run_macro("inner/one.rbs"); @tarn.write(ok.to_s + ">")' > outer.rbs
 echo '@tarn.write("1"); raise "inside" if @tarn.run_macro("two.rbs") == 0; @tarn.write("3")' > inner/one.rbs
@@ -92,6 +99,15 @@ grep -q '^inner.two.rbs:1: goto_line' err && grep -q '^inner/one.rbs:1:.*inside'
 echo '@tarn.run_macro("inner/none.rbs"); @tarn.run_macro("self.rbs")' > self.rbs
 expect 0 'there is no macro' self.rbs
 grep -q 'more than 16 deep' err || fail "endless macros: $(cat err)"
+
+# A macro that the module would read as nonsense
+printf '\377\376x' > wide.rbs
+echo '@tarn.run_macro("wide.rbs")' > outer.rbs
+for source in wide.rbs '--check wide.rbs' '--test .'; do
+  # shellcheck disable=SC2086
+  expect 2 'wide.rbs: it is saved as UTF-16; save it as UTF-8' $source
+done
+expect 0 'wide.rbs: it is saved as UTF-16' outer.rbs
 
 # --check: every file, and nothing runs
 echo '@tarn.message("has run"); at_exit { puts "has run" }; BEGIN { @tarn.message("has run") }' > good.rbs

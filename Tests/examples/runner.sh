@@ -2,6 +2,7 @@
 # Sourced by the tests of macrorun, which are called with MACRORUN and FAKE_MODULE: a folder of their
 # own, and what they expect. The last line of each is `finish`.
 . "$(dirname "$0")/wine.sh"
+exec < /dev/null
 macrorun=$1
 fake=$2
 folder=$(mktemp -d)

@@ -15,11 +15,11 @@
 struct FakeServices : EditorServices {
   void Message(const std::string& text) override { messages += text + "\n"; }
   std::optional<std::string> Prompt(const std::string& question,
-                                    const std::string& proposal) override {
-    if (question == "nobody?") return {};
-    return question + "=" + proposal;
+                                    const std::optional<std::string>& proposal) override {
+    if (question == "nobody?") return proposal;
+    return question + "=" + proposal.value_or("");
   }
-  std::optional<std::string> MacroArgument(const std::string& name) const override {
+  std::optional<std::string> MacroArgument(const std::string& name) override {
     const auto argument = arguments.find(name);
     if (argument == arguments.end()) return {};
     return argument->second;

@@ -317,7 +317,7 @@ TEST(FunctionTest, WrongCallsChangeNothingAndSayWhatIsRight) {
       {{"set_mark", {""}}, 1, "a text that is not empty"},
       {{"write", {std::string(512, 'x')}}, 1, "may have been cut"},
       {{"write", {std::string(511, 'x') + "yä"}}, 1, "cut"},
-      {{"prompt", {"nobody?"}}, 0, "prompt: expected an answer"},
+      {{"prompt", {"nobody?"}}, 0, "prompt: expected an answer, but there is none (--answer"},
       {{"argument", {"none"}}, 1, "an argument that the macro was given"},
   };
   for (const Row& row : rows) {

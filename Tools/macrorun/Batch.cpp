@@ -3,6 +3,7 @@
 
 #include <algorithm>
 
+#include "Console.h"
 #include "Encoding.h"
 #include "Files.h"
 #include "Language.h"
@@ -25,6 +26,8 @@ class Batch {
   ExitCode RunOne(const fs::path& input);
   ExitCode RunEach();
   void ShowProfile();
+  // What the user may have meant otherwise.
+  void ShowUnused(ExitCode outcome);
 
  private:
   void Write(const fs::path& input, const std::string& bytes);
@@ -92,15 +95,25 @@ void Batch::ShowProfile() {
   if (options.profile) reporter.Profile(profile.Table());
 }
 
+void Batch::ShowUnused(ExitCode outcome) {
+  if (options.inputs.empty() && InputIsLeft())
+    reporter.Note("standard input was not read; to work on it name - behind the macro");
+  if (outcome != kSuccess) return;  // before it could ask
+  for (const auto& [name, value] : options.arguments)
+    if (!surroundings.argumentsRead.contains(name))
+      reporter.Note("--arg " + name + ": the macro has not asked for it");
+}
+
 }  // namespace
 
 ExitCode RunBatch(const Options& options, Reporter& reporter) {
-  RequireReadable(options.macro, "macro");
+  RequireMacro(options.macro);
   if (!options.output.empty()) RequireReplaceable(options.output, false);
   Batch batch(options, reporter);
   const ExitCode code =
       options.each ? batch.RunEach()
                    : batch.RunOne(options.inputs.empty() ? fs::path() : options.inputs.front());
   batch.ShowProfile();
+  batch.ShowUnused(code);
   return code;
 }

@@ -58,6 +58,18 @@ bool IsTerminal(std::FILE* stream) {
   return GetConsoleMode(HandleOf(stream), &mode);
 }
 
+bool InputIsLeft() {
+  const HANDLE input = HandleOf(stdin);
+  DWORD waiting = 0;
+  if (GetFileType(input) == FILE_TYPE_PIPE)
+    return PeekNamedPipe(input, nullptr, 0, nullptr, &waiting, nullptr)
+               ? waiting > 0
+               : GetLastError() == ERROR_NOT_SUPPORTED;
+  LARGE_INTEGER size, place;
+  return GetFileType(input) == FILE_TYPE_DISK && GetFileSizeEx(input, &size) &&
+         SetFilePointerEx(input, {}, &place, FILE_CURRENT) && place.QuadPart < size.QuadPart;
+}
+
 void WriteError(std::string_view text, Colour colour) {
   if (IsTerminal(stderr)) {
     WriteTerminal(HandleOf(stderr), text, colour);

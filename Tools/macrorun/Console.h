@@ -21,6 +21,10 @@ void PrepareStandardError();
 
 bool IsTerminal(std::FILE* stream);
 
+// Whether standard input is a pipe or a file of which there is something left to read, at this moment.
+// Also a pipe that does not tell: Wine looks into none of Unix's.
+bool InputIsLeft();
+
 void WriteError(std::string_view text, Colour colour = Colour::kPlain);
 
 // A line that the user types, without its end; nothing at the end of the input.

@@ -15,11 +15,12 @@ class EditorServices {
 
   // Shows a line to the user.
   virtual void Message(const std::string& text) = 0;
-  // Asks the user; nothing when there is nobody to answer or the answer was refused.
+  // Asks the user; the proposal, if there is one, when there is nobody to ask. Nothing when there is no
+  // answer.
   virtual std::optional<std::string> Prompt(const std::string& question,
-                                            const std::string& proposal) = 0;
+                                            const std::optional<std::string>& proposal) = 0;
   // The value that the command line gives to a name; nothing without one.
-  virtual std::optional<std::string> MacroArgument(const std::string& name) const = 0;
+  virtual std::optional<std::string> MacroArgument(const std::string& name) = 0;
   // Runs another macro over the same documents, inside the present one; whether it succeeded. The
   // path counts from the folder of the running macro.
   virtual bool RunMacro(const std::filesystem::path& macro) = 0;

@@ -156,6 +156,15 @@ std::string ReadInput(const fs::path& path) {
 
 void RequireReadable(const fs::path& path, const char* what) { Open(path, what); }
 
+void RequireMacro(const fs::path& path) {
+  const File file = Open(path, "macro");
+  unsigned char mark[2] = {};
+  if (std::fread(mark, 1, 2, file.get()) != 2) return;
+  if ((mark[0] == 0xFF && mark[1] == 0xFE) || (mark[0] == 0xFE && mark[1] == 0xFF))
+    throw UsageError("cannot read the macro " + ToUtf8(path) +
+                     ": it is saved as UTF-16; save it as UTF-8");
+}
+
 void RequireReplaceable(const fs::path& path, bool mustExist) {
   const DWORD attributes = GetFileAttributesW(path.c_str());
   if (attributes == INVALID_FILE_ATTRIBUTES) {

@@ -20,6 +20,10 @@ std::string ReadInput(const std::filesystem::path& path);
 // Fails unless the file can be read. `what` says what it is for.
 void RequireReadable(const std::filesystem::path& path, const char* what);
 
+// Fails unless it is a macro that can be read, and that the module can: it takes each byte for a
+// character, which makes nonsense of UTF-16.
+void RequireMacro(const std::filesystem::path& path);
+
 // Fails unless ReplaceFileBytes could begin: an existing file has to be there (or may be, without
 // `mustExist`) and must not be write-protected.
 void RequireReplaceable(const std::filesystem::path& path, bool mustExist);

@@ -12,6 +12,7 @@
 
 #include "CallText.h"
 #include "Encoding.h"
+#include "Files.h"
 #include "HostLink.h"
 #include "MacroFunctions.h"
 #include "ModuleReports.h"
@@ -70,7 +71,8 @@ MacroRun::MacroRun(RunSurroundings& runSurroundings, Editor& runEditor)
       editor(runEditor),
       passage(runSurroundings.module.RunsRuby() ? TextPassage::kBytes : TextPassage::kCharacters),
       reports(runSurroundings.reporter, passage == TextPassage::kCharacters),
-      services(runSurroundings.options, runSurroundings.reporter, *this) {
+      services(runSurroundings.options, runSurroundings.reporter, *this,
+               runSurroundings.argumentsRead) {
   const HostCallbacks callbacks = {this, OnReport, OnTrace, OnFunctionId, OnCall};
   link.reset(CreateHostLink(&callbacks));
   if (!link) throw std::bad_alloc();
@@ -191,6 +193,7 @@ void MacroRun::SetResult(const MacroResult& result) {
 }  // namespace
 
 ExitCode RunMacro(RunSurroundings& surroundings, Editor& editor) {
+  RequireMacro(surroundings.options.macro);
   for (unsigned i = 0; i < surroundings.options.repeat; ++i)
     if (const ExitCode code = MacroRun(surroundings, editor).Run(); code != kSuccess) return code;
   return kSuccess;

@@ -2,11 +2,14 @@
 // One run of a macro over documents: this program's side of the host macro interface.
 //
 // Ownership: everything in the surroundings is the caller's. Errors: those of the macro go to the
-// reporter and into the exit code; UsageError for a macro that the module cannot name.
+// reporter and into the exit code; UsageError for a macro that cannot be read, or that the module
+// cannot name.
 // Threading: the thread that loaded the module.
 #pragma once
 
 #include <filesystem>
+#include <set>
+#include <string>
 
 #include "CallProfile.h"
 #include "Editor.h"
@@ -23,6 +26,7 @@ struct RunSurroundings {
   EngineWatch& engines;
   Reporter& reporter;
   CallProfile& profile;
+  std::set<std::string> argumentsRead = {};  // the names that macros have asked for
 };
 
 // Runs the options' macro, which changes the editor's documents, as often as they say and until a run

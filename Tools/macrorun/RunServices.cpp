@@ -5,6 +5,8 @@
 
 #include "Console.h"
 #include "Encoding.h"
+#include "ExitCode.h"
+#include "Files.h"
 #include "RunControl.h"
 
 namespace fs = std::filesystem;
@@ -14,13 +16,20 @@ namespace {
 // Far below what the stack holds.
 constexpr std::size_t kDeepest = 16;
 
+// Why a macro cannot be run; empty when it can.
+std::string Unreadable(const fs::path& macro) try {
+  RequireMacro(macro);
+  return {};
+} catch (const UsageError& error) {
+  return error.what();
+}
+
 }  // namespace
 
 std::optional<std::string> RunServices::Prompt(const std::string& question,
-                                               const std::string& proposal) {
+                                               const std::optional<std::string>& proposal) {
   if (answersTaken < options.answers.size()) return options.answers[answersTaken++];
-  if (!IsTerminal(stdin)) return {};
-  return AskUser(question, proposal);
+  return IsTerminal(stdin) ? AskUser(question, proposal.value_or("")) : proposal;
 }
 
 std::optional<std::string> RunServices::AskUser(const std::string& question,
@@ -34,7 +43,8 @@ std::optional<std::string> RunServices::AskUser(const std::string& question,
   return answer;
 }
 
-std::optional<std::string> RunServices::MacroArgument(const std::string& name) const {
+std::optional<std::string> RunServices::MacroArgument(const std::string& name) {
+  argumentsRead.insert(name);
   const auto argument = options.arguments.find(name);
   if (argument == options.arguments.end()) return {};
   return argument->second;
@@ -51,7 +61,8 @@ bool RunServices::RunMacro(const fs::path& macro) {
   else if (macros.size() >= kDeepest)
     report.message = "macros run each other more than " + std::to_string(kDeepest) + " deep";
   else
-    return nested.RunNested(file);
+    report.message = Unreadable(file);
+  if (report.message.empty()) return nested.RunNested(file);
   reporter.Error(std::move(report));
   return false;
 }

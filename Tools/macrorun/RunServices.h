@@ -5,6 +5,8 @@
 #pragma once
 
 #include <filesystem>
+#include <set>
+#include <string>
 #include <vector>
 
 #include "EditorServices.h"
@@ -22,8 +24,10 @@ class NestedRunner {
 
 class RunServices final : public EditorServices {
  public:
-  RunServices(const Options& runOptions, Reporter& runReporter, NestedRunner& runner)
-      : options(runOptions), reporter(runReporter), nested(runner) {}
+  // The names of arguments that macros ask for are added to the set.
+  RunServices(const Options& runOptions, Reporter& runReporter, NestedRunner& runner,
+              std::set<std::string>& namesRead)
+      : options(runOptions), reporter(runReporter), nested(runner), argumentsRead(namesRead) {}
 
   // Whose time stands still while the user is asked; before the first prompt.
   void SetControl(RunControl* runControl) { control = runControl; }
@@ -32,11 +36,11 @@ class RunServices final : public EditorServices {
   void LeaveMacro() { macros.pop_back(); }
 
   void Message(const std::string& text) override { reporter.Message(text); }
-  // The answers of the command line come first, then those of a user at a terminal. An empty line is
-  // the proposal.
+  // The answers of the command line come first, then those of a user at a terminal, whose empty line
+  // is the proposal, and elsewhere the proposal.
   std::optional<std::string> Prompt(const std::string& question,
-                                    const std::string& proposal) override;
-  std::optional<std::string> MacroArgument(const std::string& name) const override;
+                                    const std::optional<std::string>& proposal) override;
+  std::optional<std::string> MacroArgument(const std::string& name) override;
   bool RunMacro(const std::filesystem::path& macro) override;
 
  private:
@@ -45,6 +49,7 @@ class RunServices final : public EditorServices {
   const Options& options;
   Reporter& reporter;
   NestedRunner& nested;
+  std::set<std::string>& argumentsRead;
   RunControl* control = nullptr;
   std::vector<std::filesystem::path> macros;  // outermost first
   std::size_t answersTaken = 0;

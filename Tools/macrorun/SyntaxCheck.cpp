@@ -71,7 +71,7 @@ ExitCode Checker::Check(const fs::path& macro) try {
 }
 
 ExitCode Checker::Parse(const fs::path& macro, const std::string& engineName) {
-  RequireReadable(macro, "macro");
+  RequireMacro(macro);
   const std::wstring text = Widened(ReadInput(macro));
   CLSID classId;
   IActiveScript* created = nullptr;

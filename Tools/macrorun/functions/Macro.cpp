@@ -9,8 +9,10 @@ namespace {
 using Kind = ParameterKind;
 
 MacroResult Prompt(MacroCall& call) {
-  const std::optional<std::string> answer = call.services.Prompt(call.Text(0), call.Text(1));
-  if (!answer) call.Fail("an answer, but there is none");
+  std::optional<std::string> proposal;
+  if (call.Has(1)) proposal = call.Text(1);
+  const std::optional<std::string> answer = call.services.Prompt(call.Text(0), proposal);
+  if (!answer) call.Fail("an answer, but there is none (--answer gives one)");
   return *answer;
 }
 
@@ -33,9 +35,10 @@ const std::vector<MacroFunction> kFunctions = {
        return 0;
      }},
     {"prompt",
-     {{"question", Kind::kText}, {"default", Kind::kText, "an empty text"}},
+     {{"question", Kind::kText},
+      {"default", Kind::kText, "an empty text, and an answer is needed"}},
      kText,
-     "asks the user, for whom an empty line means the default; the answer",
+     "asks the user; an empty line, or nobody at a terminal, means the default; the answer",
      Prompt},
     {"argument",
      {{"name", Kind::kName}, {"default", Kind::kText, "the name must have a value"}},
