@@ -92,7 +92,7 @@ VALUE Interrupt(void*) {
       if (Interpreter::InterruptDue() == Interpreter::Urgency::kAfterGrace) WaitGrace(task);
       if (Interpreter::TaskNumber() != task) continue;  // the grace was another one's
       DeliverIfDue();
-      Wait(kGrace);
+      WaitGrace(task);
     }
   }
 }

@@ -109,6 +109,7 @@ namespace {
 struct Description {
   VALUE context;
   VALUE exception;
+  BSTR hostText;
   TextForm form;
   BSTR text;
   ULONG line;
@@ -125,8 +126,10 @@ BSTR TextOf(VALUE string, TextForm form) {
 
 VALUE MacroTask::DescribeBody(VALUE data) {
   Description& description = *reinterpret_cast<Description*>(data);
+  const VALUE hostText =
+      description.hostText ? StringOf(description.hostText, TextForm::kUtf16) : Qnil;
   const VALUE parts =
-      rb_funcall(description.context, rb_intern("describe"), 1, description.exception);
+      rb_funcall(description.context, rb_intern("describe"), 2, description.exception, hostText);
   description.line = NUM2ULONG(rb_ary_entry(parts, 1));
   description.column = NUM2LONG(rb_ary_entry(parts, 2));
   description.cookie = NUM2ULONG(rb_ary_entry(parts, 4));
@@ -136,8 +139,9 @@ VALUE MacroTask::DescribeBody(VALUE data) {
 }
 
 // Asks the exception, which may run the macro's own code: Ruby's exceptions have methods.
-void MacroTask::SetError(VALUE exception) {
-  Description description = {half.context, exception, half.form, nullptr, 0, 0, nullptr, 0};
+void MacroTask::SetError(VALUE exception, BSTR hostText) {
+  Description description = {half.context, exception, hostText, half.form, nullptr, 0, 0,
+                             nullptr,      0};
   VALUE ignored;
   if (Protect(DescribeBody, reinterpret_cast<VALUE>(&description), ignored) == Outcome::kLeft) {
     result = E_ABORT;
@@ -150,8 +154,17 @@ void MacroTask::SetError(VALUE exception) {
   result = error ? DISP_E_EXCEPTION : E_OUTOFMEMORY;
 }
 
+// The site is told of it like of an error if the host has a text for it and the macro was left by an
+// exception, which knows where.
+void MacroTask::TellInterruption(VALUE exception) {
+  const BSTR hostText = static_cast<BSTR>(
+      InterlockedExchangePointer(reinterpret_cast<void**>(&half.interruption), nullptr));
+  if (hostText && RTEST(rb_obj_is_kind_of(exception, StopClass()))) SetError(exception, hostText);
+  SysFreeString(hostText);
+}
+
 void MacroTask::Work() {
-  VALUE outcomeValue;
+  VALUE outcomeValue = Qnil;
   result = E_ABORT;
   Interpreter::SetInterruptible(true);
   if (!Interpreter::MustEnd()) {  // else it was interrupted before it began
@@ -165,6 +178,7 @@ void MacroTask::Work() {
   Interpreter::SetInterruptible(false);
   Interrupter::Settle();
   if (Interpreter::MustEnd()) result = E_ABORT;  // also of a macro that has come to its end
+  TellInterruption(outcomeValue);
 }
 
 void MacroTask::Run() {

@@ -27,8 +27,12 @@ struct NamedItem {
 
 // The Ruby half of an engine.
 struct RubyHalf {
+  ~RubyHalf() { SysFreeString(interruption); }
+
   unsigned long context = 0;  // a Ruby value, kept from collection; 0: none yet
   TextForm form = TextForm::kUtf16;
+  // Owned; what the host has said of an interruption, on any thread. Taken when the task has ended.
+  BSTR interruption = nullptr;
 };
 
 class MacroTask final : public RubyTask {
@@ -69,6 +73,8 @@ class MacroTask final : public RubyTask {
   unsigned long Compile();
   unsigned long CallFunction();
   void Work();
-  void SetError(unsigned long exception);
+  // `hostText` of an interruption, else null.
+  void SetError(unsigned long exception, BSTR hostText = nullptr);
+  void TellInterruption(unsigned long exception);
   void SetValue(unsigned long passable);
 };

@@ -445,9 +445,13 @@ HRESULT ScriptEngine::GetScriptThreadState(SCRIPTTHREADID id, SCRIPTTHREADSTATE*
   return S_OK;
 }
 
-HRESULT ScriptEngine::InterruptScriptThread(SCRIPTTHREADID id, const EXCEPINFO*, DWORD) {
+HRESULT ScriptEngine::InterruptScriptThread(SCRIPTTHREADID id, const EXCEPINFO* exception, DWORD) {
   if (state == SCRIPTSTATE_CLOSED) return E_UNEXPECTED;
   if (!IsEngineThread(id, thread)) return E_INVALIDARG;
+  if (exception && exception->bstrDescription && Interpreter::IsRunning(this))
+    SysFreeString(
+        static_cast<BSTR>(InterlockedExchangePointer(reinterpret_cast<void**>(&half->interruption),
+                                                     SysAllocString(exception->bstrDescription))));
   Interpreter::Interrupt(this);
   return S_OK;
 }

@@ -49,7 +49,8 @@ class ScriptEngine final : public IActiveScript, public IActiveScriptParse, publ
   STDMETHODIMP GetCurrentScriptThreadID(SCRIPTTHREADID* thread) override;
   STDMETHODIMP GetScriptThreadID(DWORD systemThread, SCRIPTTHREADID* thread) override;
   STDMETHODIMP GetScriptThreadState(SCRIPTTHREADID thread, SCRIPTTHREADSTATE* current) override;
-  STDMETHODIMP InterruptScriptThread(SCRIPTTHREADID thread, const EXCEPINFO*, DWORD) override;
+  STDMETHODIMP InterruptScriptThread(SCRIPTTHREADID thread, const EXCEPINFO* exception,
+                                     DWORD) override;
   STDMETHODIMP Clone(IActiveScript**) override { return E_NOTIMPL; }
 
   // IActiveScriptParse

@@ -148,6 +148,29 @@ TEST(Ending, Interrupts) {
   host.Close();
   EXPECT_EQ("item.f(I4 2); item.f(I4 3)", TakeLog());
 
+  // With a text of the host's the site is told of it, and where the macro was.
+  EXCEPINFO reason = {};
+  reason.bstrDescription = SysAllocString(L"g\u00e4hn");
+  std::thread other;
+  host.item.Does("go", [&] {
+    other = std::thread([&] {
+      Sleep(20);
+      host.script->InterruptScriptThread(SCRIPTTHREADID_BASE, &reason, 0);
+    });
+  });
+  TakeLog();
+  EXPECT_EQ("item.go(); error: g\u00e4hn", host.Run("def f\n  sleep\nend\n@item.go\nf"));
+  other.join();
+  EXPECT_EQ(1u, host.error.line);
+  EXPECT_EQ("gähn\n\tfrom macro:2:in `sleep'\n\tfrom macro:2:in `f'\n\tfrom macro:5:in `<main>'",
+            host.error.text);
+  // It is not kept for a later one.
+  host.Open();
+  host.script->InterruptScriptThread(SCRIPTTHREADID_BASE, &reason, 0);
+  host.Close();
+  SysFreeString(reason.bstrDescription);
+  EXPECT_EQ("item.self(); 80004004", host.Run("@item.self"));
+
   // Of two nested macros the outer one: the inner one runs to its end first.
   Host outer;
   outer.item.Does("nest", [&] {

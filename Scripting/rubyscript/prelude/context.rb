@@ -113,11 +113,11 @@ module ActiveScript
     end
 
     # What the host is told of an error: description, line and column from 0, the line's text, the
-    # cookie of its source.
-    def describe(error)
+    # cookie of its source. Of an interruption the text is the host's own.
+    def describe(error, host_text)
       name, line, column = syntax_position(error) || run_time_position(error)
       text = line_text(name, line)
-      [description(error), line ? line - 1 : 0, column_in(text, column), text.to_s,
+      [description(error, host_text), line ? line - 1 : 0, column_in(text, column), text.to_s,
        @sources[name]&.cookie.to_i]
     end
 
@@ -157,9 +157,9 @@ module ActiveScript
       @output.finish
       @error_output.finish
       return value if !error || (SystemExit === error && error.success?)
-      @outer_frames = outer_frames # for its description
       raise error
     ensure
+      @outer_frames = outer_frames # for the error's description
       @running = nested
     end
 
@@ -255,7 +255,7 @@ module ActiveScript
       own.positive? ? frames.first(own) : frames
     end
 
-    def description(error)
+    def description(error, host_text)
       message = message_of(error)
       message = error.class.name.to_s if message.empty?
       first, rest = message.split("\n", 2)
@@ -263,7 +263,7 @@ module ActiveScript
                                      .reject { |each| each.end_with?("in `method_missing'") }
                                      .map { |each| each.sub("<compiled>'", "<main>'") }
       text = SyntaxError === error ? message : ["#{first} (#{error.class})", rest].compact.join("\n")
-      [text, *frames.first(20).map { |frame| "\tfrom #{frame}" }].join("\n")
+      [host_text || text, *frames.first(20).map { |frame| "\tfrom #{frame}" }].join("\n")
     end
   end
 end

@@ -47,6 +47,12 @@ module ActiveScript
 
     def exit!(status = false) = ::Kernel.exit(status)
 
+    # The host is told the text with the error, which would come a second time.
+    def abort(*message)
+      return super unless message.size == 1 && HostOutput === $stderr
+      ::Kernel.raise ::SystemExit.new(false, ::String.new(*message))
+    end
+
     def exec(*)
       raise NotImplementedError, "exec would replace the host's process; use system or spawn"
     end
