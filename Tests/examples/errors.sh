@@ -17,11 +17,16 @@ expect_lines err 'macro.js:1:13: Syntax error' '  /* ä */ x = = 1;' '          
 expect_js 1 '' "$(printf 'var ok;\n  tarn.nothing();')"
 expect_lines err 'macro.js:2:3: nothing is no macro function (see --functions)' \
   '    tarn.nothing();' '    ^'
+expect_rbs 1 '' '@tarn.nothing'
+expect_lines err 'macro.rbs:1:6: nothing is no macro function (see --functions)' '  @tarn.nothing' '       ^'
+expect_rbs 1 '' "$(printf '@tarn.nothing rescue nil\nnil.foo')"
+expect_lines err "macro.rbs:2:4: undefined method \`foo' for nil:NilClass (NoMethodError)" \
+  '  nil.foo' '     ^'
 expect_js 1 '' 'tarn.goto_line(7);'
 expect_lines err 'macro.js: goto_line: argument 1 of (line): expected a line number from 1 to 2, got "7"'
 expect_rbs 1 '' "$(printf 'def f\n  @tarn.goto_line(7)\nend\n\nf')"
 expect_lines err 'macro.rbs:2: goto_line: argument 1 of (line): expected a line number from 1 to 2, got "7"' \
-  '    @tarn.goto_line(7)'
+  '    @tarn.goto_line(7)' "$(printf "\tfrom macro.rbs:2:in \`f'")" "$(printf "\tfrom macro.rbs:5:in \`<main>'")"
 
 # --keep-going: the call does nothing, the macro goes on, and has failed
 expect_js 1 'after' 'tarn.goto_line(7); tarn.message("after");' --keep-going
@@ -92,10 +97,12 @@ echo '@tarn.write("<"); ok = @tarn.run_macro("inner/one.rbs"); @tarn.write(ok.to
 echo '@tarn.write("1"); raise "inside" if @tarn.run_macro("two.rbs") == 0; @tarn.write("3")' > inner/one.rbs
 echo '@tarn.write("2")' > inner/two.rbs
 expect 0 '<1231>' outer.rbs
-echo '@tarn.goto_line(99)' > inner/two.rbs
+printf 'def f = @tarn.goto_line(99)\nf' > inner/two.rbs
 expect 0 '<10>' outer.rbs
 grep -q '^inner.two.rbs:1: goto_line' err && grep -q '^inner/one.rbs:1:.*inside' err ||
   fail "nested errors: $(cat err)"
+[ "$(grep -c "from inner.two.rbs:.:in" err)" -eq 2 ] && ! grep -q 'from.*outer' err ||
+  fail "the chain of a nested wrong call: $(cat err)"
 echo '@tarn.run_macro("inner/none.rbs"); @tarn.run_macro("self.rbs")' > self.rbs
 expect 0 'there is no macro' self.rbs
 grep -q 'more than 16 deep' err || fail "endless macros: $(cat err)"

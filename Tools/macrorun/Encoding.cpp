@@ -35,6 +35,16 @@ std::string ToUtf8(const std::filesystem::path& path) { return WideToUtf8(path.w
 
 std::string WideToUtf8(std::wstring_view text) { return Narrow(text, CP_UTF8); }
 
+std::string BytesOf(const wchar_t* text, std::size_t units) {
+  const std::wstring_view wide(text ? text : L"", units);
+  std::string bytes;
+  for (const wchar_t unit : wide) {
+    if (unit > 0xFF) return WideToUtf8(wide);
+    bytes += static_cast<char>(unit);
+  }
+  return bytes;
+}
+
 std::optional<std::filesystem::path> AnsiNamed(const std::filesystem::path& path) {
   if (Widen(ToAnsi(path), CP_ACP) == path.wstring()) return path;
   wchar_t shortName[MAX_PATH];

@@ -11,6 +11,10 @@ std::filesystem::path PathFromUtf8(std::string_view text);
 std::string ToUtf8(const std::filesystem::path& path);
 std::string WideToUtf8(std::wstring_view text);
 
+// A text of a script engine: of one byte a character, as the macro was given to it, or else UTF-16. Null
+// is an empty one.
+std::string BytesOf(const wchar_t* text, std::size_t units);
+
 // The file by a path that the ANSI code page can hold, as the module takes it: the path itself or,
 // when it has other characters, the short name. Empty when there is none. The file must exist.
 std::optional<std::filesystem::path> AnsiNamed(const std::filesystem::path& path);

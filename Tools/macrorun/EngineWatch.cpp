@@ -136,9 +136,12 @@ HRESULT EngineWatch::CreateFromManifest(IActiveScript** engine) {
 // Innermost first. Engines document this call for any thread.
 bool EngineWatch::Interrupt() {
   const std::lock_guard guard(lock);
+  EXCEPINFO reason = {};
+  reason.bstrDescription = SysAllocString(PathFromUtf8(kInterruption).c_str());
   bool any = false;
   for (auto engine = engines.rbegin(); engine != engines.rend(); ++engine)
-    any |= (*engine)->InterruptScriptThread(SCRIPTTHREADID_ALL, nullptr, 0) == S_OK;
+    any |= (*engine)->InterruptScriptThread(SCRIPTTHREADID_ALL, &reason, 0) == S_OK;
+  SysFreeString(reason.bstrDescription);
   return any;
 }
 
@@ -147,19 +150,20 @@ void EngineWatch::Going(WatchedEngine* engine) {
   std::erase(engines, engine);
 }
 
-// What runs is asked in its own language.
-int EngineWatch::CallingLine() {
+// What runs is asked in its own language. Behind the macro's top level come the macros that wait for it.
+std::string EngineWatch::CallChain() {
   constexpr wchar_t kInRuby[] =
-      L"caller_locations.find { |place| place.path == 'macro' }&.lineno.to_i";
-  if (engines.empty() || progId.find(L"RubyScript") == progId.npos) return 0;
-  VARIANT line;
-  VariantInit(&line);
+      L"caller.grep(/\\Amacro:/).grep_v(/in `method_missing'\\z/).slice_after(/in `<compiled>'\\z/)"
+      L".first.to_a.first(20).join(\"\\n\").gsub(\"<compiled>'\", \"<main>'\")";
+  if (engines.empty() || progId.find(L"RubyScript") == progId.npos) return {};
+  VARIANT chain;
+  VariantInit(&chain);
   const HRESULT result = engines.back()->ParseScriptText(kInRuby, nullptr, nullptr, nullptr, 0, 0,
-                                                         SCRIPTTEXT_ISEXPRESSION, &line, nullptr);
-  const bool told = SUCCEEDED(result) && line.vt == VT_I4;
-  const int number = told ? line.lVal : 0;
-  VariantClear(&line);
-  return number;
+                                                         SCRIPTTEXT_ISEXPRESSION, &chain, nullptr);
+  const bool told = SUCCEEDED(result) && chain.vt == VT_BSTR;
+  const std::string text = told ? BytesOf(chain.bstrVal, SysStringLen(chain.bstrVal)) : "";
+  VariantClear(&chain);
+  return text;
 }
 
 void EngineWatch::Abandon() {

@@ -25,6 +25,9 @@
 
 #include "WatchedEngine.h"
 
+// By which the report of an interruption is recognised.
+inline constexpr char kInterruption[] = "macrorun interrupts the macro";
+
 class EngineWatch final : public WatchedEngine::Owner {
  public:
   // From here to the destructor the calling thread finds the engine. Nothing happens when there is
@@ -34,15 +37,16 @@ class EngineWatch final : public WatchedEngine::Owner {
   EngineWatch(const EngineWatch&) = delete;
   EngineWatch& operator=(const EngineWatch&) = delete;
 
-  // Asks all engines to end what they run; whether one of them can.
+  // Asks all engines to end what they run; whether one of them can. An engine that knows where that was
+  // tells its site of an error with the text kInterruption.
   bool Interrupt();
   void Abandon();
 
   void Going(WatchedEngine* engine) override;
 
-  // The line of the innermost macro that makes the present call, from 1; 0 when its engine cannot
-  // tell. Only within a call.
-  int CallingLine();
+  // The calls inside the innermost macro that led to the present one, "macro:3:in `f'" a line, innermost
+  // first; empty when its engine cannot tell. Only within a call.
+  std::string CallChain();
 
   // For the class object: makes an engine.
   HRESULT Create(REFIID riid, void** object);

@@ -54,6 +54,11 @@ bool IsUnderline(std::string_view line) {
   return line.find_first_not_of(" \t^~") == line.npos;  // an empty one, too
 }
 
+// A chain that is the place of the error itself, once more.
+void ForgetOwnPlace(ErrorReport& error) {
+  if (error.details.size() == 1 && error.details[0].ends_with("in `<main>'")) error.details.clear();
+}
+
 std::string LineOf(const std::string& file, int line) {
   std::ifstream stream(PathFromUtf8(file), std::ios::binary);
   std::string text;
@@ -103,8 +108,20 @@ void SetDescription(ErrorReport& error, std::string_view description) {
       error.details.push_back(text);
     first = false;
   }
-  // The place of the error itself, once more.
-  if (error.details.size() == 1 && error.details[0].ends_with("in `<main>'")) error.details.clear();
+  ForgetOwnPlace(error);
+}
+
+void SetCallChain(ErrorReport& error, std::string_view chain) {
+  while (!chain.empty()) {
+    const std::size_t end = std::min(chain.find('\n'), chain.size());
+    const std::string_view line = chain.substr(0, end);
+    chain.remove_prefix(std::min(end + 1, chain.size()));
+    const std::size_t place = std::min(line.find(':'), line.size());
+    if (error.details.empty())
+      error.line = std::max(Number(line.substr(std::min(place + 1, line.size()))), 0);
+    error.details.push_back("\tfrom " + error.file + std::string(line.substr(place)));
+  }
+  ForgetOwnPlace(error);
 }
 
 void CompleteSource(ErrorReport& error) {

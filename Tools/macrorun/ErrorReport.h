@@ -14,7 +14,7 @@
 #include <vector>
 
 struct ErrorReport {
-  std::string kind;  // "script", "call", "engine", "fault"
+  std::string kind;  // as the user's guide lists them
   std::string file;
   int line = 0;
   int column = 0;
@@ -39,6 +39,10 @@ std::optional<ErrorReport> ParseScriptError(std::string_view report, const Macro
 // An engine's description of an error becomes message and details: what repeats the place or the
 // source line is left out, and `file` stands for the name that the engine has for a macro.
 void SetDescription(ErrorReport& error, std::string_view description);
+
+// What an engine tells of the calls that led to a place, "macro:3:in `f'" a line, innermost first, becomes
+// line and details of an error whose file is known.
+void SetCallChain(ErrorReport& error, std::string_view chain);
 
 // The line's text from the macro file, where the engine has told none, and the column in characters.
 void CompleteSource(ErrorReport& error);

@@ -72,6 +72,7 @@ void HostLink::CallFunction(u32 id) {
     if (goOn && !record.stopRequested) return;
   }
   stopCause = record.stopRequested ? kStoppedByUser : kStoppedByCall;
+  if (record.stopRequested) callbacks.stopping(callbacks.context);
   if (record.engine) record.engine->Stop();
 }
 

@@ -20,6 +20,7 @@ struct HostCallbacks {
   void (*trace)(void* context, const char* text);           // a debug line, with its line end
   uint32_t (*functionId)(void* context, const char* name);  // kUnknownId: no such function
   bool (*call)(void* context, uint32_t id);                 // false: the macro is to be stopped
+  void (*stopping)(void* context);                          // as `kill` has asked, at a call
 };
 
 // What `functionId` answers for an unknown name.

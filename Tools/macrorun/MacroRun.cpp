@@ -44,10 +44,12 @@ class MacroRun final : public NestedRunner {
     return From(context).FunctionId(name);
   }
   static bool OnCall(void* context, std::uint32_t id) { return From(context).Call(id); }
+  static void OnStopping(void* context) { From(context).Stopping(); }
 
   void TraceLine(std::string_view text) noexcept;
   std::uint32_t FunctionId(const char* name) noexcept;
   bool Call(std::uint32_t id) noexcept;
+  void Stopping() noexcept;
   MacroResult Perform(std::uint32_t id, const std::string& name, const Arguments& arguments);
   bool WrongCallMade(const std::string& name, const WrongCall& wrong);
   void SetResult(const MacroResult& result);
@@ -73,7 +75,7 @@ MacroRun::MacroRun(RunSurroundings& runSurroundings, Editor& runEditor)
       reports(runSurroundings.reporter, passage == TextPassage::kCharacters),
       services(runSurroundings.options, runSurroundings.reporter, *this,
                runSurroundings.argumentsRead) {
-  const HostCallbacks callbacks = {this, OnReport, OnTrace, OnFunctionId, OnCall};
+  const HostCallbacks callbacks = {this, OnReport, OnTrace, OnFunctionId, OnCall, OnStopping};
   link.reset(CreateHostLink(&callbacks));
   if (!link) throw std::bad_alloc();
 }
@@ -96,7 +98,11 @@ ExitCode MacroRun::Outcome(bool succeeded) {
   if (reports.Faulted()) return kFault;
   // A request that came too late for a macro that has ended does not count.
   if (cause != RunControl::Cause::kNone && !succeeded) {
-    surroundings.reporter.Note(cause == RunControl::Cause::kUser ? "stopped" : "timed out");
+    ErrorReport report = reports.Stop();
+    report.kind = "stop";
+    report.message = cause == RunControl::Cause::kUser ? "stopped" : "timed out";
+    if (report.file.empty()) report.file = ToUtf8(surroundings.options.macro);
+    surroundings.reporter.Error(std::move(report));
     return kStopped;
   }
   return succeeded ? kSuccess : kMacroFailed;
@@ -152,6 +158,13 @@ bool MacroRun::Call(std::uint32_t id) noexcept try {
   return false;
 }
 
+void MacroRun::Stopping() noexcept {
+  ErrorReport place;
+  place.file = reports.File();
+  SetCallChain(place, surroundings.engines.CallChain());
+  reports.AddStop(std::move(place));
+}
+
 MacroResult MacroRun::Perform(std::uint32_t id, const std::string& name,
                               const Arguments& arguments) {
   const bool trace = surroundings.options.trace;
@@ -177,7 +190,8 @@ bool MacroRun::WrongCallMade(const std::string& name, const WrongCall& wrong) {
   report.argument = static_cast<int>(wrong.argument);
   report.expected = wrong.expected;
   report.message = wrong.what();
-  report.line = surroundings.engines.CallingLine();
+  report.file = reports.File();
+  SetCallChain(report, surroundings.engines.CallChain());
   reports.Add(std::move(report));
   return surroundings.options.keepGoing;
 }

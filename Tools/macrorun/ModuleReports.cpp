@@ -3,6 +3,7 @@
 
 #include <utility>
 
+#include "EngineWatch.h"
 #include "xLib/xTexts.h"
 
 namespace {
@@ -23,7 +24,11 @@ void ModuleReports::Take(std::string_view report) noexcept {
     faulted = true;
     Add(Plain("fault", report));
   } else if (std::optional<ErrorReport> error = ParseScriptError(report, runs.back().macro)) {
-    TakeScriptError(std::move(*error));
+    error->columnInBytes = columnsInBytes;
+    if (error->message == kInterruption)
+      AddStop(std::move(*error));
+    else
+      TakeScriptError(std::move(*error));
   } else if (report.starts_with(kUnknownFunction)) {
     runs.back().unknownFunction = report.substr(kUnknownFunction.size());
   } else if (IsFollowUp(report)) {
@@ -35,17 +40,15 @@ void ModuleReports::Take(std::string_view report) noexcept {
 
 void ModuleReports::TakeScriptError(ErrorReport error) {
   Run& run = runs.back();
-  if (!run.unknownFunction.empty()) {
-    error.function = run.unknownFunction;
-    const std::string text = run.unknownFunction + " is no macro function (see --functions)";
-    if (error.message.empty())
-      error.message = text;
-    else
-      error.details.insert(error.details.begin(), text);
-    run.unknownFunction.clear();
+  // A macro may have caught the error of the unknown name, and this is another one.
+  const std::string& unknown = run.unknownFunction;
+  const bool names = error.message.empty() || error.message.find(unknown) != std::string::npos;
+  if (!unknown.empty() && names) {
+    error.function = unknown;
+    error.message = unknown + " is no macro function (see --functions)";
   }
+  run.unknownFunction.clear();
   if (error.message.empty()) error.message = "script error";
-  error.columnInBytes = columnsInBytes;
   run.errorSeen = true;
   reporter.Error(std::move(error));
 }
@@ -55,6 +58,10 @@ void ModuleReports::Add(ErrorReport error) {
   if (error.file.empty()) error.file = run.macro.shown;
   run.errorSeen = true;
   reporter.Error(std::move(error));
+}
+
+void ModuleReports::AddStop(ErrorReport place) {
+  if (stop.file.empty()) stop = std::move(place);
 }
 
 void ModuleReports::EndRun(bool stopped) {

@@ -35,9 +35,15 @@ class ModuleReports {
   // The first two inside a scope.
   void Take(std::string_view report) noexcept;
   void Add(ErrorReport error);  // one that does not come from the module
+  // Where a macro was stopped; the first place counts.
+  void AddStop(ErrorReport place);
+  // For the outcome: with the macro's name alone where the place is not known.
+  ErrorReport Stop() const { return stop; }
   // What was held back comes out, unless the run was stopped and so had to fail.
   void EndRun(bool stopped);
   bool ErrorSeen() const { return runs.back().errorSeen; }
+  // Of the present run, for the user.
+  const std::string& File() const { return runs.back().macro.shown; }
   // In any run.
   bool Faulted() const { return faulted; }
 
@@ -55,5 +61,6 @@ class ModuleReports {
   Reporter& reporter;
   const bool columnsInBytes;
   std::vector<Run> runs;
+  ErrorReport stop;
   bool faulted = false;
 };

@@ -7,17 +7,6 @@
 
 namespace {
 
-// A text of the engine's: of one byte a character, as the macro was given to it, or else UTF-16.
-std::string BytesOf(BSTR text) {
-  const std::wstring_view wide(text ? text : L"", SysStringLen(text));
-  std::string bytes;
-  for (const wchar_t unit : wide) {
-    if (unit > 0xFF) return WideToUtf8(wide);
-    bytes += static_cast<char>(unit);
-  }
-  return bytes;
-}
-
 void FreeTexts(EXCEPINFO& exception) {
   SysFreeString(exception.bstrSource);
   SysFreeString(exception.bstrDescription);
@@ -48,12 +37,13 @@ HRESULT ParseSite::OnScriptError(IActiveScriptError* scriptError) {
   }
   BSTR source = nullptr;
   scriptError->GetSourceLineText(&source);
-  error->source = BytesOf(source);
+  error->source = BytesOf(source, SysStringLen(source));
   SysFreeString(source);
   error->columnInBytes = columnsInBytes;
   EXCEPINFO exception = {};
   scriptError->GetExceptionInfo(&exception);
-  SetDescription(*error, BytesOf(exception.bstrDescription));
+  SetDescription(*error,
+                 BytesOf(exception.bstrDescription, SysStringLen(exception.bstrDescription)));
   if (error->message.empty()) error->message = "syntax error";
   FreeTexts(exception);
   return S_OK;
