@@ -17,6 +17,7 @@ module ActiveScript
 
     attr_reader :byte_host # whether texts go to it as bytes
     attr_reader :fiber     # the one that the macro was started in
+    attr_reader :compiling # a text, when the items may be still to come
 
     def initialize(byte_host)
       @byte_host = byte_host
@@ -39,15 +40,17 @@ module ActiveScript
     # The first item that has a function `message`; nil without one. An 8-bit host tells its user of
     # names it does not know, so it is asked once in the process.
     def messenger
-      return @messenger if defined?(@messenger) || !ActiveScript.can_call?
+      return @messenger if defined?(@messenger) || !ActiveScript.can_call? || @items.empty?
       @messenger = @items.values.find { |item| item.respond_to?(:message) } unless byte_host && Context.mute_host
       Context.mute_host = true if byte_host && !@messenger
       @messenger
     end
 
     # For the next run. Persistent code also runs in the context's successor. The cookie is the host's
-    # own name for the text.
+    # own name for the text. Its warnings wait for the run, and without one for the end; they are dropped
+    # beside a syntax error.
     def compile(source, first_line, cookie, persistent)
+      @compiling = true
       name = @sources.empty? ? "macro" : "macro#{@sources.size + 1}"
       source = source.b.delete_prefix("\xEF\xBB\xBF".b).force_encoding(Encoding::UTF_8)
       @sources[name] = Source.new(source.b.split(/\r?\n/n), first_line, cookie)
@@ -57,8 +60,12 @@ module ActiveScript
       @queue.push(code)
       @persistent.push(code) if persistent
       nil
+    rescue SyntaxError
+      @error_output.drop
+      raise
     ensure
       RubyVM.keep_script_lines = false
+      @compiling = false
     end
 
     # What a thread of the macro's raises here waits until it is done.
@@ -75,6 +82,7 @@ module ActiveScript
     def run
       codes, @queue = @queue, []
       Object.const_set(:DATA, StringIO.new(@data)) if @data && !Object.const_defined?(:DATA)
+      @error_output.pass_on
       value = nil
       work { codes.each { |code| value = code.eval } }
       value
@@ -85,6 +93,7 @@ module ActiveScript
     # Files that the macro has left open would stay locked. Closing the pipe of a process would wait
     # for its end.
     def close
+      @error_output.finish
       @left_open.each { |file| quietly { file.close unless file.closed? || file.pid } }
     end
 

@@ -22,7 +22,7 @@ module ActiveScript
       texts.map!(&:to_s)
       texts.each { |text| @pending << as_utf8(text).b }
       # A stopped macro's last words have nowhere to go; a thread's wait for the main thread.
-      pass_on if ActiveScript.can_call?
+      pass_on if ActiveScript.can_call? && !@context.compiling
       texts.sum(&:bytesize)
     end
 
@@ -46,6 +46,18 @@ module ActiveScript
       pass_on
     end
 
+    def drop = @pending.clear
+
+    # What can be passed on by now.
+    def pass_on
+      return if @pending.empty?
+      messenger = @context.messenger
+      length = messenger ? (@pending.rindex("\n") || -1) + 1 : @pending.bytesize
+      return if length.zero?
+      text = @pending.slice!(0, length)
+      messenger ? show(messenger, text.chomp) : write_through(text)
+    end
+
     private
 
     PLAIN = [Encoding::UTF_8, Encoding::US_ASCII, Encoding::BINARY].freeze
@@ -54,15 +66,6 @@ module ActiveScript
     def as_utf8(text)
       return text if PLAIN.include?(text.encoding) || (ActiveScript.can_call? && !@context.messenger)
       text.encode(Encoding::UTF_8, invalid: :replace, undef: :replace)
-    end
-
-    def pass_on
-      return if @pending.empty?
-      messenger = @context.messenger
-      length = messenger ? (@pending.rindex("\n") || -1) + 1 : @pending.bytesize
-      return if length.zero?
-      text = @pending.slice!(0, length)
-      messenger ? show(messenger, text.chomp) : write_through(text)
     end
 
     def show(messenger, text)
