@@ -125,6 +125,16 @@ expect 0 '' --check good.rbs good.rbs
 [ ! -s out ] && [ ! -s err ] || fail "--check: $(cat out err)"
 expect 1 'bad.rbs:2:5: syntax error' --check good.rbs bad.rbs bad.js bad.vbs good.rbs
 grep -q '^bad.js:2:' err && grep -q '^bad.vbs:' err && ! grep -q 'has run' err || fail "--check: $(cat err)"
+printf 'y = "ä"\nx = { a: 1, a: 2 }\nz = 1 if y = 1\n' > warns.rbs
+for form in text json; do
+  expect 1 'warns.rbs:2: warning: key :a is duplicated' --errors=$form --check warns.rbs bad.rbs
+  grep -q 'warns.rbs:3: warning: ' err && grep -q 'bad.rbs' err && ! grep -q 'macro:' err || fail "--check: $(cat err)"
+done
+! grep -qv '^{' err || fail "--check: no object: $(cat err)"
+echo 'puts "said"' >> warns.rbs
+echo '@tarn.run_macro("warns.rbs"); puts "after"' > outer.rbs
+expect 0 'warns.rbs:2: warning: key :a is duplicated' outer.rbs --errors=json
+[ ! -s out ] && ! grep -qv '^{' err && ! grep -q 'macro:' err && grep -q said err && grep -q after err || fail "a warning: $(cat out err)"
 expect 2 'missing.rbs' --check missing.rbs bad.rbs
 grep -q '^bad.rbs:2:5:' err || fail '--check stops at a missing file'
 

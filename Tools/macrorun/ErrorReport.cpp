@@ -54,6 +54,14 @@ bool IsUnderline(std::string_view line) {
   return line.find_first_not_of(" \t^~") == line.npos;  // an empty one, too
 }
 
+// "macro:3: warning: text"
+bool IsWarning(std::string_view line) {
+  const std::size_t digits = kRubyName.size() + 1;
+  if (!line.starts_with(kRubyName) || line.substr(0, digits).back() != ':') return false;
+  const std::size_t end = line.find_first_not_of("0123456789", digits);
+  return end != line.npos && line.substr(end).starts_with(": warning: ");
+}
+
 // A chain that is the place of the error itself, once more.
 void ForgetOwnPlace(ErrorReport& error) {
   if (error.details.size() == 1 && error.details[0].ends_with("in `<main>'")) error.details.clear();
@@ -122,6 +130,20 @@ void SetCallChain(ErrorReport& error, std::string_view chain) {
     error.details.push_back("\tfrom " + error.file + std::string(line.substr(place)));
   }
   ForgetOwnPlace(error);
+}
+
+std::string WithFile(std::string_view text, const std::string& file) {
+  std::string result;
+  while (!text.empty()) {
+    const std::string_view line = text.substr(0, text.find('\n'));
+    result +=
+        IsWarning(line) ? file + std::string(line.substr(kRubyName.size())) : std::string(line);
+    text.remove_prefix(line.size());
+    if (text.empty()) break;
+    result += '\n';
+    text.remove_prefix(1);
+  }
+  return result;
 }
 
 void CompleteSource(ErrorReport& error) {

@@ -44,6 +44,10 @@ void SetDescription(ErrorReport& error, std::string_view description);
 // line and details of an error whose file is known.
 void SetCallChain(ErrorReport& error, std::string_view chain);
 
+// In warnings of the Ruby engine, a line each, the macro's file in place of the engine's name for it; other
+// lines as they are.
+std::string WithFile(std::string_view text, const std::string& file);
+
 // The line's text from the macro file, where the engine has told none, and the column in characters.
 void CompleteSource(ErrorReport& error);
 

@@ -26,6 +26,10 @@ std::string Unreadable(const fs::path& macro) try {
 
 }  // namespace
 
+void RunServices::Message(const std::string& text) {
+  reporter.Message(WithFile(text, ToUtf8(macros.back())));
+}
+
 std::optional<std::string> RunServices::Prompt(const std::string& question,
                                                const std::optional<std::string>& proposal) {
   if (answersTaken < options.answers.size()) return options.answers[answersTaken++];

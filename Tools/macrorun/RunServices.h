@@ -35,7 +35,8 @@ class RunServices final : public EditorServices {
   void EnterMacro(const std::filesystem::path& macro) { macros.push_back(macro); }
   void LeaveMacro() { macros.pop_back(); }
 
-  void Message(const std::string& text) override { reporter.Message(text); }
+  // Also what a script engine itself says by it.
+  void Message(const std::string& text) override;
   // The answers of the command line come first, then those of a user at a terminal, whose empty line
   // is the proposal, and elsewhere the proposal.
   std::optional<std::string> Prompt(const std::string& question,

@@ -8,7 +8,9 @@
 #include <cwchar>
 #include <map>
 #include <memory>
+#include <sstream>
 
+#include "Console.h"
 #include "Encoding.h"
 #include "EngineWatch.h"
 #include "Files.h"
@@ -49,6 +51,7 @@ class Checker {
 
  private:
   ExitCode Parse(const fs::path& macro, const std::string& engineName);
+  void Tell(const std::string& warnings, const fs::path& macro);
   HRESULT ParseWith(IActiveScript* engine, ParseSite& site, const std::wstring& text);
 
   const Options& options;
@@ -84,13 +87,22 @@ ExitCode Checker::Parse(const fs::path& macro, const std::string& engineName) {
                      SystemMessage(static_cast<unsigned long>(result)));
   const Held<IActiveScript> engine(created);
   ParseSite site(ToUtf8(macro), !engineName.ends_with("RubyScript"));
+  ErrorCapture warnings;
   result = ParseWith(engine.get(), site, text);
   engine->Close();
+  Tell(warnings.Take(), macro);
   if (std::optional<ErrorReport> error = site.TakeError())
     reporter.Error(std::move(*error));
   else if (FAILED(result))
     reporter.Error(Plain(macro, "engine", SystemMessage(static_cast<unsigned long>(result))));
   return FAILED(result) ? kMacroFailed : kSuccess;
+}
+
+// An engine that parses only has nobody but the process to tell.
+void Checker::Tell(const std::string& warnings, const fs::path& macro) {
+  std::istringstream lines(warnings);
+  for (std::string line; std::getline(lines, line);)
+    reporter.Message(WithFile(line.substr(0, line.find('\r')), ToUtf8(macro)));
 }
 
 HRESULT Checker::ParseWith(IActiveScript* engine, ParseSite& site, const std::wstring& text) {
