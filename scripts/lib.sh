@@ -29,18 +29,33 @@ die() {
   exit "${STATUS:-1}"
 }
 
+# In the background: shows each half minute how far a step has come, until it is killed or the command
+# that it belongs to is gone.
+show_progress() {
+  trap 'kill $!; exit' TERM
+  SECONDS=0 # of this shell's own
+  while sleep 30 & wait $! && kill -0 $$ 2>/dev/null; do
+    say "   after $((SECONDS / 60)) min $((SECONDS % 60)) s: $(tail -n 1 "$1" | cut -c -80)"
+  done
+}
+
 # step NAME COMMAND...: runs the command with its output in a log, and shows the log's end when it
 # fails. The command is a condition here, so `set -e` is off inside: functions chain with &&.
 step() {
-  local name=$1 log
+  local name=$1 log progress
   shift
   mkdir -p "$LOGS"
   log=$LOGS/${name// /-}.log
   say "-- $name"
+  show_progress "$log" 9>&- &
+  progress=$!
   if ! "$@" >"$log" 2>&1 </dev/null 9>&-; then # no daemon keeps the lock
+    kill $progress
     tail -n 40 "$log" >&2
     die "$name failed (whole output: $log)"
   fi
+  kill $progress
+  wait $progress || true
 }
 
 missing_packages() {
