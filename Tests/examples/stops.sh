@@ -71,6 +71,11 @@ if command -v script > /dev/null; then
   echo 'tarn.message("answer: " + tarn.prompt("who?"));' > macro.js
   { sleep 2; printf 'Bob\r'; sleep 1; } | timeout 20 script -qec "wine '$macrorun' --timeout 1 macro.js" terminal > /dev/null 2>&1
   grep -q 'answer: Bob' terminal || fail "a prompt: $(cat -v terminal)"
+  begin=$(now)
+  { sleep 2; printf '\003'; sleep 2; } | timeout 20 script -qec "wine '$macrorun' macro.js" terminal > /dev/null 2>&1
+  result=$?
+  [ $result -eq 3 ] && [ $(($(now) - begin)) -lt 8000 ] && grep -q stopped terminal && ! grep -q expected terminal ||
+    fail "Ctrl+C at a prompt: $result, $(cat -v terminal)"
 fi
 
 finish

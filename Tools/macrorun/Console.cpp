@@ -6,6 +6,11 @@
 #include <windows.h>
 
 #include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <memory>
+#include <thread>
+#include <utility>
 
 #include "Encoding.h"
 
@@ -47,6 +52,22 @@ void WriteTerminal(HANDLE terminal, std::string_view text, Colour colour) {
     if (!WriteConsoleW(terminal, wide.data() + from, length, &written, nullptr) || !written) break;
   }
   if (coloured) SetConsoleTextAttribute(terminal, before.wAttributes);
+}
+
+using Line = std::optional<std::string>;
+
+Line ReadLine() {
+  std::wstring line;
+  wchar_t block[256];
+  DWORD count = 0;
+  while (ReadConsoleW(HandleOf(stdin), block, 256, &count, nullptr) && count > 0) {
+    line.append(block, count);
+    if (line.back() != L'\n') continue;
+    line.erase(line.find_last_not_of(L"\r\n") + 1);
+    if (!line.empty() && line.front() == L'\x1A') return {};  // Ctrl+Z
+    return WideToUtf8(line);
+  }
+  return {};
 }
 
 }  // namespace
@@ -102,16 +123,21 @@ void WriteError(std::string_view text, Colour colour) {
   std::fflush(stderr);
 }
 
-std::optional<std::string> ReadTerminalLine() {
-  std::wstring line;
-  wchar_t block[256];
-  DWORD count = 0;
-  while (ReadConsoleW(HandleOf(stdin), block, 256, &count, nullptr) && count > 0) {
-    line.append(block, count);
-    if (line.back() != L'\n') continue;
-    line.erase(line.find_last_not_of(L"\r\n") + 1);
-    if (!line.empty() && line.front() == L'\x1A') return {};  // Ctrl+Z
-    return WideToUtf8(line);
+// By a thread of its own, since no call ends a read of the terminal everywhere: Ctrl+C does on Windows,
+// but not under Wine.
+std::optional<std::string> ReadTerminalLine(const std::function<bool()>& isGivenUp) {
+  struct Reading {
+    Line line;
+    std::atomic<bool> done = false;
+  };
+  const auto reading = std::make_shared<Reading>();  // with the thread it may outlive the call
+  std::thread([reading] {
+    reading->line = ReadLine();
+    reading->done = true;
+  }).detach();
+  while (!reading->done) {
+    if (isGivenUp()) return {};
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
   }
-  return {};
+  return reading->line;
 }

@@ -10,6 +10,7 @@
 #pragma once
 
 #include <cstdio>
+#include <functional>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -44,5 +45,6 @@ class ErrorCapture {
 
 void WriteError(std::string_view text, Colour colour = Colour::kPlain);
 
-// A line that the user types, without its end; nothing at the end of the input.
-std::optional<std::string> ReadTerminalLine();
+// A line that the user types, without its end; nothing at the end of the input, and when `isGivenUp`, which
+// is asked again and again, says so. Then the terminal's next line is lost: the program is to end.
+std::optional<std::string> ReadTerminalLine(const std::function<bool()>& isGivenUp);

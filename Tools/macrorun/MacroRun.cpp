@@ -184,6 +184,10 @@ MacroResult MacroRun::Perform(std::uint32_t id, const std::string& name,
 
 // Whether the macro goes on.
 bool MacroRun::WrongCallMade(const std::string& name, const WrongCall& wrong) {
+  if (control->StopCause() != RunControl::Cause::kNone) {  // as of a prompt without its answer
+    Stopping();
+    return false;
+  }
   ErrorReport report;
   report.kind = "call";
   report.function = wrong.function.empty() ? name : wrong.function;

@@ -41,7 +41,8 @@ std::optional<std::string> RunServices::AskUser(const std::string& question,
   reporter.EndProgress();
   WriteError(question + (proposal.empty() ? " " : " [" + proposal + "] "), Colour::kHighlight);
   control->Pause();
-  std::optional<std::string> answer = ReadTerminalLine();
+  std::optional<std::string> answer =
+      ReadTerminalLine([this] { return control->StopCause() != RunControl::Cause::kNone; });
   control->Resume();
   if (answer && answer->empty()) answer = proposal;
   return answer;
