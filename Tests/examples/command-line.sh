@@ -129,6 +129,11 @@ macrorun='Ordner ä 日本/macrorun.exe'
 expect 1 "Error creating 'RubyScript'" macro.rbs
 cp -r "$(dirname "$in_build_folder")/ruby" 'Ordner ä 日本/'
 expect 0 'found May' macro.rbs
+# A user's description is neither read nor written
+printf '[Options]\r\nLanguage=No.Engine\r\n' | tee description > 'Ordner ä 日本/xMacroWSH.qwsh'
+expect 0 'found May' macro.rbs
+cmp description 'Ordner ä 日本/xMacroWSH.qwsh' || fail "the user's description has changed"
+expect 1 "Error creating 'No.Engine'" macro.rbs --description description
 mv "$macrorun" 'Ordner ä 日本/other.exe'
 macrorun='Ordner ä 日本/other.exe'
 expect 0 'found May' macro.rbs

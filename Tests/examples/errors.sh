@@ -79,6 +79,11 @@ awk 'NR == 2 { ok = $1 == "run_macro" && $2 == 1 && $3 >= 1000 && $4 + 0 > 5 }
   fail "--profile: $(cat err)"
 expect 4 '' --log module.log --module "$fake" macro.rbs
 grep -qx 'a line of the module' module.log || fail '--log: the module has not found it'
+long=$(printf '%0120d' 0)
+mkdir -p "$long/$long"
+expect 2 '--log nowhere/x: its folder does not exist' --log nowhere/x macro.rbs
+expect 2 "/x: the module takes 255 characters at most" --log "$long/$long/x" macro.rbs
+expect 2 '--log 日本.log: the system' --log 日本.log macro.rbs
 
 # Messages, arguments, answers and macros in macros
 echo '@tarn.write(@tarn.argument("name") + @tarn.argument("other", "-") + @tarn.prompt("?") + @tarn.prompt("?"))' > ask.rbs

@@ -1,7 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # reference.sh MACRORUN FAKE_MODULE: the list of the macro functions, Docs/functions.md and the stubs for
-# completion say the same.
+# completion say the same; so do --help and the table of options.
 page=$(cd "$(dirname "$0")/../../Docs" && pwd)/functions.md
 . "$(dirname "$0")/runner.sh"
 
@@ -43,5 +43,17 @@ sed -n 's/^  \([a-z_]*([^)]*)\).*/\1/p' list | LC_ALL=C sort > calls
 grep -q '^  sort_lines.* (options: descending, ignore_case, unique)$' list || fail 'the list has no options'
 grep -qx '  # @param count \[Integer, nil\] 0 or more; left out: all that follow' tarn.rb || fail 'a stub does not tell what holds without an argument'
 grep -qx '@tarn ||= Tarn.new' tarn.rb || fail 'the stubs have no @tarn'
+
+# Each option stands in the guide's table, with a test that uses it
+guide=$(dirname "$page")/macrorun.md
+expect 0 '' --help
+for option in $(sed -n 's/^  \(-.,\)\?\(--[a-z-]*\).*/\2/p' out); do
+  row=$(grep -- "^| \(\`-.\`, \)\?\`$option[\` ]" "$guide") || fail "$option is not in the table"
+  short=$(printf %.2s "${option#-}")
+  for test in $(printf '%s' "$row" | sed 's/.*| \(.*\) |$/\1/; s/[`,]//g'); do
+    grep -q -- "$option\b\| $short " "$(dirname "$0")/$test.sh" || fail "$option: the test $test does not use it"
+  done
+done
+[ "$(grep -c '^| `-' "$guide")" -eq "$(grep -c '^  -' out)" ] || fail 'the table has options that there are not'
 
 finish

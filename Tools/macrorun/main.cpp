@@ -15,6 +15,7 @@
 
 #include "Batch.h"
 #include "Console.h"
+#include "Encoding.h"
 #include "ExitCode.h"
 #include "Files.h"
 #include "FunctionReference.h"
@@ -61,11 +62,22 @@ ExitCode WriteRecorded(const Options& options) {
   return Write(options, MacroComposer(TemplatesOf(module, language)).Compose(steps));
 }
 
-// The module reads it when it is loaded.
+// The module reads it when it is loaded, in the system's code page, and passes over what it cannot use.
 void SetLog(const std::filesystem::path& file) {
+  constexpr std::size_t kLongest = 255;
   if (file.empty()) return;
-  const std::wstring path = std::filesystem::absolute(file).wstring();
-  _wputenv_s(L"SCRIPTRUBY_LOG", path.c_str());
+  const std::filesystem::path path = std::filesystem::absolute(file);
+  const std::string refused = "--log " + ToUtf8(file) + ": ";
+  std::error_code error;
+  if (!std::filesystem::is_directory(path.parent_path(), error))
+    throw UsageError(refused + "its folder does not exist");
+  RequireReplaceable(path, false);
+  const std::optional<std::filesystem::path> named = AnsiNamed(path);
+  if (!named) throw UsageError(refused + "the system's code page cannot name it");
+  if (ToAnsi(*named).size() > kLongest)
+    throw UsageError(refused + "the module takes " + std::to_string(kLongest) +
+                     " characters at most, with all folders");
+  _wputenv_s(L"SCRIPTRUBY_LOG", named->c_str());
 }
 
 ExitCode Perform(const Options& options, Reporter& reporter) {
