@@ -129,6 +129,8 @@ macrorun='Ordner ä 日本/macrorun.exe'
 expect 1 "Error creating 'RubyScript'" macro.rbs
 cp -r "$(dirname "$in_build_folder")/ruby" 'Ordner ä 日本/'
 expect 0 'found May' macro.rbs
+cp macro.rbs MACRO.RBS
+expect 0 'found May' MACRO.RBS
 # A user's description is neither read nor written
 printf '[Options]\r\nLanguage=No.Engine\r\n' | tee description > 'Ordner ä 日本/xMacroWSH.qwsh'
 expect 0 'found May' macro.rbs

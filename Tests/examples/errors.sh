@@ -66,6 +66,8 @@ if command -v script > /dev/null; then
   grep -q 'Syntax error' terminal && grep -q "$colour" terminal || fail "no colour: $(cat -v terminal)"
   NO_COLOR=1 timeout 20 script -qec "wine '$macrorun' macro.js" terminal > /dev/null 2>&1
   grep -q 'Syntax error' terminal && ! grep -q "$colour" terminal || fail 'colour despite NO_COLOR'
+  NO_COLOR= timeout 20 script -qec "wine '$macrorun' macro.js" terminal > /dev/null 2>&1
+  grep -q "$colour" terminal || fail 'no colour with an empty NO_COLOR'
 fi
 
 # --trace, --profile, --log
@@ -93,6 +95,7 @@ expect 1 'prompt: expected an answer, but there is none (--answer' ask.rbs --arg
 expect 1 'argument: argument 1' ask.rbs --arg nmae=x
 ! grep -q asked err || fail "a macro that failed may have been about to ask: $(cat err)"
 expect 0 'macrorun: --arg nmae: the macro has not asked for it' ask.rbs --arg name=x --arg nmae=x --answer 1 --answer 2
+expect 0 'a12a12' ask.rbs --arg name=a --arg other= --answer 1 --answer 2 --repeat 2
 echo '@tarn.write(@tarn.prompt("?", "d") + @tarn.prompt("?", ""))' > ask.rbs
 expect 0 'd' ask.rbs < /dev/null
 [ ! -s err ] || fail "defaults of prompts: $(cat err)"

@@ -24,6 +24,9 @@ replaced '--in-place'
 cp original input.txt
 expect 0 '' macro.rbs input.txt --repeat 3
 printf 'old+++\r\nno end' | cmp - out || fail '--repeat'
+echo '@tarn.message("run"); @tarn.write("+"); raise "no" if @tarn.cursor_column == 3' > fails.rbs
+expect 1 'no (RuntimeError)' fails.rbs input.txt --repeat 4
+[ "$(grep -c '^run$' err)" -eq 2 ] || fail "--repeat goes on after a failure: $(cat err)"
 
 # Each of several files
 mkdir each
