@@ -95,12 +95,13 @@ expect_same 'tarn.get_line(1); tarn.set_line(2, tarn.get_line(2));'
 
 # Standard input that is named, and that was forgotten
 echo 'tarn.line_count();' > macro.js
-for case in 'macro.js - < input.txt' 'macro.js < /dev/null' 'macro.js input.txt < input.txt'; do
+echo '$stdin.read' > reads.rbs
+for case in 'macro.js - < input.txt' 'reads.rbs < input.txt' 'macro.js < /dev/null' 'macro.js input.txt < input.txt'; do
   source=$case
   eval "expect 0 '' $case"
   [ ! -s err ] || fail "$case: $(cat err)"
 done
-forgotten='macrorun: standard input was not read; to work on it name - behind the macro'
+forgotten='macrorun: the macro began with an empty text; for the one of standard input name - behind it'
 expect 0 "$forgotten" macro.js < input.txt
 cat input.txt | { sleep 0.1; expect 0 "$forgotten" macro.js; finish; } || fail 'a pipe'
 

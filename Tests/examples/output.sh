@@ -21,6 +21,12 @@ cmp changed new.txt || fail 'a file that was there'
 expect 0 '' --in-place macro.rbs input.txt
 replaced '--in-place'
 [ ! -s out ] || fail '--in-place prints'
+# The new file has the old one's attributes, where the file system keeps any
+wine attrib +h input.txt > attributes 2>&1
+wine attrib input.txt > attributes 2>&1
+expect 0 '' -i macro.rbs input.txt
+wine attrib input.txt > attributes.now 2>&1
+diff attributes attributes.now || fail 'attributes'
 cp original input.txt
 expect 0 '' macro.rbs input.txt --repeat 3
 printf 'old+++\r\nno end' | cmp - out || fail '--repeat'

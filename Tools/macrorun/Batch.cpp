@@ -97,7 +97,8 @@ void Batch::ShowProfile() {
 
 void Batch::ShowUnused(ExitCode outcome) {
   if (options.inputs.empty() && InputIsLeft())
-    reporter.Note("standard input was not read; to work on it name - behind the macro");
+    reporter.Note(
+        "the macro began with an empty text; for the one of standard input name - behind it");
   if (outcome != kSuccess) return;  // before it could ask
   for (const auto& [name, value] : options.arguments)
     if (!surroundings.argumentsRead.contains(name))
