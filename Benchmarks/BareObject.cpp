@@ -137,11 +137,14 @@ HRESULT BareObject::Invoke(DISPID id, REFIID, LCID, WORD, DISPPARAMS* parameters
       result->vt = VT_BSTR;
       result->bstrVal = SysAllocString(L"text");
       return S_OK;
-    case kClassId:
+    case kClassId: {
       if (!result) return S_OK;
+      wchar_t text[39];
+      StringFromGUID2(kClass, text, 39);
       result->vt = VT_BSTR;
-      result->bstrVal = SysAllocString(L"{7D4F1B1A-93C6-4E57-A10B-5E0D2F64389C}");
+      result->bstrVal = SysAllocString(text);
       return S_OK;
+    }
     case kTake: {
       if (parameters->cArgs != 3) return DISP_E_BADPARAMCOUNT;
       const VARIANT* const last = parameters->rgvarg;

@@ -9,7 +9,7 @@
 
 namespace {
 
-std::string RatioText(double ratio) {
+std::string Times(double ratio) {
   char text[32];
   std::snprintf(text, sizeof text, "%.2fx", ratio);
   return text;
@@ -68,21 +68,21 @@ double Comparison::PeerTime() const {
   return Median(Values([](const Round& round) { return round.peer; }));
 }
 
-double Comparison::Ratio() const { return Median(Ratios()); }
+std::string Comparison::RatioText() const { return Spread(Ratios(), Times); }
 
 bool Comparison::IsMet() const {
-  return !goal || (measure == Measure::kRatio ? Ratio() : Median(Differences())) <= *goal;
+  return !goal || Median(measure == Measure::kRatio ? Ratios() : Differences()) <= *goal;
 }
 
 std::string Comparison::GoalText() const {
   if (!goal) return "";
-  if (measure == Measure::kRatio) return RatioText(*goal);
+  if (measure == Measure::kRatio) return Times(*goal);
   return TimeText(*goal) + " more; is " + Spread(Differences(), TimeText);
 }
 
 std::string Comparison::Row() const {
   return "| " + name + " | " + TimeText(Time()) + " | " + TimeText(PeerTime()) + " | " +
-         Spread(Ratios(), RatioText) + " | " + GoalText() + " | " +
+         RatioText() + " | " + GoalText() + " | " +
          (!goal     ? ""
           : IsMet() ? "met"
                     : "**missed**") +

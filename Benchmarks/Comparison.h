@@ -55,9 +55,8 @@ class Comparison {
 
   double Time() const;
   double PeerTime() const;
-  double Ratio() const;
-  bool HasGoal() const { return goal.has_value(); }
-  bool IsMet() const;  // true without a goal
+  std::string RatioText() const;  // the rounds' median ratio, with the least and the greatest
+  bool IsMet() const;             // true without a goal
 
   // The row of a table in Markdown under kHead. At least one round is needed.
   std::string Row() const;

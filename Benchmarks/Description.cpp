@@ -5,11 +5,14 @@
 
 #include <string>
 
-bool ReadDescription(const std::filesystem::path& file) {
+#include "Comparison.h"
+
+double TimeReads(const std::filesystem::path& file) {
   static constexpr const char* kTexts[] = {
       "Language",        "Extension", "MacroBegin", "MacroEnd", "FunctionPrint", "FunctionPrefix",
       "FunctionPostfix", "Enter",     "CRLF",       "LineFeed", "Tick",          "Quote"};
   const std::string name = file.string();
+  const double start = Now();
   char text[512];
   DWORD language = 0;
   for (const char* key : kTexts) {
@@ -19,5 +22,5 @@ bool ReadDescription(const std::filesystem::path& file) {
   }
   for (const char* key : {"NoCase", "FixCRLF", "FixDelimiter"})
     GetPrivateProfileIntA("Options", key, 0, name.c_str());
-  return language > 1;
+  return language > 1 ? Now() - start : -1;
 }

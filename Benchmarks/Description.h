@@ -4,6 +4,6 @@
 
 #include <filesystem>
 
-// The fifteen reads by the system's profile functions, of each key by itself. False when the file
-// names no engine.
-bool ReadDescription(const std::filesystem::path& file);
+// Seconds of the fifteen reads by the system's profile functions, of each key by itself; negative when
+// the file names no engine.
+double TimeReads(const std::filesystem::path& file);

@@ -61,6 +61,19 @@ std::string MacroText(std::size_t size) {
   return text + std::string(size - text.size(), '#');
 }
 
+// What a megabyte takes, from the smallest size on.
+struct Growth {
+  void Add(double seconds, int megabytes) {
+    const double each = seconds / megabytes;
+    if (first == 0) first = each;
+    char times[32];
+    std::snprintf(times, sizeof times, " (%.2fx)", each / first);
+    text += (text.empty() ? "" : ", ") + TimeText(each) + times;
+  }
+  std::string text;
+  double first = 0;
+};
+
 // --- The DLL -------------------------------------------------------------------------------------
 
 // Loading and unloading, the libraries that it needs being there.
@@ -108,8 +121,8 @@ bool CompareMacroFiles(Section& section) {
                 "`mbstowcs` into another. The time for each megabyte shows how it grows.");
   section.Head();
   Module module(kShortDescription);
-  std::string growth;
-  double first = 0;
+  Growth own;
+  Growth peer;
   for (const int megabytes : kMegabytes) {
     const std::size_t size = static_cast<std::size_t>(megabytes) << 20;
     const std::string file = module.Macro("large-" + std::to_string(megabytes), MacroText(size));
@@ -121,13 +134,11 @@ bool CompareMacroFiles(Section& section) {
       return false;
     }
     section.Add(comparison);
-    const double each = comparison.Time() / megabytes;
-    if (first == 0) first = each;
-    char times[32];
-    std::snprintf(times, sizeof times, " (%.2fx)", each / first);
-    growth += (growth.empty() ? "" : ", ") + TimeText(each) + times;
+    own.Add(comparison.Time(), megabytes);
+    peer.Add(comparison.PeerTime(), megabytes);
   }
-  section.Print("\nFor each megabyte of 1, 10 and 50 MB: " + growth + ".\n");
+  section.Print("\nFor each megabyte of 1, 10 and 50 MB: " + own.text + "; the peer: " + peer.text +
+                ".\n");
   return true;
 }
 
@@ -146,10 +157,7 @@ bool CompareModuleFile(Section& section) {
   fs::copy_file(folder / "scriptruby.dll", copy);
   Comparison load("loading : an empty DLL");
   Comparison version("`version` : fifteen profile reads", Comparison::Measure::kRatio, 1);
-  const auto reads = [&] {
-    const double start = Now();
-    return ReadDescription(module.DescriptionFile()) ? Now() - start : -1;
-  };
+  const auto reads = [&] { return TimeReads(module.DescriptionFile()); };
   if (!load.Measured([&] { return TimeLibrary(copy); },
                      [&] { return TimeLibrary(folder / "benchmark-empty.dll"); }, 9) ||
       !version.Measured([&] { return module.TimeVersion(); }, reads, 15)) {

@@ -223,16 +223,16 @@ void CompareCase(Section& section, const Case& each) {
     curve.times.push_back(comparison.Time());
     const double nanoseconds = comparison.Time() * 1e9;
     char text[128];
-    std::snprintf(text, sizeof text, " %.2fx, %.*f ns |", comparison.Ratio(), nanoseconds < 10,
-                  nanoseconds);
-    row += text;
+    std::snprintf(text, sizeof text, ", %.*f ns |", nanoseconds < 10, nanoseconds);
+    row += " " + comparison.RatioText() + text;
     std::snprintf(text, sizeof text, "\t%d\t%.3f\t%.3f\n", size, nanoseconds,
                   comparison.PeerTime() * 1e9);
     lines += each.name + std::string(text);
   }
   for (std::size_t left = curve.times.size(); left < std::size(kSizes); ++left) row += " - |";
   const int from = curve.GrowsFrom();
-  const std::string grows = from ? " from " + SizeText(from) + ": " + each.design : "";
+  std::string grows = from ? " from " + SizeText(from) : "";
+  if (from && *each.design) grows += ": " + std::string(each.design);
   section.Print(row + grows + " |\n");
   const std::string title = each.name + (from ? ", grows" + grows : "");
   section.Chart(title + "\tsize\town\t" + each.peerName + "\n" + lines + "\n\n");
@@ -244,8 +244,8 @@ bool CompareLibrary(Section& section) {
   section.Begin(
       "The Core library",
       "The time for each element as a multiple of `std::string`'s, `std::vector`'s and "
-      "`std::unordered_map`'s doing the same work, and in nanoseconds, for 10 to 1,000,000 "
-      "elements (characters, for `Format` texts, for `Array` and `cHashTable` entries, put in and "
+      "`std::unordered_map`'s doing the same work (the median of the rounds, with the least and "
+      "the greatest), and in nanoseconds, for 10 to 1,000,000 elements (characters, for `Format` texts, for `Array` and `cHashTable` entries, put in and "
       "read). \"Grows\" tells from which size an element "
       "costs four times what it costs among a hundred. A dash: one run would take longer than " +
           TimeText(kLongestRun) + ".");

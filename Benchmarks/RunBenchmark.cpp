@@ -22,11 +22,6 @@ double TimeBareSteps(const wchar_t* progId) {
   return SUCCEEDED(result) ? Now() - start : -1;
 }
 
-double TimeReads(const Module& module) {
-  const double start = Now();
-  return ReadDescription(module.DescriptionFile()) ? Now() - start : -1;
-}
-
 // Opening, sizing, reading and closing the macro's file.
 double TimeFileRead(const std::string& file) {
   const double start = Now();
@@ -64,7 +59,7 @@ bool CompareJScriptRuns(Section& section) {
   const auto run = [&] { return module.TimeRun(macro); };
   const auto steps = [] { return TimeBareSteps(L"JScript"); };
   const auto stepsAndReads = [&] {
-    const double reads = TimeReads(module);
+    const double reads = TimeReads(module.DescriptionFile());
     const double time = steps();
     return reads < 0 || time < 0 ? -1 : reads + time;
   };
@@ -83,7 +78,7 @@ bool CompareJScriptRuns(Section& section) {
                      stepsAndFiles, steps) &&
          CompareEach(
              section, Comparison("(fifteen profile reads : engine alone)"),
-             [&] { return TimeReads(module); }, steps) &&
+             [&] { return TimeReads(module.DescriptionFile()); }, steps) &&
          CompareEach(
              section, Comparison("(one read of the section : engine alone)"),
              [&] { return TimeSectionRead(module); }, steps) &&
