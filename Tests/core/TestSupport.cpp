@@ -29,7 +29,7 @@ CoreTest::CoreTest() {
   SetDebugHook([](const char* line) { reports.push_back(line); });
   const char* given = getenv("CORE_TEST_SEED");
   const u32 seed = given ? static_cast<u32>(strtoul(given, nullptr, 10)) : std::random_device()();
-  std::cout << "CORE_TEST_SEED=" << seed << '\n';
+  std::cout << "CORE_TEST_SEED=" << seed << std::endl;  // there even if the test crashes
   random.seed(seed);
 }
 

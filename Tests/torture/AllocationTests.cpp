@@ -75,7 +75,7 @@ TEST_F(RubyAllocationTest, OfARunInTheEngine) {
   on["call 7"] = [&] { host.AnswerTexts({"t\xC3\xA4xt"}); };
   const std::pair<const char*, const char*> macros[] = {
       {"a Ruby macro with calls",
-       "@tarn.f(1, 2.5, 'text', :symbol, 2**70, nil, true); @tarn.g('x' * 300, *1..20)\n"},
+       "@tarn.f(1, 2.5, 'text', :symbol, 2**70, nil, true, [1, ['x']])\n@tarn.g('x' * 300, *1..20)\n"},
       {"a Ruby macro with an error", "Thread.new { 1 }.join\ndef x = 1\nraise 'message'\n"},
       {"a wrong Ruby macro", "x = = 1\n"},
       {"a Ruby macro with an unknown name", "@tarn.unknown(1)\n"}};

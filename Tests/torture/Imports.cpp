@@ -46,6 +46,17 @@ HRESULT WINAPI ChangeType(VARIANT* to, VARIANT* from, USHORT flags, VARTYPE type
   return Fails() ? E_OUTOFMEMORY : VariantChangeType(to, from, flags, type);
 }
 
+char* CopyText(const char* text) {
+  return Fails() ? nullptr : static_cast<char*>(Took(_strdup(text)));
+}
+SAFEARRAY* WINAPI CreateVector(VARTYPE type, LONG lowest, ULONG count) {
+  return Fails() ? nullptr : SafeArrayCreateVector(type, lowest, count);
+}
+HRESULT WINAPI NewErrorInfo(ICreateErrorInfo** info) {
+  return Fails() ? E_OUTOFMEMORY : CreateErrorInfo(info);
+}
+LPWCH WINAPI Environment() { return Fails() ? nullptr : GetEnvironmentStringsW(); }
+
 // The table of pointers that the loader has filled, by the description of each imported file.
 template <class T>
 T* Inside(HMODULE module, DWORD offset) {
@@ -84,7 +95,9 @@ void WatchMemory(HMODULE module) {
   replace("free", Free);
   replace("CoTaskMemAlloc", TaskAlloc), replace("CoTaskMemFree", TaskFree);
   replace("SysAllocString", AllocString), replace("SysAllocStringLen", AllocStringLen);
-  replace("VariantChangeType", ChangeType);
+  replace("VariantChangeType", ChangeType), replace("SafeArrayCreateVector", CreateVector);
+  replace("CreateErrorInfo", NewErrorInfo), replace("_strdup", CopyText);
+  replace("GetEnvironmentStringsW", Environment);
 }
 
 bool FailRequest(int n) {

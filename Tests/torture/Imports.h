@@ -9,14 +9,15 @@
 // that was there, null when the module does not import it by that name.
 void* ReplaceImport(HMODULE module, const char* function, void* replacement);
 
-// Watches the memory of one module at a time: blocks of the C heap and of COM, and COM's strings and
-// conversions, which need memory too. The imports stay replaced.
+// Watches the memory of one module at a time: blocks of the C heap and of COM, and what others make
+// for it (COM's texts, arrays, conversions and error objects, copies of the environment). The imports
+// stay replaced.
 void WatchMemory(HMODULE module);
 
 // The n-th request from now fails (1: the next one; 0: none does). Returns whether the one of the
 // last call has failed.
 bool FailRequest(int n);
 
-// How many blocks more the module has taken than given back since it is watched. Strings do not count:
-// others free them.
+// How many blocks more the module has taken than given back since it is watched. What others make for
+// it does not count: others free it.
 int LiveBlocks();
