@@ -293,6 +293,7 @@ VALUE FromVariant(const VARIANT& variant, TextForm form) {
 
 VALUE StringFromHost(const wchar_t* text, UINT units, TextForm form, TextOrigin origin) {
   const VALUE string = rb_utf8_str_new(nullptr, static_cast<long>(units) * kMostBytesPerUnit);
-  rb_str_set_len(string, TextFromHost(text, units, form, origin, RSTRING_PTR(string)));
+  const UINT bytes = TextFromHost(text, units, form, origin, RSTRING_PTR(string));
+  rb_str_set_len(string, static_cast<long>(bytes));
   return string;
 }
