@@ -10,7 +10,7 @@ BUILD=$ROOT/build
 LOGS=$BUILD/logs
 
 PACKAGES=(
-  clang-19 lld-19 llvm-19 libclang-rt-19-dev
+  clang-19 clang-tidy-19 lld-19 llvm-19 libclang-rt-19-dev
   g++-mingw-w64-i686-posix mingw-w64-i686-dev g++-multilib
   cmake ninja-build googletest libcli11-dev nlohmann-json3-dev libdtl-dev
   wine wine32:i386

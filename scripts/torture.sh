@@ -14,7 +14,6 @@
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
-PACKAGES+=(clang-tidy-19)
 REPORT=$ROOT/Docs/reliability.md
 ALL=(memory values files profile hosts faults soak recordings fuzz undefined tidy)
 failed=0
