@@ -3,8 +3,6 @@
 
 #include <io.h>
 
-#include <new>
-
 #include "HostProcess.h"
 #include "Interpreter.h"
 // Last: they rename what the headers above use.
@@ -46,8 +44,9 @@ constexpr PreludeFile kPrelude[] = {
     {"rubyscript/world.rb", kWorld, sizeof kWorld},
 };
 
-// The state at the start; keeps the variables that CRuby has added. Never destroyed. Null: no memory.
-HostProcess* startState = nullptr;
+// The state at the start; keeps the variables that CRuby has added. No block of the heap: a start that
+// fails for want of one would be the last.
+[[clang::no_destroy]] constinit HostProcess startState;
 
 VALUE SystemMessage(VALUE, VALUE code) {
   wchar_t text[512];
@@ -130,9 +129,7 @@ bool StartInterpreter() {
 }  // namespace
 
 bool StartRuby() {
-  startState = new (std::nothrow) HostProcess;
-  if (!startState) return false;
-  startState->Save();
+  startState.Save();
   _putenv("RUBYLIB=");
   bool started = StartInterpreter();
   if (started) {
@@ -140,12 +137,12 @@ bool StartRuby() {
     rb_protect(DefineModule, Qnil, &failed);
     started = failed == 0;
   }
-  startState->KeepAdditions();
-  startState->Restore();
+  startState.KeepAdditions();
+  startState.Restore();
   return started;
 }
 
-void ApplyRubyEnvironment() { startState->ApplyAdditions(); }
+void ApplyRubyEnvironment() { startState.ApplyAdditions(); }
 
 bool IsRubyThread() { return ruby_native_thread_p() != 0; }
 
