@@ -245,7 +245,8 @@ bool CompareLibrary(Section& section) {
       "The Core library",
       "The time for each element as a multiple of `std::string`'s, `std::vector`'s and "
       "`std::unordered_map`'s doing the same work (the median of the rounds, with the least and "
-      "the greatest), and in nanoseconds, for 10 to 1,000,000 elements (characters, for `Format` texts, for `Array` and `cHashTable` entries, put in and "
+      "the greatest), and in nanoseconds, for 10 to 1,000,000 elements (characters, for `Format` "
+      "texts, for `Array` and `cHashTable` entries, put in and "
       "read). \"Grows\" tells from which size an element "
       "costs four times what it costs among a hundred. A dash: one run would take longer than " +
           TimeText(kLongestRun) + ".");

@@ -202,6 +202,6 @@ TEST_F(SystemText, ReadsASectionAsTheProfileFunctionsDo) {
     }
   }
   EXPECT_GT(kept, sections / 6) << "values that came from the one pass";
-  std::printf("figure: %d sections, %d values beyond doubt in the one pass, no difference\n", sections,
-              kept);
+  std::printf("figure: %d sections, %d values beyond doubt in the one pass, no difference\n",
+              sections, kept);
 }
