@@ -2,13 +2,13 @@
 # SPDX-License-Identifier: MIT
 # The whole length of what ctest does for seconds, and prints its figures:
 #
-#   scripts/torture.sh [memory | values | files | profile | hosts | faults | soak | recordings | fuzz |
-#                       undefined | tidy]...
+#   scripts/torture.sh [memory | values | files | profile | hosts | faults | soak | recordings |
+#                       fuzz | undefined | tidy]...
 #
 # Without arguments all of them, which takes about an hour on an idle machine. The figures go to
-# Docs/reliability.md as well, each under the command that made it. SCRIPTRUBY_TORTURE_SEED repeats a
-# random test by the seed that it printed (CORE_TEST_SEED: that of the section profile); FUZZ_SECONDS is
-# the time for each fuzz target (60).
+# Docs/reliability.md as well, each under the command that made it. SCRIPTRUBY_TORTURE_SEED, or in
+# the section profile CORE_TEST_SEED, repeats a random test by the seed that it printed; FUZZ_SECONDS
+# is the time for each fuzz target (60).
 #
 # Sets the machine up and builds first when needed.
 set -euo pipefail
