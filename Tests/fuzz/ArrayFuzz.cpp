@@ -5,14 +5,6 @@
 #include "Fuzz.h"
 #include "cLib/cArray.h"
 
-namespace {
-struct Element {
-  static inline int live = 0;
-  Element() { ++live; }
-  virtual ~Element() { --live; }
-};
-}  // namespace
-
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, size_t size) {
   {
     Input input(bytes, size);

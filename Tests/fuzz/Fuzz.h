@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What the fuzz targets share: the choice of an input's bytes, and a check that names its place.
+// What the fuzz targets share: the choice of an input's bytes, elements for containers, and a check
+// that names its place.
 #pragma once
 
 #include <fuzzer/FuzzedDataProvider.h>
@@ -32,5 +33,14 @@ inline int AnyPlace(Input& input, size_t size) {
   if (place == -3) return INT32_MAX;
   return place < 0 ? place : place % static_cast<int>(size + 3);
 }
+
+// What a container holds: it knows how many of its kind live.
+struct Element {
+  static inline int live = 0;
+  Element() { ++live; }
+  Element(const Element&) = delete;
+  Element& operator=(const Element&) = delete;
+  virtual ~Element() { --live; }
+};
 
 inline std::string BytesOf(const String& s) { return {s.Text(), s.Length()}; }
