@@ -3,8 +3,6 @@
 
 #include <locale.h>
 
-#include "iLib/iModule.h"
-
 // A number being written from its end, so that the text can be made at its full size at once.
 class NumberText {
  public:
@@ -86,6 +84,3 @@ xArgument::xArgument(double value)
     : kind(kReal), integer(Truncated(value)), real(value), text(NumberText(value).Text()) {
   if (text.IsEmpty()) text.Format("%lf", value);
 }
-
-// An object begins with the address of its class's table of operations.
-bool xArgument::IsOwn() const { return IsInModule(*reinterpret_cast<void* const*>(this)); }

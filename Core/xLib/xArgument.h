@@ -22,9 +22,6 @@ class xArgument {
   SLOTS_FROM(0);
   SLOT(0) ~xArgument() = default;
 
-  // Whether this module made it, not the host, which may have a destructor and a heap of its own.
-  bool IsOwn() const;
-
   u32 kind = kText;
   i32 integer = 0;  // a real's is truncated toward zero, -2147483648 when it does not fit
   double real = 0;

@@ -5,6 +5,7 @@
 
 #include "cLib/cMemory.h"
 #include "iLib/iComText.h"
+#include "iLib/iModule.h"
 #include "xLib/xArgument.h"
 
 xScript::xScript(bool fixCRLF, bool fixDelimiter)
@@ -132,12 +133,18 @@ static bool ArePlain(const DISPPARAMS& params) {
   return true;
 }
 
+// Whether this module made it, not the host, which may have a destructor and a heap of its own. Objects
+// begin with the address of their class's table of operations.
+static bool IsOwn(const xArgument& argument) {
+  return IsInModule(*reinterpret_cast<void* const*>(&argument));
+}
+
 // Destroys the argument that an earlier call has left at `index`. Its block is returned, which saves
 // a call with three arguments a quarter of its time; null when there is none to be used again.
 static void* BlockLeftAt(Array<xArgument>& arguments, i32 index) {
   if (!arguments.At(index)) return nullptr;
   xArgument* const old = arguments.Detach(index);
-  if (old->IsOwn()) {
+  if (IsOwn(*old)) {
     old->~xArgument();
     return old;
   }

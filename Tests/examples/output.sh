@@ -56,6 +56,10 @@ expect 4 '0 of 2 files done, 1 failed, 1 not begun' --module "$fake" -i macro.rb
 if command -v script > /dev/null; then
   timeout 20 script -qec "wine '$macrorun' -i macro.rbs --each each/1 each/2" terminal > /dev/null 2>&1
   grep -q '\[1/2\] each/1' terminal || fail "no progress on a terminal: $(cat terminal)"
+  # Where the text is shown in its letters, whatever the code page
+  echo 'Zoë → 10 €' > letters.txt
+  timeout 20 script -qec "wine '$macrorun' macro.rbs letters.txt" terminal > /dev/null 2>&1
+  grep -q 'Zoë → 10 €' terminal || fail "a text on a terminal: $(cat terminal)"
 fi
 
 # What cannot be replaced is refused before the macro runs

@@ -13,6 +13,7 @@
 #include <utility>
 
 #include "Encoding.h"
+#include "ExitCode.h"
 
 namespace {
 
@@ -40,18 +41,19 @@ WORD Attributes(Colour colour, WORD plain) {
 }
 
 // The system's own attributes and not escape sequences: every console takes them.
-void WriteTerminal(HANDLE terminal, std::string_view text, Colour colour) {
+void WriteTerminal(std::FILE* terminal, std::string_view text, Colour colour) {
+  const HANDLE console = HandleOf(terminal);
   CONSOLE_SCREEN_BUFFER_INFO before = {};
   const bool coloured =
-      colour != Colour::kPlain && ColourWanted() && GetConsoleScreenBufferInfo(terminal, &before);
-  if (coloured) SetConsoleTextAttribute(terminal, Attributes(colour, before.wAttributes));
+      colour != Colour::kPlain && ColourWanted() && GetConsoleScreenBufferInfo(console, &before);
+  if (coloured) SetConsoleTextAttribute(console, Attributes(colour, before.wAttributes));
   const std::wstring wide = PathFromUtf8(text).wstring();
   DWORD written = 0;
   for (std::size_t from = 0; from < wide.size(); from += written) {
     const DWORD length = static_cast<DWORD>(std::min<std::size_t>(wide.size() - from, 8192));
-    if (!WriteConsoleW(terminal, wide.data() + from, length, &written, nullptr) || !written) break;
+    if (!WriteConsoleW(console, wide.data() + from, length, &written, nullptr) || !written) break;
   }
-  if (coloured) SetConsoleTextAttribute(terminal, before.wAttributes);
+  if (coloured) SetConsoleTextAttribute(console, before.wAttributes);
 }
 
 using Line = std::optional<std::string>;
@@ -114,9 +116,17 @@ std::string ErrorCapture::Take() {
   return text;
 }
 
+// A terminal is told in UTF-16: its code page is seldom that of the text.
+void WriteStandardOutput(std::string_view bytes) {
+  if (IsTerminal(stdout)) return WriteTerminal(stdout, bytes, Colour::kPlain);
+  _setmode(_fileno(stdout), _O_BINARY);
+  if (std::fwrite(bytes.data(), 1, bytes.size(), stdout) != bytes.size() || std::fflush(stdout))
+    throw UsageError("cannot write to standard output");
+}
+
 void WriteError(std::string_view text, Colour colour) {
   if (IsTerminal(stderr)) {
-    WriteTerminal(HandleOf(stderr), text, colour);
+    WriteTerminal(stderr, text, colour);
     return;
   }
   std::fwrite(text.data(), 1, text.size(), stderr);

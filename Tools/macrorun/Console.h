@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: MIT
-// The streams that a person may be looking at: whether they are a terminal, and text with colour on
-// standard error.
+// The streams that a person may be looking at: whether they are a terminal, and text for them, with colour
+// on standard error.
 //
 // Texts are UTF-8; what is not passes as it is, except to a terminal, which shows a replacement
 // character. Colour is used on a terminal only, and never when the environment variable NO_COLOR is
 // set and not empty.
-// Errors: a stream that cannot be written is passed over; there is nobody to tell.
+// Errors: standard error that cannot be written is passed over; there is nobody to tell.
 // Threading: any thread; texts of two threads may mix line by line.
 #pragma once
 
@@ -42,6 +42,9 @@ class ErrorCapture {
   int file;   // -1: none
   int saved;  // standard error itself
 };
+
+// To standard output, byte for byte unless it is a terminal. UsageError when that fails.
+void WriteStandardOutput(std::string_view bytes);
 
 void WriteError(std::string_view text, Colour colour = Colour::kPlain);
 

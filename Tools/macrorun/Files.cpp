@@ -168,7 +168,7 @@ void RequireMacro(const fs::path& path) {
 void RequireReplaceable(const fs::path& path, bool mustExist) {
   const DWORD attributes = GetFileAttributesW(path.c_str());
   if (attributes == INVALID_FILE_ATTRIBUTES) {
-    if (mustExist) FailWriting(path, GetLastError());
+    if (mustExist) RequireReadable(path, "file");
     return;
   }
   if (attributes & FILE_ATTRIBUTE_DIRECTORY)
@@ -181,10 +181,4 @@ void ReplaceFileBytes(const fs::path& path, const std::string& bytes) {
   Replacement replacement(path);
   replacement.Write(bytes);
   replacement.Commit();
-}
-
-void WriteStandardOutput(const std::string& bytes) {
-  _setmode(_fileno(stdout), _O_BINARY);
-  if (std::fwrite(bytes.data(), 1, bytes.size(), stdout) != bytes.size() || std::fflush(stdout))
-    throw UsageError("cannot write to standard output");
 }

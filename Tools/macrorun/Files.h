@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The texts that a macro works on, from and to files and the standard streams, byte for byte.
+// The texts that a macro works on, from and to files and from standard input, byte for byte.
 //
 // Errors: UsageError, which names the file and the system's reason.
 // Threading: any thread; two processes that replace the same file at a time get in each other's way,
@@ -33,5 +33,3 @@ void RequireReplaceable(const std::filesystem::path& path, bool mustExist);
 // A process that is killed may leave NAME.macrorun~, which the next call replaces. The new file has
 // the attributes and the access list of the old one (under Wine: the mode of any new file).
 void ReplaceFileBytes(const std::filesystem::path& path, const std::string& bytes);
-
-void WriteStandardOutput(const std::string& bytes);
