@@ -8,7 +8,7 @@
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
-[ $# -gt 0 ] || STATUS=2 die "usage: scripts/run.sh [OPTION...] MACRO [FILE]"
+[ $# -gt 0 ] || STATUS=2 die "usage: scripts/run.sh [OPTION...] MACRO [FILE] (--help lists the options)"
 
 prepare macrorun scriptruby rubyscript
 exec wine "$BUILD/release/bin/macrorun.exe" "$@"

@@ -26,9 +26,8 @@ expect 2 'needs a FILE' --in-place macro.js
 expect 2 'standard input' --in-place macro.js -
 expect 2 '--output' -o out.txt --in-place macro.js input.txt
 expect 2 '--output' -o out.txt macro.js --each input.txt
-expect 2 'not expected: third (several files stand behind --each)' macro.js input.txt third
-expect 2 'not expected: --third' macro.js input.txt --third
-! grep -q 'several files' err || fail '--each is hinted at for an option'
+expect 2 'no place for third (several files stand behind --each)' macro.js input.txt third
+expect 2 'there is no option --timout' --timout 1 macro.js input.txt
 expect 2 'FILE: expected a name, got an empty one' macro.js ''
 expect 2 '--output: expected a name, got an empty one' macro.js input.txt -o ''
 expect 2 '--stubs and --check are two things to do' --check macro.js --stubs

@@ -60,6 +60,8 @@ if command -v script > /dev/null; then
   echo 'Zoë → 10 €' > letters.txt
   timeout 20 script -qec "wine '$macrorun' macro.rbs letters.txt" terminal > /dev/null 2>&1
   grep -q 'Zoë → 10 €' terminal || fail "a text on a terminal: $(cat terminal)"
+  { sleep 2; printf 'typed\r'; sleep 1; printf '\004\r'; sleep 1; } | timeout 20 script -qec "wine '$macrorun' macro.rbs - -o typed.txt" terminal > /dev/null 2>&1
+  expect_lines typed.txt typed+
 fi
 
 # What cannot be replaced is refused before the macro runs

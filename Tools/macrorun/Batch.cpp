@@ -30,6 +30,7 @@ class Batch {
   void ShowUnused(ExitCode outcome);
 
  private:
+  std::string Read(const fs::path& input);
   void Write(const fs::path& input, const std::string& bytes);
   ExitCode RunGuarded(const fs::path& input);
 
@@ -42,9 +43,16 @@ class Batch {
   RunSurroundings surroundings;
 };
 
+// In bytes, unless somebody types it.
+std::string Batch::Read(const fs::path& input) {
+  if (input != "-" || !IsTerminal(stdin)) return ReadInput(input);
+  reporter.Note("type the text; Ctrl+Z (under Wine Ctrl+D) and Enter in a line of its own end it");
+  return ReadTerminalText();
+}
+
 ExitCode Batch::RunOne(const fs::path& input) {
   if (options.inPlace) RequireReplaceable(input, true);
-  Editor editor(Document(ReadInput(input)), input == "-" ? fs::path() : input);
+  Editor editor(Document(Read(input)), input == "-" ? fs::path() : input);
   if (const ExitCode code = RunMacro(surroundings, editor); code != kSuccess) return code;
   Write(input, editor.First().Bytes());
   return kSuccess;

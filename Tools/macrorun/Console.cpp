@@ -56,6 +56,9 @@ void WriteTerminal(std::FILE* terminal, std::string_view text, Colour colour) {
   if (coloured) SetConsoleTextAttribute(console, before.wAttributes);
 }
 
+// What ends the input at the start of a line: Windows's own and, since Wine drops that one, Unix's.
+constexpr wchar_t kControlZ = L'\x1A', kControlD = L'\x04';
+
 using Line = std::optional<std::string>;
 
 Line ReadLine() {
@@ -66,7 +69,7 @@ Line ReadLine() {
     line.append(block, count);
     if (line.back() != L'\n') continue;
     line.erase(line.find_last_not_of(L"\r\n") + 1);
-    if (!line.empty() && line.front() == L'\x1A') return {};  // Ctrl+Z
+    if (!line.empty() && (line.front() == kControlZ || line.front() == kControlD)) return {};
     return WideToUtf8(line);
   }
   return {};
@@ -131,6 +134,12 @@ void WriteError(std::string_view text, Colour colour) {
   }
   std::fwrite(text.data(), 1, text.size(), stderr);
   std::fflush(stderr);
+}
+
+std::string ReadTerminalText() {
+  std::string text;
+  while (const Line line = ReadLine()) text += *line + "\n";
+  return text;
 }
 
 // By a thread of its own, since no call ends a read of the terminal everywhere: Ctrl+C does on Windows,

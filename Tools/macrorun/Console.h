@@ -48,6 +48,9 @@ void WriteStandardOutput(std::string_view bytes);
 
 void WriteError(std::string_view text, Colour colour = Colour::kPlain);
 
+// The lines that the user types, each with a line feed, up to Ctrl+Z (or Ctrl+D) at the start of one.
+std::string ReadTerminalText();
+
 // A line that the user types, without its end; nothing at the end of the input, and when `isGivenUp`, which
 // is asked again and again, says so. Then the terminal's next line is lost: the program is to end.
 std::optional<std::string> ReadTerminalLine(const std::function<bool()>& isGivenUp);

@@ -169,6 +169,10 @@ void RequireReplaceable(const fs::path& path, bool mustExist) {
   const DWORD attributes = GetFileAttributesW(path.c_str());
   if (attributes == INVALID_FILE_ATTRIBUTES) {
     if (mustExist) RequireReadable(path, "file");
+    std::error_code error;
+    const fs::path folder = path.parent_path();
+    if (!folder.empty() && !fs::is_directory(folder, error))
+      throw UsageError("cannot write " + ToUtf8(path) + ": there is no folder " + ToUtf8(folder));
     return;
   }
   if (attributes & FILE_ATTRIBUTE_DIRECTORY)

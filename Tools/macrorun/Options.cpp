@@ -238,10 +238,13 @@ void CheckCombination(const Options& options) {
     if (input == "-") throw CLI::ValidationError("--in-place", "cannot replace standard input");
 }
 
-// What may have been meant by arguments that have no place.
-std::string HintAt(const std::vector<std::string>& rest, const Texts& texts) {
-  const bool files = !texts.input.empty() && !rest.empty() && !rest.front().starts_with('-');
-  return files ? " (several files stand behind --each)" : "";
+// Why the arguments `rest` have no place. Behind an unknown option right ones may have none, either.
+std::string ExtrasText(const std::vector<std::string>& rest) {
+  for (const std::string& argument : rest)
+    if (argument.starts_with('-')) return "there is no option " + argument;
+  std::string text = "there is no place for";
+  for (const std::string& argument : rest) text += " " + argument;
+  return text + " (several files stand behind --each)";
 }
 
 int Refuse(const std::string& text) {
@@ -279,8 +282,8 @@ std::optional<int> ParseOptions(Options& options) {
     CheckCombination(options);
   } catch (const CLI::Success& request) {
     return app.exit(request);
-  } catch (const CLI::ExtrasError& error) {
-    return Refuse(error.what() + HintAt(app.remaining(), texts));
+  } catch (const CLI::ExtrasError&) {
+    return Refuse(ExtrasText(app.remaining()));
   } catch (const CLI::ParseError& error) {
     return Refuse(error.what());
   }

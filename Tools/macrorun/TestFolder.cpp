@@ -39,13 +39,12 @@ std::vector<fs::path> FilesIn(const fs::path& folder) {
   return files;
 }
 
-bool IsText(const fs::path& file) {
-  const std::wstring extension = Folded(file.extension());
-  return extension == L".in" || extension == L".out";
-}
+bool IsInput(const fs::path& file) { return Folded(file.extension()) == L".in"; }
 
-// Whether the text belongs to a macro.
-bool AddCase(Cases& cases, const fs::path& text) {
+bool IsText(const fs::path& file) { return IsInput(file) || Folded(file.extension()) == L".out"; }
+
+// Whether the text belongs to a macro. One for a misspelt case does not: it must not be promoted.
+bool AddCase(Cases& cases, const fs::path& folder, const fs::path& text) {
   const fs::path name = text.stem();
   if (const auto macro = cases.find(name); macro != cases.end()) {
     macro->second.insert(L"");
@@ -54,6 +53,9 @@ bool AddCase(Cases& cases, const fs::path& text) {
   const std::wstring ending = name.extension().wstring();
   const auto macro = cases.find(name.stem());
   if (macro == cases.end() || ending.size() < 2) return false;
+  std::error_code error;
+  if (!IsInput(text) && !fs::exists(folder / fs::path(text).replace_extension(L".in"), error))
+    return false;
   macro->second.insert(ending.substr(1));
   return true;
 }
@@ -78,6 +80,8 @@ fs::path MacroTest::Beside(const wchar_t* extension) const {
 TestFolder::TestFolder(const fs::path& given) {
   std::error_code error;
   const bool one = fs::is_regular_file(given, error);
+  if (!fs::exists(given, error))
+    throw UsageError("there is no folder and no macro " + ToUtf8(given) + " (--test)");
   const fs::path folder = one ? given.parent_path() : given;
   const std::vector<fs::path> files = FilesIn(folder);
   std::vector<fs::path> macros;
@@ -86,7 +90,7 @@ TestFolder::TestFolder(const fs::path& given) {
   Cases cases;
   for (const fs::path& macro : macros) cases[macro.stem()];
   for (const fs::path& file : files)
-    if (IsText(file) && !AddCase(cases, file) && !one) orphans.push_back(folder / file);
+    if (IsText(file) && !AddCase(cases, folder, file) && !one) orphans.push_back(folder / file);
   if (macros.empty()) throw UsageError("no macros in " + ToUtf8(folder) + " (--test)");
   if (one) macros = {given.filename()};
   for (const fs::path& macro : macros) {

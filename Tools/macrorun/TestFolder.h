@@ -2,8 +2,8 @@
 // Which tests a folder of macros holds, by the names of its files.
 //
 // NAME.in and NAME.out belong to every macro NAME, in whatever language. So do NAME.CASE.in and
-// NAME.CASE.out, each CASE a test of its own, unless there is a macro NAME.CASE. One file of the two is
-// enough; a macro without any has one test all the same.
+// NAME.CASE.out, each CASE with an .in a test of its own, unless there is a macro NAME.CASE. A macro
+// without any file has one test all the same.
 //
 // Errors: UsageError. Threading: any thread.
 #pragma once

@@ -19,7 +19,7 @@ MacroResult Prompt(MacroCall& call) {
 MacroResult Argument(MacroCall& call) {
   const std::optional<std::string> value = call.services.MacroArgument(call.Text(0));
   if (value) return *value;
-  if (!call.Has(1)) call.Fail(0, "the name of an argument that the macro was given");
+  if (!call.Has(1)) call.Fail(0, "an argument that the macro was given (--arg NAME=VALUE gives one)");
   return call.Text(1);
 }
 
