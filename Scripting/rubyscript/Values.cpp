@@ -32,7 +32,8 @@ VALUE PassableInteger(VALUE value) {
 
 void CheckByteHostText(VALUE text) {
   if (RSTRING_LEN(text) > kMostBytesToByteHost)
-    rb_raise(rb_eArgError, "text of %ld bytes: a function of the editor takes at most %ld",
+    rb_raise(rb_eArgError,
+             "text of %ld bytes: a function of the editor takes at most %ld; pass it in pieces",
              RSTRING_LEN(text), kMostBytesToByteHost);
   if (memchr(RSTRING_PTR(text), 0, RSTRING_LEN(text)))
     rb_raise(rb_eArgError, "text contains a null byte, which ends it for the editor");

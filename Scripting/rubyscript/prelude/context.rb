@@ -217,8 +217,10 @@ module ActiveScript
       (line.index(piece[cut..].delete_suffix("...")) || 0) + place - cut
     end
 
+    def location_of(error) = own_frames(error.backtrace_locations.to_a).find { |each| @sources.key?(each.path) }
+
     def run_time_position(error)
-      location = own_frames(error.backtrace_locations.to_a).find { |each| @sources.key?(each.path) }
+      location = location_of(error)
       return [location.path, location.lineno, column_of(error, location)] if location
       frame = own_frames(Array(error.backtrace)).find { |each| @sources.key?(each[/\A[^:]*/]) }
       frame ? [frame[/\A[^:]*/], frame[/:(\d+)/, 1].to_i, 0] : [nil, nil, 0]
@@ -266,13 +268,36 @@ module ActiveScript
 
     def description(error, host_text)
       message = message_of(error)
+      return message if !host_text && aborted?(error, message)
       message = error.class.name.to_s if message.empty?
       first, rest = message.split("\n", 2)
       frames = own_frames(Array(error.backtrace)).select { |each| @sources.key?(each[/\A[^:]*/]) }
                                      .reject { |each| each.end_with?("in `method_missing'") }
                                      .map { |each| each.sub("<compiled>'", "<main>'") }
-      text = SyntaxError === error ? message : ["#{first} (#{error.class})", rest].compact.join("\n")
+      text = SyntaxError === error ? message : ["#{first}#{hint(error)} (#{error.class})", rest].compact.join("\n")
       [host_text || text, *frames.first(20).map { |frame| "\tfrom #{frame}" }].join("\n")
+    end
+
+    # By `abort` with a text, which is for the user: neither class nor backtrace would help him. Without
+    # one, and by `exit`, the text is CRuby's own.
+    def aborted?(error, message) = SystemExit === error && !["", "exit"].include?(message)
+
+    # For the two ways to miss an item: its name without the @, and its variable in another object.
+    def hint(error)
+      missed = error.instance_of?(NameError) && error.name.to_s
+      return ": the host's object is @#{missed}" if @items.key?(missed)
+      item = nil_variable(error)
+      ": this object has no @#{item} unless it is handed over" if @items.key?(item)
+    end
+
+    # The name of the instance variable that is nil and was called; nil when it was another thing.
+    def nil_variable(error)
+      return unless NoMethodError === error && NilClass === error.receiver
+      node = RubyVM::AbstractSyntaxTree.of(location_of(error), keep_script_lines: true)
+      variable, name = node.children if node.type == :CALL
+      variable.children.first.to_s.delete_prefix("@") if name == error.name && variable.type == :IVAR
+    rescue StandardError
+      nil
     end
   end
 end
