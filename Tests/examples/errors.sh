@@ -12,6 +12,10 @@ expect_lines err "macro.rbs:2:2: no implicit conversion of nil into String (Type
 expect_rbs 1 '' 'x = "ä"; y = = 1'
 expect_lines err "macro.rbs:1:14: syntax error, unexpected '='" '  x = "ä"; y = = 1' \
   '               ^'
+several=$(printf 'x = = 1\ny = 2\nz = = 3')
+expect_rbs 1 '' "$several"
+expect_lines err "macro.rbs:1:5: syntax error, unexpected '='" '  x = = 1' '      ^' \
+  "macro.rbs:3: syntax error, unexpected '='" 'z = = 3'
 expect_js 1 '' '/* ä */ x = = 1;'
 expect_lines err 'macro.js:1:13: Syntax error' '  /* ä */ x = = 1;' '              ^'
 expect_js 1 '' "$(printf 'var ok;\n  tarn.nothing();')"
@@ -22,6 +26,8 @@ expect_lines err 'macro.rbs:1:6: nothing is no macro function (see --functions)'
 expect_rbs 1 '' "$(printf '@tarn.nothing rescue nil\nnil.foo')"
 expect_lines err "macro.rbs:2:4: undefined method \`foo' for nil:NilClass (NoMethodError)" \
   '  nil.foo' '     ^'
+expect_rbs 1 '' 'abort "No text"'
+expect_lines err 'macro.rbs:1:1: No text' '  abort "No text"' '  ^'
 expect_js 1 '' 'tarn.goto_line(7);'
 expect_lines err 'macro.js: goto_line: argument 1 of (line): expected a line number from 1 to 2, got "7"'
 expect_rbs 1 '' "$(printf 'def f\n  @tarn.goto_line(7)\nend\n\nf')"
@@ -50,6 +56,8 @@ if command -v python3 > /dev/null; then
   json '[(x["kind"], x["function"], x["argument"], x["expected"]) for x in e if x["type"] == "error"] \
 == [("call", "goto_line", 1, "a line number from 1 to 2")]'
   json '{"type": "trace", "text": "goto_line(\"x\") -> wrong call"} in e'
+  expect_rbs 1 '' "$several" --errors json
+  json 'e[0]["details"][0].startswith("macro.rbs:3: syntax error")'
   expect 2 '' --errors json missing.js
   json 'e[0]["kind"] == "usage" and "missing.js" in e[0]["message"]'
   expect 4 '' --errors json --module "$fake" macro.js

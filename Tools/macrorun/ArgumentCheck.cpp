@@ -109,7 +109,8 @@ std::size_t ArgumentCheck::CheckNumber(std::size_t index, std::size_t first, std
 
 std::string ArgumentCheck::CheckText(std::size_t index, ParameterKind kind) const {
   std::string text(arguments[index].text);
-  if (text.size() >= kNarrowLimit) Fail(index, "at most 511 bytes (the text may have been cut)");
+  if (text.size() >= kNarrowLimit)
+    Fail(index, "at most 511 bytes (this may have been cut; pass it in pieces)");
   if (kind == ParameterKind::kLineText && text.find('\n') != text.npos)
     Fail(index, "one line without a line end");
   if (kind == ParameterKind::kName && text.empty()) Fail(index, "a text that is not empty");

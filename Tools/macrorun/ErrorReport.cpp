@@ -36,17 +36,25 @@ void ReadPosition(std::string_view text, ErrorReport& error) {
   error.column = std::max(Number(text.substr(colon + 1)) + 1, 0);
 }
 
-// "macro:3: text" without the place, and "from macro:3:in `f'" with the file's name.
+// What stands behind the place in "macro:3: text"; empty for another line.
+std::string_view BehindPlace(std::string_view line) {
+  const std::size_t digits = kRubyName.size() + 1;
+  if (!line.starts_with(kRubyName) || line.substr(0, digits).back() != ':') return {};
+  const std::size_t end = line.find_first_not_of("0123456789", digits);
+  if (end == line.npos || !line.substr(end).starts_with(": ")) return {};
+  return line.substr(end + 2);
+}
+
+// The first line "macro:3: text" without the place; a further one, of a second syntax error, and
+// "from macro:3:in `f'" with the file's name.
 std::string WithoutEngineName(std::string_view line, const std::string& file, bool first) {
-  const std::string name = std::string(kRubyName) + ":";
+  const std::string_view behind = BehindPlace(line);
+  if (first && !behind.empty()) return std::string(behind);
   std::string text(line);
-  if (first && line.starts_with(name)) {
-    const std::size_t end = line.find(": ", name.size());
-    if (end != line.npos) return std::string(line.substr(end + 2));
-  }
-  const std::string from = "from " + name;
+  if (!behind.empty()) return text.replace(0, kRubyName.size(), file);
+  const std::string from = "from " + std::string(kRubyName) + ":";
   if (const std::size_t place = text.find(from); place != text.npos)
-    text.replace(place + 5, name.size() - 1, file);
+    text.replace(place + 5, kRubyName.size(), file);
   return text;
 }
 
@@ -54,13 +62,7 @@ bool IsUnderline(std::string_view line) {
   return line.find_first_not_of(" \t^~") == line.npos;  // an empty one, too
 }
 
-// "macro:3: warning: text"
-bool IsWarning(std::string_view line) {
-  const std::size_t digits = kRubyName.size() + 1;
-  if (!line.starts_with(kRubyName) || line.substr(0, digits).back() != ':') return false;
-  const std::size_t end = line.find_first_not_of("0123456789", digits);
-  return end != line.npos && line.substr(end).starts_with(": warning: ");
-}
+bool IsWarning(std::string_view line) { return BehindPlace(line).starts_with("warning: "); }
 
 // A chain that is the place of the error itself, once more.
 void ForgetOwnPlace(ErrorReport& error) {

@@ -27,7 +27,8 @@ std::vector<MacroFunction> AllFunctions() {
 std::string Hindrance(const std::string& text, TextPassage passage) {
   const std::size_t length = WideLength(text);
   if (length >= kWideLimit)
-    return std::to_string(length) + " characters, and a macro receives at most 1023";
+    return std::to_string(length) +
+           " characters, and a macro receives at most 1023; get_text gives pieces of it";
   if (text.find('\0') != text.npos) return "a zero byte, which would end it";
   if (passage == TextPassage::kBytes || LowBytesStay(text)) return {};
   return "a byte from 0x80 to 0x9F, which the system's code page would change on its way to the "
