@@ -36,7 +36,15 @@ printf 'one\ntwo\n' > text
 run 0 '' prefix --arg 'prefix=| '
 expect_lines out '| one' '| two'
 printf '{"a": [1' > text
-run 1 'This is no JSON' JSON.parse
+run 1 'rbs:6:3: This is no JSON' JSON.parse
+# Longer than one call takes
+{ echo '['; seq 300 | sed 's/^/  /; $!s/$/,/'; echo ']'; } > long
+sed 's/^ *//' long > text
+run 0 '' JSON.parse
+cmp out long || fail "a long text: $(cat err)"
+seq 300 > text
+run 0 '' partition
+cmp out text || fail "many lines: $(cat err)"
 
 # Recordings
 awk '/^```json$/ { n++; file = n ".json"; next }

@@ -16,7 +16,8 @@ A macro calls them on `tarn`, in Ruby `@tarn`. `macrorun --functions=markdown` p
 Lines and columns count from 1, columns in characters; a line end is one character. The last place of
 a text is the start of the line after its last one. A number may be given as a text, a text as a number.
 A call with other arguments than these is a wrong call, which changes nothing and ends the macro. No text
-argument may have more than 511 bytes, no text result more than 1,023 characters.
+result may have more than 1,023 characters, no text argument more than 511 bytes: the module passes 512 and cuts
+what follows, so that a text of 512 may not be the whole one.
 )";
 
 constexpr char kStubsHead[] =

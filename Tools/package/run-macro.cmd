@@ -13,7 +13,6 @@ if not exist "%~f1" (
 )
 rem A macro is named from its own folder: its path may hold letters that the code page has not.
 pushd "%~dp1"
-chcp 65001 > nul
 if exist "%~n1.in" ("%~dp0macrorun.exe" "%~nx1" "%~n1.in") else ("%~dp0macrorun.exe" "%~nx1")
 popd
 :end
