@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 // What every test of the module shares: the DLL that ships, loaded from a folder of the test's own,
 // one host, one fake engine whose script calls f(1), and a transcript. Whatever the host, the engine
-// and the user's screen see is logged in order, and the end of each test compares it with
-// golden/<suite>.<test>.txt, so an unexpected call fails by itself. With SCRIPTRUBY_PROMOTE=1 the
-// files are rewritten instead.
+// and the user's screen see is logged in order, and at the end what the module has reported. The end
+// of each test compares it with golden/<suite>.<test>.txt, so an unexpected call fails by itself.
+// With SCRIPTRUBY_PROMOTE=1 the files are rewritten instead.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -13,6 +13,7 @@
 
 #include "FakeEngine.h"
 #include "RawHost.h"
+#include "Resources.h"
 
 using namespace std::string_literals;
 
@@ -58,4 +59,5 @@ class ModuleTest : public testing::Test {
   void Script(const std::function<void()>& body) { on["engine: SetScriptState 2"] = body, Run(); }
 
   RawHost host;
+  const unsigned handles = Used().handles;
 };
