@@ -5,7 +5,7 @@
 
 #include "cLib/cReport.h"
 
-StringDZ::~StringDZ() { Clear(); }
+StringDZ::~StringDZ() = default;
 
 // Appended, not formatted: a text of any length keeps its characters. False: no memory.
 bool StringDZ::Fill(String& entry, const char* s, bool numbered) const {

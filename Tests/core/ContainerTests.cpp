@@ -48,10 +48,12 @@ TEST_F(Containers, KeepOrderAndGrow) {
   for (int i = 0; i < 60; ++i) list.SetAt(new Element(i), i), stack.Push(new Element(i));
   int id = 0;
   for (Element* e = cursor.First(); e; e = cursor.Next()) EXPECT_EQ(e->id, id++);
-  EXPECT_TRUE(id == 60 && !cursor.Next());
+  EXPECT_TRUE(id == 60 && !cursor.Next() && stack.Depth() == 60);
+  list.SetAt(new Element(60), 60);
+  EXPECT_EQ(cursor.Current()->id, 60) << "a cursor past the end stands where the list grows";
   for (; stack.Depth() > 30; delete stack.Pop()) EXPECT_EQ(stack.Top()->id, --id);
   stack.Clear();
-  EXPECT_EQ(Element::live, 63);
+  EXPECT_EQ(Element::live, 64);
 }
 
 TEST_F(Containers, TokenizerCutsAtDelimiters) {
@@ -107,7 +109,10 @@ TEST_F(Containers, ArrayAndFifoBehaveAsPlainLists) {
 }
 
 TEST_F(Containers, HashTableBehavesAsAMapAndDeletesWhatItOwns) {
-  EXPECT_EQ(HashBytes("Four score and seven years ago", 30, 0, false), 0x17770551u);
+  const char* const kText = "Four score and seven years ago";
+  EXPECT_EQ(HashBytes(kText, 30, 0, false), 0x17770551u);
+  for (u32 n = 0; n < 26; ++n)
+    EXPECT_EQ(HashBytes(kText, n, 0, false), HashBytes(Text(kText, n).c_str(), n, 0, false)) << n;
   EXPECT_EQ(HashBytes("FOUR SCORE A", 12, 42, true), HashBytes("four score a", 12, 42, false));
   FailAllocation(1);
   cHashTable<Element> none, table;

@@ -25,8 +25,10 @@ TEST_F(SystemText, LoadsResources) {
   String text("old");
   KeepModuleHandle(GetModuleHandleA(nullptr));
   EXPECT_EQ(Bytes(String(1u, "file", 3)), "file has 3 lines");
-  EXPECT_TRUE(String(2u).Length() == 1023 && String(77u).IsEmpty());
+  EXPECT_TRUE(String(2u).Length() == 1023 && String(77u).IsEmpty() && Bytes(String(3u)) == "x");
   EXPECT_STREQ(text.FormatResource(1, "file", 4), "file has 4 lines");
+  EXPECT_STREQ(text.FormatResource(3), "x");
+  EXPECT_TRUE(text.LoadResource(3) && text.Length() == 1 && Text(text.Text()) == "x");
   EXPECT_EQ(strlen(text.FormatResource(2)), 1024u);
   EXPECT_TRUE(text.LoadResource(2) && text.Length() == 1024 && TakeReports() == 0);
   EXPECT_TRUE(!text.LoadResource(77) && text.IsEmpty() && TakeReports(missing) == 1);
@@ -42,6 +44,10 @@ TEST_F(SystemText, NamesErrors) {
   SetLastError(ERROR_FILE_NOT_FOUND);
   EXPECT_TRUE(!last.FromLastError() && last.Equals(missing.Text(), true) && last.Length() > 5);
   EXPECT_TRUE(!last.FromError(unknown) && last.EndsWith("performing the operation request!", true));
+  String cut;
+  FailAllocation(2);  // the one for the longer text
+  EXPECT_TRUE(!cut.FromError(unknown) && FailAllocation(0));
+  EXPECT_STREQ(cut.Text(), "Unexpected, unknown error message!");
   SetLastError(0);
   EXPECT_TRUE(!last.FromLastError() && last.IsEmpty());
 }
@@ -118,7 +124,11 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
   const Text path = testing::TempDir() + "core-description.ini";
   Profile profile(path.c_str()), impossible("?:\\no\\x.ini");
   xScriptInfo defaults(true), info(false), again(false);
+  info.NoCase = true, info.SetDefaults();
+  EXPECT_FALSE(info.IsNoCase());
+  profile.WriteString("1", "Options", "NoCase");
   info.Read(profile, defaults);
+  EXPECT_TRUE(info.IsNoCase() && !defaults.IsNoCase());
   info.FixCRLF = true;
   EXPECT_TRUE(info.Write(profile) && !info.Write(impossible));
   again.Read(profile, xScriptInfo(false));
