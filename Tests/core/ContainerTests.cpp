@@ -17,6 +17,12 @@ TEST_F(Containers, ReportMisuseAndChangeNothing) {
   FIFO<Element> fifo(1);
   StringDZ list;
   array.SetOwnsElements(false), array.SetAt(&element, 0);
+  // As a host could leave it.
+  Array<Element> broken;
+  const auto breakCount = [&] {
+    *reinterpret_cast<i32*>(reinterpret_cast<char*>(&broken) + 8) = 1000;
+    return broken.Count() == 1000;
+  };
   fifo.SetOwnsElements(false), fifo.Push(&element);
   const std::tuple<int, const char*, std::function<bool()>> cases[] = {
       {2, "cArray",
@@ -24,6 +30,8 @@ TEST_F(Containers, ReportMisuseAndChangeNothing) {
       {0, "leak deteched", [&] { return array.Clear(), array.SetAt(&element, 0) == 0; }},
       {2, "cArray", [&] { return array.Grow(0), !array.Detach(1); }},
       {1, "cArray", [&] { return FailAllocation(1), array.Grow(1), true; }},
+      {2, "beyond capacity",
+       [&] { return breakCount() && (broken.Grow(1), broken.Clear(), broken.Count() == 0); }},
       {1, "cArray", [&] { return FailAllocation(1), Array<Element>().SetAt(none, 0) == 0; }},
       {1, "leak deteched", [&] { return array.SetAt(none, 0) == 0; }},
       {1, "leak deteched", [&] { return fifo.Push(&other); }},

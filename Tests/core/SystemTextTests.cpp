@@ -88,6 +88,27 @@ TEST_F(SystemText, Converts) {
   }
 }
 
+TEST_F(SystemText, StaysAsItWasWithoutMemory) {
+  static const std::wstring wide(100, L'x');
+  static const Text narrow(100, 'x');
+  using Change = void (*)(String&);
+  for (const Change change : std::initializer_list<Change>{
+           [](String& s) { s.FromWide(wide.c_str()); },
+           [](String& s) { s.FromUtf16ToUtf8(wide.c_str()); },
+           [](String& s) { s.FromUtf8ToUtf16(narrow.c_str()); },
+           [](String& s) { s.FromUtf8ToUtf16(s.Text()); },
+           [](String& s) { s.FromUtf16ToUtf8(reinterpret_cast<const wchar_t*>(s.Text()), 1); },
+           [](String& s) { s.FormatResource(2); },
+           [](String& s) { EXPECT_FALSE(s.LoadResource(2)); },
+       }) {
+    String text("abc");
+    FailAllocation(1), change(text);
+    EXPECT_TRUE(FailAllocation(0) && Bytes(text) == "abc");
+  }
+  FailAllocation(2);
+  EXPECT_STREQ(String(wide.c_str(), 1252).Text(), "");
+}
+
 TEST_F(SystemText, ReadsTheClipboard) {
   String text("old");
   ASSERT_TRUE(OpenClipboard(nullptr) && EmptyClipboard() && CloseClipboard());
