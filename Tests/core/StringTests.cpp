@@ -7,6 +7,11 @@ using Change = void (*)(String&);
 static const Text kLong(5000, 'x');
 static const char* const kNull = nullptr;
 
+// As a host could leave it.
+static void SetCapacity(String& s, u32 capacity) {
+  *reinterpret_cast<u32*>(reinterpret_cast<char*>(&s) + 16) = capacity;
+}
+
 // Of the result, a capacity of 0 is not looked at.
 struct Case {
   Text start;
@@ -42,6 +47,8 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"", [](String& s) { s.Format("%.4096s", kLong.c_str()); }, "%.4096s...."},
       {"", [](String& s) { s.Format(kLong.c_str(), 0); }, kLong.substr(0, 4086) + "...."},
       {"abc", [](String& s) { s.Append("x", -2), s.Reserve(0), s.SetAt(-1, 'x'); }, "abc", 8, 4, 3},
+      {"abc", [](String& s) { SetCapacity(s, 3), s.Append("x"), s.AppendChar('x'); }, "abc", 3, 4,
+       2},
       {"abc", [](String& s) { EXPECT_EQ(s.Compare(nullptr, true, false), 1); }, "abc", 8, 4, 1},
       {"abc", [](String& s) { s.SubtractFromChars('b'), s.AddToChars('b'); }, "abc", 8, 4, 1},
       {"abc", [](String& s) { s.Append("x", INT_MAX), s.SetAt(INT_MAX, 'x'); }, "abc", 8, 4},
