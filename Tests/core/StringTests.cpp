@@ -37,6 +37,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"abc", [](String& s) { s.SetPadChar(0), s.SetAt(5, 'x'), s.SetAt(5000, 'x'); }, "abc"},
       {"x", [](String& s) { s = String(kNull), s.Append("d", 3), s.Append("abc", 2); }, "d\0\0ab"s},
       {"\t  a b \xE9 \t", [](String& s) { s.Trim(); }, "a b \xE9"},
+      {" \ta ", [](String& s) { s.CollapseBlanks(); }, " a "},
       {"a \t b  \xE9\1", [](String& s) { s.CollapseBlanks(), s.RemoveControlChars(); }, "a b "},
       {"abca", [](String& s) { s.XorChars('a'), s.AddToChars(0xFF); }, "`\2\1`"},
       {"x", [](String& s) { s.FromLatin1ToUtf8("\xE9z\x80\xFF", 3); }, "\xC3\xA9z\xC2\x80"},

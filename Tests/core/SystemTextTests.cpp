@@ -107,6 +107,8 @@ TEST_F(SystemText, StaysAsItWasWithoutMemory) {
   }
   FailAllocation(2);
   EXPECT_STREQ(String(wide.c_str(), 1252).Text(), "");
+  FailAllocation(1);
+  EXPECT_STREQ(String(1u, "file", 3).Text(), "");
 }
 
 TEST_F(SystemText, ReadsTheClipboard) {
@@ -159,6 +161,7 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
     EXPECT_TRUE(profile.ReadString(value, "Options", "MacroBegin", "none", true));
     EXPECT_EQ(Bytes(value), expected) << "the key is removed by the first";
   }
+  EXPECT_FALSE(profile.ReadString(value, "Options", "Nothing", "", false));
   profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick");
   profile.ReadString(value, "Options", "Tick", "", false);
   EXPECT_EQ(value.Length(), 511u);

@@ -82,7 +82,11 @@ TEST_F(RunTest, MacroFiles) {
   const std::string locked = testFolder + "\\locked.rbs";
   WriteBytes(locked, "x");
   HANDLE lock = CreateFileA(locked.c_str(), GENERIC_READ, 0, nullptr, OPEN_EXISTING, 0, nullptr);
-  for (const std::string& path : {testFolder + "\\missing", testFolder, locked, ""s,
+  const std::string large = testFolder + "\\large.rbs";
+  HANDLE file = CreateFileA(large.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_NEW, 0, nullptr);
+  SetFilePointerEx(file, {{2, 1}}, nullptr, FILE_BEGIN);  // 4 GiB and two bytes
+  EXPECT_TRUE(SetEndOfFile(file) && CloseHandle(file));
+  for (const std::string& path : {testFolder + "\\missing", testFolder, locked, large, ""s,
                                   "C:\\" + std::string(5000, 'x'), "%s%n*?"s})
     Run(path);
   CloseHandle(lock);
