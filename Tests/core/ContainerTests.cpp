@@ -73,6 +73,7 @@ TEST_F(Containers, TokenizerCutsAtDelimiters) {
   for (const auto& [text, delimiters, keepEmpty, expected] : cases) {
     StringTokenizer tokenizer(text, delimiters);
     tokenizer.SetQuote('\'');
+    EXPECT_FALSE(tokenizer.FoundDelimiter() || tokenizer.LastDelimiter());
     Text tokens;
     while (tokenizer.NextToken(keepEmpty)) tokens += Bytes(tokenizer.Token()) + "|";
     EXPECT_EQ((tokens + tokenizer.LastDelimiter()).c_str(), expected) << text;
@@ -156,6 +157,22 @@ TEST_F(Containers, HashTableBehavesAsAMapAndDeletesWhatItOwns) {
         [](const char* each, u32) { delete reinterpret_cast<Element*>(walked->Remove(each)); });
     model.clear();
   }
+}
+
+TEST_F(Containers, HashTableIsWalkedBucketByBucketNewestFirst) {
+  const auto bucket = [](const Text& key) {
+    return HashBytes(key.c_str(), static_cast<u32>(key.size()), 42, true) % 0x10000 % 211;
+  };
+  cHashTable<Element> table;
+  table.SetOwnsElements(false);
+  for (u32 i = 1; i <= 500; ++i) table.Insert(std::to_string(i).c_str(), i);
+  std::multimap<u32, u32> expected;
+  for (u32 i = 500; i > 0; --i) expected.emplace(bucket(std::to_string(i)), i);
+  static std::vector<u32> walked;
+  table.Walk([](const char*, u32 value) { walked.push_back(value); });
+  ASSERT_EQ(walked.size(), 500u);
+  for (auto each = walked.begin(); const auto& [place, value] : expected)
+    EXPECT_EQ(*each++, value) << "in bucket " << place;
 }
 
 TEST_F(Containers, StringDZAndTokenizerKeepEveryText) {

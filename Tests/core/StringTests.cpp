@@ -26,6 +26,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"abc", [](String& s) { s = "1234567"; }, "1234567", 8, 4},
       {"abc", [](String& s) { s = "12345678"; }, "12345678", 13, 4},
       {"abc", [](String& s) { s = "1234567", s.Reserve(4); }, "1234567", 9, 8},
+      {"abc", [](String& s) { s = "1234567", s.Append("x", 0), s.Append(kNull); }, "1234567", 8, 4},
       {"abc", [](String& s) { s.EmptyReserve(3), s.EmptyReserve(4); }, "", 9, 4},
       {"abc", [](String& s) { s.Append("d"); }, "abcd", 15, 8},
       {"abc", [](String& s) { s.Insert("123", 0), s.InsertChar('x', 0); }, "x123abc", 15, 8},
@@ -52,6 +53,8 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
        2},
       {"abc", [](String& s) { EXPECT_EQ(s.Compare(nullptr, true, false), 1); }, "abc", 8, 4, 1},
       {"abc", [](String& s) { s.SubtractFromChars('b'), s.AddToChars('b'); }, "abc", 8, 4, 1},
+      {"\x81", [](String& s) { s.SubtractFromChars(1); }, "\x80", 6, 4, 1},
+      {"\x80", [](String& s) { s.SubtractFromChars(1); }, "\x7F", 6, 4},
       {"abc", [](String& s) { s.Append("x", INT_MAX), s.SetAt(INT_MAX, 'x'); }, "abc", 8, 4},
       {"abc", [](String& s) { s.FromLatin1ToUtf8("x", INT_MAX), s.Reserve(UINT_MAX); }, "abc", 8,
        4},
@@ -67,7 +70,10 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
     EXPECT_EQ(static_cast<u32>(TakeReports("\"cString\" (")), reports);
   }
   String large('x', 1995), string("abc");
-  EXPECT_TRUE(large.Reserve(3000) && large.Capacity() == 3906) << "a third more above a kilobyte";
+  for (u32 n = 3000; n < 3010; ++n) {
+    String grown(large);
+    EXPECT_TRUE(grown.Reserve(n) && grown.Capacity() == (n + 5) * 13 / 10) << "above a kilobyte";
+  }
   memset(&string.At(0), '#', 8);
   string = "a", string.Append("b");
   EXPECT_EQ(Text(string.Text(), 6), "ab\0\0\0#"s) << "zero bytes behind an appended text";

@@ -28,6 +28,14 @@ static bool Fill(unsigned size = 392, unsigned layout = 77, unsigned bytes = 392
   return filled;
 }
 
+// With the DLL in a file whose full name is that long.
+static void FillByFileOf(size_t length) {
+  const size_t rest = length - testFolder.size() - strlen("\\\\scriptruby.dll");
+  const HMODULE other = LoadModule(testFolder + "\\" + std::string(rest, 'd'));
+  Fill(392, 77, 392, "", other);
+  FreeLibrary(other);
+}
+
 TEST_F(VersionTest, HeadersAndHostFolders) {
   // The record ends right behind its header and a name without terminator.
   for (unsigned size = 0; size <= 1024; size += size < 390 || size > 394 ? 13 : 1) {
@@ -52,6 +60,7 @@ TEST_F(VersionTest, HeadersAndHostFolders) {
 
 TEST_F(VersionTest, DescriptionFiles) {
   const std::string x600(600, 'x'), x75(75, 'x');
+  FillByFileOf(254);  // 255 are too many, and reported
   fs::remove(testFolder + "\\xMacroWSH.qwsh");
   Fill();
   for (const std::string& lines :
@@ -67,6 +76,7 @@ TEST_F(VersionTest, DescriptionFiles) {
 }
 
 TEST_F(VersionTest, DuringARunTheRunningEngineAnswers) {
+  FillByFileOf(255);
   Script([&] {
     Describe("Language=Changed");
     Fill();  // as the description was read for the run
