@@ -99,6 +99,9 @@ static void Permit(const std::string& folder, const std::string& rights) {
 TEST_F(VersionTest, AFolderThatMayNotBeWritten) {
   const fs::path product = fs::path(std::getenv("LOCALAPPDATA")) / "Programs" / "Tarn";
   const std::string folder = testFolder + "\\readonly";
+  // The user's folder is for one process at a time.
+  const HANDLE turn = CreateMutexA(nullptr, FALSE, "scriptruby-tests");
+  WaitForSingleObject(turn, 60000);
   fs::remove_all(product);
   const HMODULE other = LoadModule(folder);
   WriteBytes(folder + "\\xMacroWSH.qwsh", "[Options]\r\nLanguage=Ignored\r\n");
@@ -110,4 +113,5 @@ TEST_F(VersionTest, AFolderThatMayNotBeWritten) {
   Permit(folder, "FA");
   FreeLibrary(other);
   fs::remove_all(product);
+  ReleaseMutex(turn), CloseHandle(turn);
 }
