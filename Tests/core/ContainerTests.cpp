@@ -19,9 +19,12 @@ TEST_F(Containers, ReportMisuseAndChangeNothing) {
   array.SetOwnsElements(false), array.SetAt(&element, 0);
   // As a host could leave it.
   Array<Element> broken;
-  const auto breakCount = [&] {
-    *reinterpret_cast<i32*>(reinterpret_cast<char*>(&broken) + 8) = 1000;
-    return broken.Count() == 1000;
+  const auto breakCount = [&](i32 count) {
+    *reinterpret_cast<i32*>(reinterpret_cast<char*>(&broken) + 8) = count;
+    return broken.Count() == count;
+  };
+  const auto firstSlot = [&](Array<Element>&& empty) {
+    return empty.SetAt(none, 0) == 0 ? empty.Capacity() : 0;
   };
   fifo.SetOwnsElements(false), fifo.Push(&element);
   const std::tuple<int, const char*, std::function<bool()>> cases[] = {
@@ -30,9 +33,11 @@ TEST_F(Containers, ReportMisuseAndChangeNothing) {
       {0, "leak deteched", [&] { return array.Clear(), array.SetAt(&element, 0) == 0; }},
       {2, "cArray", [&] { return array.Grow(0), !array.Detach(1); }},
       {1, "cArray", [&] { return FailAllocation(1), array.Grow(1), true; }},
+      {1, "beyond capacity",
+       [&] { return breakCount(51) && (broken.Grow(1), broken.Clear(), broken.Count() == 0); }},
       {2, "beyond capacity",
-       [&] { return breakCount() && (broken.Grow(1), broken.Clear(), broken.Count() == 0); }},
-      {1, "cArray", [&] { return FailAllocation(1), Array<Element>().SetAt(none, 0) == 0; }},
+       [&] { return breakCount(1000) && (broken.Grow(1), broken.Clear(), broken.Count() == 0); }},
+      {1, "cArray", [&] { return FailAllocation(1), firstSlot(Array<Element>()) == 1; }},
       {1, "leak deteched", [&] { return array.SetAt(none, 0) == 0; }},
       {1, "leak deteched", [&] { return fifo.Push(&other); }},
       {2, "cFilo", [&] { return !fifo.SetAt(none, 1) && fifo.SetAt(none, 0) && fifo.Push(none); }},
