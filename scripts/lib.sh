@@ -119,10 +119,11 @@ set_up() {
   fi
 }
 
-# Keeps Wine's server for a minute after its last program: starting it takes longer than a macro does.
+# start_wine [SECONDS]: keeps Wine's server that long after its last program (60), since starting it
+# takes longer than a macro does.
 # The first program starts Wine's services, which keep its output open: that must be no caller's pipe.
 start_wine() {
-  wineserver -p60 >/dev/null 2>&1 </dev/null || true # it is running already
+  wineserver -p"${1:-60}" >/dev/null 2>&1 </dev/null || true # it is running already
   wine cmd /c exit >/dev/null 2>&1 </dev/null || true
 }
 
