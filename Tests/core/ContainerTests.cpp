@@ -182,6 +182,7 @@ TEST_F(Containers, HashTableIsWalkedBucketByBucketNewestFirst) {
 
 TEST_F(Containers, StringDZAndTokenizerKeepEveryText) {
   StringDZ real;
+  EXPECT_EQ(*reinterpret_cast<u32*>(reinterpret_cast<char*>(&real) + 4), 170u) << "its mark";
   Text joined;
   for (int step = 0; step < 100000 && !HasFailure(); ++step) {
     const Text text = step == 7 ? Text(5000, 'x') : Word(20);

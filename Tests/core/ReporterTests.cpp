@@ -4,6 +4,7 @@
 #include <sstream>
 
 #include "TestSupport.h"
+#include "cLib/cCompat.h"
 #include "cLib/cReport.h"
 
 class Reporter : public CoreTest {
@@ -58,4 +59,7 @@ TEST_F(Reporter, WritesLinesWhereItIsToldAndNeverCallsTheHookFromWithin) {
   testing::internal::CaptureStdout();
   WriteStdout("a\n%s"), WriteStdout(nullptr);
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "a\n%s");
+#if defined(_WIN32)
+  EXPECT_EQ(_setmode(1, _O_TEXT), _O_TEXT) << "as it was";
+#endif
 }

@@ -30,6 +30,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"abc", [](String& s) { s.EmptyReserve(3), s.EmptyReserve(4); }, "", 9, 4},
       {"abc", [](String& s) { s.Append("d"); }, "abcd", 15, 8},
       {"abc", [](String& s) { s.Insert("123", 0), s.InsertChar('x', 0); }, "x123abc", 15, 8},
+      {"abc", [](String& s) { s = "12345", s.InsertChar('x', 0); }, "x12345", 8, 4},
       {"abc", [](String& s) { s.Insert("12345", 0); }, "12345abc", 19, 8},
       {"abc", [](String& s) { s.Insert("123", 0), FailAllocation(1), s.SetAt(6, 'x'); }, "123abc"},
       {"abc", [](String& s) { s.Format("%04d", 1); }, "0001", 10, 4},
@@ -41,7 +42,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {" \ta ", [](String& s) { s.CollapseBlanks(); }, " a "},
       {"a \t b  \xE9\1", [](String& s) { s.CollapseBlanks(), s.RemoveControlChars(); }, "a b "},
       {"abca", [](String& s) { s.XorChars('a'), s.AddToChars(0xFF); }, "`\2\1`"},
-      {"x", [](String& s) { s.FromLatin1ToUtf8("\xE9z\x80\xFF", 3); }, "\xC3\xA9z\xC2\x80"},
+      {"x", [](String& s) { s.FromLatin1ToUtf8("\xE9\x7F\x80\xFF", 3); }, "\xC3\xA9\x7F\xC2\x80"},
       {"abcd", [](String& s) { s = s.Mid(1, UINT_MAX) + s.MidFrom(3).Text(); }, "bcdd"},
       {"abc", [](String& s) { s.Format("%s", ""); }, "", 8, 4},
       {"%s", [](String& s) { s.Format(s.Text(), kLong.c_str()); }, "%s...."},
@@ -69,11 +70,12 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
     if (capacity) EXPECT_TRUE(string.Capacity() == capacity && string.GrowBy() == growBy) << text;
     EXPECT_EQ(static_cast<u32>(TakeReports("\"cString\" (")), reports);
   }
-  String large('x', 1995), string("abc");
+  String large('x', 1995), all('b', 40000), string("abc");
   for (u32 n = 3000; n < 3010; ++n) {
     String grown(large);
     EXPECT_TRUE(grown.Reserve(n) && grown.Capacity() == (n + 5) * 13 / 10) << "above a kilobyte";
   }
+  EXPECT_TRUE(all.ReplaceAll("b", "x") == 40000 && all.Capacity() == (80001 + 5) * 13 / 10);
   memset(&string.At(0), '#', 8);
   string = "a", string.Append("b");
   EXPECT_EQ(Text(string.Text(), 6), "ab\0\0\0#"s) << "zero bytes behind an appended text";
@@ -81,6 +83,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
   large.FromLatin1ToUtf8("a");
   EXPECT_EQ(Text(large.Text(), 4), "a\0\0#"s) << "likewise behind a converted one";
   for (int i = 0; i < 14; ++i, string.Reserve(1)) EXPECT_EQ(string.GrowBy(), 4u << std::min(i, 13));
+  EXPECT_TRUE(string.Reserve(string.Capacity()) && Text(string.Text(), 5) == "ab\0\0\0"s);
 }
 
 TEST_F(StringTest, ComparesAndSearches) {
@@ -97,7 +100,8 @@ TEST_F(StringTest, ComparesAndSearches) {
   EXPECT_TRUE(high.Compare(&upper, true, false) == 1 && String("abcd").Compare(&upper, 0, 1) == 0);
   EXPECT_TRUE(upper.EndsWith("bc", false) && !upper.Equals("abc", true) && !upper.Equals("AB", 1));
   EXPECT_TRUE(String(" \tx").FirstNonBlank(2) == 2 && String(" \tx").FirstNonBlank(1) == -1);
-  EXPECT_TRUE(upper.IsAlpha() && !String().IsAlpha() && high.HasHighBit() && !upper.HasHighBit());
+  EXPECT_TRUE(upper.IsAlpha() && !String().IsAlpha() && !String("1a").IsAlpha());
+  EXPECT_TRUE(!String("a1").IsAlpha() && high.HasHighBit() && !upper.HasHighBit());
 }
 
 // --- Random operations compared with std::string -------------------------------------------------

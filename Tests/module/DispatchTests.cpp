@@ -125,7 +125,7 @@ TEST_F(DispatchTest, NumbersAsText) {
         const int bits = static_cast<int>(random());
         compare(Value(VT_I4, bits >> i % 32));
         // Decimals, ties at the seventh place and their neighbours, and any bits at all.
-        const double decimal = bits / 2e7, tie = (bits | 1) / 128e6 + bits % 1000;
+        const double decimal = bits / 2e7, tie = (bits | 1) / 2e6 + bits % 1000;
         compare(Value(VT_R8, decimal));
         compare(Value(VT_R8, std::ldexp(bits, -7 - i % 30)));
         for (double each : {tie, std::nextafter(tie, 1e9), std::nextafter(tie, -1e9)})
@@ -160,6 +160,14 @@ TEST_F(DispatchTest, TheObject) {
     const auto invoke = [&](DISPID id, REFIID riid) {
       return tarn->Invoke(id, riid, 0, DISPATCH_PROPERTYPUT, nullptr, nullptr, nullptr, nullptr);
     };
+    auto* const end =
+        static_cast<VARIANT*>(VirtualAlloc(nullptr, 8192, MEM_RESERVE, PAGE_NOACCESS)) +
+        4096 / sizeof(VARIANT);
+    VirtualAlloc(end - 1, sizeof *end, MEM_COMMIT, PAGE_READWRITE);
+    end[-1] = Value(VT_I4, 1);
+    DISPPARAMS last = {end - 1, nullptr, 1, 0};
+    Answers("Invoke at the end of readable memory",
+            {tarn->Invoke(7, IID_NULL, 0, DISPATCH_METHOD, &last, nullptr, nullptr, nullptr)});
     Answers("Invoke", {invoke(7, IID_IUnknown), invoke(-4, IID_NULL), invoke(1999, IID_NULL)});
     UINT count = 99;
     ITypeInfo* type = nullptr;

@@ -6,6 +6,16 @@
 
 using FaultTest = ModuleTest;
 
+// The page that tells this thread's next overflow is gone after one, until it is made anew.
+static bool HasGuardPage() {
+  MEMORY_BASIC_INFORMATION part;
+  VirtualQuery(&part, &part, sizeof part);
+  for (auto* at = static_cast<char*>(part.AllocationBase); at < reinterpret_cast<char*>(&part);
+       at += part.RegionSize)
+    if (VirtualQuery(at, &part, sizeof part) && (part.Protect & PAGE_GUARD)) return true;
+  return false;
+}
+
 // A stop is among them: it leaves as much behind, and must stay possible as often.
 TEST_F(FaultTest, EveryKindInTheHostAndInTheEngine) {
   std::vector<std::pair<const char*, std::function<void()>>> faults(kFaults.begin(), kFaults.end());
@@ -20,6 +30,7 @@ TEST_F(FaultTest, EveryKindInTheHostAndInTheEngine) {
         on["engine: SetScriptState 2"] = [&] { inHost || !i ? script() : fault(); };
         on["call 7"] = [&] { host.AnswerTexts({"text"}), i ? fault() : void(); };
         ASSERT_EQ(i ? -1 : 1, Run()) << i;
+        ASSERT_TRUE(HasGuardPage()) << kind;
       }
     }
 }

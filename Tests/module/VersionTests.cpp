@@ -103,7 +103,9 @@ TEST_F(VersionTest, AFolderThatMayNotBeWritten) {
   const HANDLE turn = CreateMutexA(nullptr, FALSE, "scriptruby-tests");
   WaitForSingleObject(turn, 60000);
   fs::remove_all(product);
+  SetErrorMode(0);
   const HMODULE other = LoadModule(folder);
+  EXPECT_EQ(SEM_FAILCRITICALERRORS | SEM_NOOPENFILEERRORBOX, GetErrorMode()) << "no system boxes";
   WriteBytes(folder + "\\xMacroWSH.qwsh", "[Options]\r\nLanguage=Ignored\r\n");
   Permit(folder, "FRFX");
   Fill(392, 77, 392, folder, other);
