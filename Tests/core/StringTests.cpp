@@ -30,6 +30,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"abc", [](String& s) { s.EmptyReserve(3), s.EmptyReserve(4); }, "", 9, 4},
       {"abc", [](String& s) { s.Append("d"); }, "abcd", 15, 8},
       {"abc", [](String& s) { s.Insert("123", 0), s.InsertChar('x', 0); }, "x123abc", 15, 8},
+      {"abcdefg", [](String& s) { s = "a", s = s.MidFrom(2); }, ""},
       {"abc", [](String& s) { s = "12345", s.InsertChar('x', 0); }, "x12345", 8, 4},
       {"abc", [](String& s) { s.Insert("12345", 0); }, "12345abc", 19, 8},
       {"abc", [](String& s) { s.Insert("123", 0), FailAllocation(1), s.SetAt(6, 'x'); }, "123abc"},
@@ -49,7 +50,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"", [](String& s) { s.Format("%.4095s", kLong.c_str()); }, kLong.substr(0, 4095)},
       {"", [](String& s) { s.Format("%.4096s", kLong.c_str()); }, "%.4096s...."},
       {"", [](String& s) { s.Format(kLong.c_str(), 0); }, kLong.substr(0, 4086) + "...."},
-      {"abc", [](String& s) { s.Append("x", -2), s.Reserve(0), s.SetAt(-1, 'x'); }, "abc", 8, 4, 3},
+      {"abc", [](String& s) { s.Append("x", -2), s.SetAt(-1, s.Reserve(0)); }, "abc", 8, 4, 3},
       {"abc", [](String& s) { SetCapacity(s, 3), s.Append("x"), s.AppendChar('x'); }, "abc", 3, 4,
        2},
       {"abc", [](String& s) { EXPECT_EQ(s.Compare(nullptr, true, false), 1); }, "abc", 8, 4, 1},
@@ -101,7 +102,7 @@ TEST_F(StringTest, ComparesAndSearches) {
   EXPECT_TRUE(upper.EndsWith("bc", false) && !upper.Equals("abc", true) && !upper.Equals("AB", 1));
   EXPECT_TRUE(String(" \tx").FirstNonBlank(2) == 2 && String(" \tx").FirstNonBlank(1) == -1);
   EXPECT_TRUE(upper.IsAlpha() && !String().IsAlpha() && !String("1a").IsAlpha());
-  EXPECT_TRUE(!String("a1").IsAlpha() && high.HasHighBit() && !upper.HasHighBit());
+  EXPECT_TRUE(!String("a1").IsAlpha() && String("\x80").HasHighBit() && high.HasHighBit() && !upper.HasHighBit());
 }
 
 // --- Random operations compared with std::string -------------------------------------------------
