@@ -43,6 +43,7 @@ TEST_F(Containers, ReportMisuseAndChangeNothing) {
       {2, "cFilo", [&] { return !fifo.SetAt(none, 1) && fifo.SetAt(none, 0) && fifo.Push(none); }},
       {1, "cFilo", [&] { return !FIFO<Element>(INT_MAX).Push(&element); }},
       {2, "cString", [&] { return list.Add(nullptr, false), !list.Value(0); }},
+      {1, "cString", [&] { return FailAllocation(2), list.Add("x", true), list.Count() == 0; }},
   };
   for (const auto& [count, report, holds] : cases) {
     EXPECT_TRUE(holds() && array.Count() == 1 && array.Capacity() == 50) << report;
