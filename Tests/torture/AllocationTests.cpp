@@ -34,6 +34,7 @@ class AllocationTest : public TortureTest {
 TEST_F(AllocationTest, OfARunInTheModule) {
   // Every kind of argument, a list that has to grow, a text result, reports of errors.
   on["engine: SetScriptState 2"] = [&] {
+    EXPECT_TRUE(source == L"\n") << "not the macro file's text";
     const VARIANT values[] = {Value(VT_I4, 1), Value(VT_R8, 2.5), Value(VT_BOOL, 1),
                               Value(VT_BSTR, SysAllocString(L"text"))};
     Call(L"f", {values, values + 4});

@@ -27,7 +27,10 @@ void* Gave(void* block) {
   return block;
 }
 
-void* Malloc(size_t bytes) { return Fails() ? nullptr : Took(malloc(bytes)); }
+// A new block is full of something, so that nobody can count on zeros.
+void* Filled(void* block, size_t bytes) { return Took(block ? memset(block, 0xCD, bytes) : block); }
+
+void* Malloc(size_t bytes) { return Fails() ? nullptr : Filled(malloc(bytes), bytes); }
 void* Calloc(size_t count, size_t bytes) { return Fails() ? nullptr : Took(calloc(count, bytes)); }
 void* Realloc(void* block, size_t bytes) {
   if (Fails()) return nullptr;
@@ -35,7 +38,9 @@ void* Realloc(void* block, size_t bytes) {
 }
 void Free(void* block) { free(Gave(block)); }
 
-LPVOID WINAPI TaskAlloc(SIZE_T bytes) { return Fails() ? nullptr : Took(CoTaskMemAlloc(bytes)); }
+LPVOID WINAPI TaskAlloc(SIZE_T bytes) {
+  return Fails() ? nullptr : Filled(CoTaskMemAlloc(bytes), bytes);
+}
 void WINAPI TaskFree(LPVOID block) { CoTaskMemFree(Gave(block)); }
 
 BSTR WINAPI AllocString(const OLECHAR* text) { return Fails() ? nullptr : SysAllocString(text); }
