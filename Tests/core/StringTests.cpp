@@ -31,6 +31,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"abc", [](String& s) { s.Append("d"); }, "abcd", 15, 8},
       {"abc", [](String& s) { s.Insert("123", 0), s.InsertChar('x', 0); }, "x123abc", 15, 8},
       {"abcdefg", [](String& s) { s = "a", s = s.MidFrom(2); }, ""},
+      {"abc", [](String& s) { s = "12345", s.AppendChar('x'); }, "12345x", 8, 4},
       {"abc", [](String& s) { s = "12345", s.InsertChar('x', 0); }, "x12345", 8, 4},
       {"abc", [](String& s) { s.Insert("12345", 0); }, "12345abc", 19, 8},
       {"abc", [](String& s) { s.Insert("123", 0), FailAllocation(1), s.SetAt(6, 'x'); }, "123abc"},
@@ -83,6 +84,9 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
   memset(&large.At(0), '#', 8);
   large.FromLatin1ToUtf8("a");
   EXPECT_EQ(Text(large.Text(), 4), "a\0\0#"s) << "likewise behind a converted one";
+  EXPECT_TRUE(AddSizes(UINT_MAX - 1, 1) == UINT_MAX && AddSizes(UINT_MAX, 2) == UINT_MAX);
+  EXPECT_TRUE(MultiplySizes(INT_MAX, 2) == UINT_MAX - 1 && MultiplySizes(3, 1u << 31) == UINT_MAX);
+  EXPECT_EQ(MultiplySizes(3, 0), 0u);
   for (int i = 0; i < 14; ++i, string.Reserve(1)) EXPECT_EQ(string.GrowBy(), 4u << std::min(i, 13));
   EXPECT_TRUE(string.Reserve(string.Capacity()) && Text(string.Text(), 5) == "ab\0\0\0"s);
 }
@@ -97,12 +101,15 @@ TEST_F(StringTest, ComparesAndSearches) {
   const String banana("banana"), upper("ABC"), high("a\xE9");
   EXPECT_TRUE(banana.CountChar('b') == 1 && banana.CountChar('a') == 3);
   EXPECT_TRUE(banana.FindReverse("ANA", 3, false) == 3 && banana.FindReverse("a", 6, true) == -1);
+  EXPECT_TRUE(upper.FindReverse("ABCD", 0, true) == -1 && upper.FindReverse("", 0, true) == -1);
+  EXPECT_TRUE(upper.FindReverse("A", -1, true) == -1 && upper.FindReverse("ABC", 0, true) == 0);
   EXPECT_TRUE(high.Hash(1000003, false) == 97 * 4 - 23 * 2 && upper.Hash(9973, false) == 1366);
   EXPECT_TRUE(high.Compare(&upper, true, false) == 1 && String("abcd").Compare(&upper, 0, 1) == 0);
   EXPECT_TRUE(upper.EndsWith("bc", false) && !upper.Equals("abc", true) && !upper.Equals("AB", 1));
   EXPECT_TRUE(String(" \tx").FirstNonBlank(2) == 2 && String(" \tx").FirstNonBlank(1) == -1);
   EXPECT_TRUE(upper.IsAlpha() && !String().IsAlpha() && !String("1a").IsAlpha());
-  EXPECT_TRUE(!String("a1").IsAlpha() && String("\x80").HasHighBit() && high.HasHighBit() && !upper.HasHighBit());
+  EXPECT_TRUE(!String("a1").IsAlpha() && String("\x80").HasHighBit() && high.HasHighBit() &&
+              !upper.HasHighBit());
 }
 
 // --- Random operations compared with std::string -------------------------------------------------

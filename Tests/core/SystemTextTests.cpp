@@ -65,6 +65,9 @@ TEST_F(SystemText, Converts) {
     EXPECT_TRUE(text.Length() == wide.size() * 2 && units == wide);
     text.FromUtf16ToUtf8(units);
   }
+  String own("abc");
+  own = "1234567", own.FromUtf8ToUtf16(own.Text() + 1, 1000);
+  EXPECT_EQ(own.Length(), 14u) << "up to the end of its block";
   String utf8, narrow, utf16;
   utf8.FromUtf16ToUtf8(L"ab"), narrow.FromWide(L"ab"), utf16.FromUtf8ToUtf16("ab");
   EXPECT_TRUE(utf8.Capacity() == 29 && narrow.Capacity() == 18 && utf16.Capacity() == 211);
@@ -130,6 +133,8 @@ TEST_F(SystemText, ReadsTheClipboard) {
 // --- The application and the description file ----------------------------------------------------
 
 TEST_F(SystemText, AsksAboutFailedChecks) {
+  for (const bool runs : {true, false})
+    EXPECT_EQ((SetRunsInApplication(runs), RunsInApplication()), runs);
   Text boxes;
   onBox = [&](const Text& box) {
     boxes += box + "\n";
@@ -154,7 +159,8 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
   Profile profile(path.c_str()), impossible("?:\\no\\x.ini");
   xScriptInfo defaults(true), info(false), again(false);
   info.NoCase = true, info.SetDefaults();
-  EXPECT_FALSE(info.IsNoCase() || again.IsNoCase());
+  EXPECT_FALSE(info.IsNoCase() || again.IsNoCase() || again.IsFixCRLF() || again.IsFixDelimiter());
+  EXPECT_TRUE(!again.OpenBracket && !again.CloseBracket);
   profile.WriteString("1", "Options", "NoCase");
   info.Read(profile, defaults);
   EXPECT_TRUE(info.IsNoCase() && !defaults.IsNoCase());
@@ -187,8 +193,8 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
 // Sections of entries that are put together at random, in each encoding: read in one pass they have
 // what the profile functions read key by key. With SCRIPTRUBY_TORTURE=1 many of them.
 TEST_F(SystemText, ReadsASectionAsTheProfileFunctionsDo) {
-  const std::vector<Text> keys = {"Tick", "tICK", "Tic",  "Ticks", "Fix",
-                                  "T",  "AZ",   "az",   "\xC4", "T\xC9k"};
+  const std::vector<Text> keys = {"Tick", "tICK", "Tic", "Ticks", "Fix",
+                                  "T",    "AZ",   "az",  "\xC4",  "T\xC9k"};
   const std::vector<Text> pieces = {
       "\"", "'", "\"a\"", " ",  "  ",   "\t",   "=", ";", "x",     "0",           "1",
       "-1", "7", "\\n",   "00", "\x80", "\xE9", "]", "[", "Tick=", "12345678901", "yes"};
