@@ -71,7 +71,8 @@ TEST_F(VersionTest, DescriptionFiles) {
         "CRLF=\\\\n\r\nEnter=\\t\r\nTick=\\n\r\nLineFeed=\r\nQuote=\"q\""s,
         "MacroBegin=" + x75 + "y\r\nQuote=" + x75 + "\r\nFunctionPrint=" + x75,
         "MacroBegin=" + x75 + "\r\nExtension=" + x75 + "\r\nMacroEnd=" + x600 +
-            "\r\nFunctionPrefix=" + x75 + "\r\nFunctionPostfix=" + x600})
+            "\r\nFunctionPrefix=" + x75 + "\r\nFunctionPostfix=" + x600,
+        "MacroEnd=" + std::string(511, 'y')})
     Describe(lines), Fill();
 }
 
