@@ -7,8 +7,9 @@
 #include <functional>
 #include <string>
 
-// Called with what the open box shows; No, or OK, is its answer.
+// Called with what the open box shows.
 inline std::function<void(const std::string& box)> onBox;
+inline int boxAnswer = IDNO;
 
 inline void CALLBACK AnswerBox(HWND, UINT, UINT_PTR, DWORD) {
   const HWND box = GetActiveWindow(), icon = FindWindowExA(box, nullptr, "Static", nullptr);
@@ -18,6 +19,6 @@ inline void CALLBACK AnswerBox(HWND, UINT, UINT_PTR, DWORD) {
   GetWindowTextA(box, caption, sizeof caption);
   onBox((SendMessageA(icon, STM_GETICON, 0, 0) == stop ? "stop box " : "box ") +
         std::string(caption) + ": " + text);
-  EndDialog(box, IDNO);
+  EndDialog(box, boxAnswer);
 }
 inline const UINT_PTR boxTimer = SetTimer(nullptr, 0, 1, AnswerBox);

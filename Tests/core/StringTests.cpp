@@ -31,6 +31,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"abc", [](String& s) { s.Append("d"); }, "abcd", 15, 8},
       {"abc", [](String& s) { s.Insert("123", 0), s.InsertChar('x', 0); }, "x123abc", 15, 8},
       {"abcdefg", [](String& s) { s = "a", s = s.MidFrom(2); }, ""},
+      {"abc", [](String& s) { s = s.MidFrom(0) + s.MidFrom(-1).Text(); }, "abc"},
       {"abc", [](String& s) { s = "12345", s.AppendChar('x'); }, "12345x", 8, 4},
       {"abc", [](String& s) { s = "12345", s.InsertChar('x', 0); }, "x12345", 8, 4},
       {"abc", [](String& s) { s.Insert("12345", 0); }, "12345abc", 19, 8},

@@ -75,6 +75,7 @@ TEST_F(SystemText, Converts) {
   EXPECT_TRUE(text.Length() == 104 && text.Text()[0] == 0 && text.Text()[1] == 0);
   for (const auto& [none, n] : {std::pair("abc", 0), {"abc", -2}, {nullptr, 5}})
     EXPECT_TRUE((text = "old", text.FromUtf8ToUtf16(none, n), text.IsEmpty()));
+  EXPECT_TRUE((text = "old", text.FromWide(L"abc", -2), text.IsEmpty()));
   for (const u32 n : {4095u, 4096u})
     EXPECT_EQ(String(std::wstring(n, 'x').c_str(), 1252).Length(), n == 4095 ? n : 0);
   EXPECT_EQ(ActiveCodePage(), kUtf8CodePage);
@@ -132,6 +133,14 @@ TEST_F(SystemText, ReadsTheClipboard) {
 
 // --- The application and the description file ----------------------------------------------------
 
+static int breaks = 0;
+static LONG CALLBACK SkipBreak(EXCEPTION_POINTERS* fault) {
+  if (fault->ExceptionRecord->ExceptionCode != EXCEPTION_BREAKPOINT)
+    return EXCEPTION_CONTINUE_SEARCH;
+  ++breaks, ++fault->ContextRecord->Eip;
+  return EXCEPTION_CONTINUE_EXECUTION;
+}
+
 TEST_F(SystemText, AsksAboutFailedChecks) {
   for (const bool runs : {true, false})
     EXPECT_EQ((SetRunsInApplication(runs), RunsInApplication()), runs);
@@ -152,14 +161,21 @@ TEST_F(SystemText, AsksAboutFailedChecks) {
                        "box Assertion Failed: ASSERT: File b.cpp, Line 8" + question +
                        "stop box Exception: " + failure + "\n");
   EXPECT_EQ(TakeReports("\"b.cpp\" (8)      " + failure), 1);
+  boxAnswer = IDYES;
+  void* const debugger = AddVectoredExceptionHandler(1, SkipBreak);
+  VerifyMainApplication(nullptr, "c.cpp", 9);
+  RemoveVectoredExceptionHandler(debugger);
+  boxAnswer = IDNO;
+  EXPECT_EQ(breaks, 1);
 }
 
 TEST_F(SystemText, WritesAndReadsTheDescription) {
   const Text path = testing::TempDir() + "core-description.ini";
   Profile profile(path.c_str()), impossible("?:\\no\\x.ini");
   xScriptInfo defaults(true), info(false), again(false);
-  info.NoCase = true, info.SetDefaults();
-  EXPECT_FALSE(info.IsNoCase() || again.IsNoCase() || again.IsFixCRLF() || again.IsFixDelimiter());
+  info.NoCase = info.FixCRLF = info.FixDelimiter = true, info.SetDefaults();
+  EXPECT_FALSE(info.IsNoCase() || info.IsFixCRLF() || info.IsFixDelimiter());
+  EXPECT_FALSE(again.IsNoCase() || again.IsFixCRLF() || again.IsFixDelimiter());
   EXPECT_TRUE(!again.OpenBracket && !again.CloseBracket);
   profile.WriteString("1", "Options", "NoCase");
   info.Read(profile, defaults);
