@@ -43,6 +43,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"x", [](String& s) { s = String(kNull), s.Append("d", 3), s.Append("abc", 2); }, "d\0\0ab"s},
       {"\t  a b \xE9 \t", [](String& s) { s.Trim(); }, "a b \xE9"},
       {" \ta ", [](String& s) { s.CollapseBlanks(); }, " a "},
+      {"\1a\2\1b", [](String& s) { s.RemoveControlChars(); }, "ab"},
       {"a \t b  \xE9\1", [](String& s) { s.CollapseBlanks(), s.RemoveControlChars(); }, "a b "},
       {"abca", [](String& s) { s.XorChars('a'), s.AddToChars(0xFF); }, "`\2\1`"},
       {"x", [](String& s) { s.FromLatin1ToUtf8("\xE9\x7F\x80\xFF", 3); }, "\xC3\xA9\x7F\xC2\x80"},
@@ -102,6 +103,10 @@ TEST_F(StringTest, ComparesAndSearches) {
   const String banana("banana"), upper("ABC"), high("a\xE9");
   EXPECT_TRUE(banana.CountChar('b') == 1 && banana.CountChar('a') == 3);
   EXPECT_TRUE(banana.FindReverse("ANA", 3, false) == 3 && banana.FindReverse("a", 6, true) == -1);
+  const String more("ABCD");
+  EXPECT_TRUE(upper.Compare(&upper, true, false) == 0 && more.Compare(&upper, true, true) == 0);
+  EXPECT_TRUE(more.Compare(&upper, true, false) == 1 && upper.Compare(&more, true, true) == -1);
+  EXPECT_TRUE(String("abc").SetAt(-1, 'x') == 0 && String("abc").SetAt(-1, 'x') == 0);
   EXPECT_TRUE(upper.FindReverse("ABCD", 0, true) == -1 && upper.FindReverse("", 0, true) == -1);
   EXPECT_TRUE(upper.FindReverse("A", -1, true) == -1 && upper.FindReverse("ABC", 0, true) == 0);
   EXPECT_TRUE(high.Hash(1000003, false) == 97 * 4 - 23 * 2 && upper.Hash(9973, false) == 1366);
