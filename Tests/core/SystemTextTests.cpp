@@ -200,6 +200,12 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
   profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick");
   profile.ReadString(value, "Options", "Tick", "", false);
   EXPECT_EQ(value.Length(), 511u);
+  DeleteFileA(path.c_str());  // the line behind a line feed sends every value to the functions
+  for (const u32 n : {511u, 512u}) {
+    profile.WriteString(Text(n, 'x').c_str(), "Options", "Tick");
+    ProfileSection(profile, "Options").ReadString(value, "Tick", "");
+    EXPECT_EQ(value.Length(), 511u);
+  }
   EXPECT_TRUE(profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick"));
   EXPECT_TRUE(profile.ReadString(value, "Options", "Tick", "", false));
   EXPECT_EQ(value.Length(), 511u);

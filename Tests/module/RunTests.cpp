@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 // One run from the host's call to its return: arguments, the order of events, results, failing
 // steps, stops, kill and the engine's table of operations.
+#include <algorithm>
 #include <clocale>
 #include <thread>
 
@@ -105,6 +106,13 @@ TEST_F(RunTest, MacroFiles) {
   for (const char* macro : {"\x83\x65 ok", "\x83\x65 ok\x81\n more"}) {
     wchar_t expected[32] = L"";
     mbstowcs(expected, macro, std::size(expected));
+    // The block for the text is one that has been used before.
+    std::vector<void*> used(100);
+    for (void*& block : used) {
+      block = CoTaskMemAlloc(2 * strlen(macro) + 20);
+      memset(block, 'x', 2 * strlen(macro) + 20);
+    }
+    std::for_each(used.begin(), used.end(), CoTaskMemFree);
     WriteBytes(macroPath, macro), Run();
     EXPECT_EQ(expected, source);
   }
