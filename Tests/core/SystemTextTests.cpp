@@ -217,9 +217,10 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
 TEST_F(SystemText, ReadsASectionAsTheProfileFunctionsDo) {
   const std::vector<Text> keys = {"Tick", "tICK", "Tic", "Ticks", "Fix",
                                   "T",    "AZ",   "az",  "\xC4",  "T\xC9k"};
-  const std::vector<Text> pieces = {
-      "\"", "'", "\"a\"", " ",  "  ",   "\t",   "=", ";", "x",     "0",           "1",
-      "-1", "7", "\\n",   "00", "\x80", "\xE9", "]", "[", "Tick=", "12345678901", "yes"};
+  const std::vector<Text> pieces = {"\"", "'",     "\"a\"",       " ",    "  ",        "\t",
+                                    "=",  ";",     "x",           "0",    "1",         "-1",
+                                    "7",  "\\n",   "00",          "\x80", "\xE9",      "]",
+                                    "[",  "Tick=", "12345678901", "yes",  "4294967296"};
   const std::vector<Text> tame = {"x", "'", "\"", "0", "12", " ", "=", ";", "a b"};
   const std::vector<Text> ends = {"\r\n", "\n", "\r\n\r\n", " \r\n"};
   const std::vector<Text> defaults = {"",       "d",    "d ",    " d\t",
