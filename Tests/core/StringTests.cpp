@@ -111,7 +111,8 @@ TEST_F(StringTest, ComparesAndSearches) {
   EXPECT_TRUE(upper.FindReverse("A", -1, true) == -1 && upper.FindReverse("ABC", 0, true) == 0);
   EXPECT_TRUE(high.Hash(1000003, false) == 97 * 4 - 23 * 2 && upper.Hash(9973, false) == 1366);
   EXPECT_TRUE(high.Compare(&upper, true, false) == 1 && String("abcd").Compare(&upper, 0, 1) == 0);
-  EXPECT_TRUE(upper.EndsWith("bc", false) && !upper.Equals("abc", true) && !upper.Equals("AB", 1));
+  EXPECT_TRUE(upper.EndsWith("bc", false) && !upper.EndsWith("xc", false) &&
+              !upper.Equals("abc", true) && !upper.Equals("AB", 1));
   EXPECT_TRUE(String(" \tx").FirstNonBlank(2) == 2 && String(" \tx").FirstNonBlank(1) == -1);
   EXPECT_TRUE(upper.IsAlpha() && !String().IsAlpha() && !String("1a").IsAlpha());
   EXPECT_TRUE(!String("a1").IsAlpha() && String("\x80").HasHighBit() && high.HasHighBit() &&
