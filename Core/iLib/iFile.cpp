@@ -35,14 +35,9 @@ static wchar_t* Widen(const char* bytes, DWORD size) {
   const u32 wideBytes = size * 2 + 20;
   wchar_t* text = static_cast<wchar_t*>(CoTaskMemAlloc(wideBytes));
   if (!text) return nullptr;
-  size_t units = mbstowcs(text, bytes, size + 1);
-  if (units > size) {
-    // It has failed half-way and does not tell where: what it converts is kept, with zeros behind.
-    memset(text, 0, wideBytes);
-    mbstowcs(text, bytes, size + 1);
-    units = size;
-  }
-  memset(text + units, 0, wideBytes - units * sizeof(wchar_t));
+  // Where the conversion fails half-way it does not tell where: what it has written is kept.
+  memset(text, 0, wideBytes);
+  mbstowcs(text, bytes, size + 1);
   return text;
 }
 
