@@ -207,4 +207,9 @@ TEST_F(Containers, StringDZAndTokenizerKeepEveryText) {
     const Text expected = joined.empty() ? "\0\0"s : joined + '\0';
     EXPECT_EQ(Text(real.Joined(), expected.size()), expected) << "step " << step;
   }
+  StringDZ many;
+  joined.clear();
+  for (int i = 0; i < 40; ++i) many.Add("x", false), joined += "x\0"s;
+  FailAllocation(2);
+  EXPECT_EQ(Text(many.Joined(), 81), joined + '\0') << "more than one block for all of them";
 }
