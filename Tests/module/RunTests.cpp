@@ -46,6 +46,12 @@ TEST_F(RunTest, StepsThatFailAndDescriptions) {
        {""s, "Language=rubyscript"s, "Language=NoSuchEngine123456789"s, "Language="s,
         js + "NoCase=1", js + "FixCRLF=yes\r\nFixDelimiter=-1", js + "FixCRLF=1\r\nFixDelimiter=0"})
     Describe(lines), Run();
+  // A thread on which the host has not initialised COM is left so: it may still choose its apartment.
+  std::thread([&] {
+    Describe("Language=NoSuchEngine"), Run();
+    EXPECT_EQ(S_OK, CoInitializeEx(nullptr, COINIT_MULTITHREADED));
+    CoUninitialize();
+  }).join();
 }
 
 // Three levels. Each stop is called by one of them, before its inner run (0, 1, 2) or after it (3:
