@@ -67,6 +67,18 @@ TEST_F(AllocationTest, OfARunInTheModule) {
   }
 }
 
+TEST_F(AllocationTest, OfACallLikeTheLast) {
+  WatchMemory(dll);
+  on["engine: SetScriptState 2"] = [] {
+    const std::vector<VARIANT> values(20, Value(VT_I4, 1));
+    Call(L"f", values);
+    FailRequest(21);  // each argument has a text
+    Call(L"f", values);
+    EXPECT_FALSE(FailRequest(0)) << "the arguments do not use the last ones' blocks again";
+  };
+  Run();
+}
+
 TEST_F(AllocationTest, OfVersion) {
   FailEach(dll, "version", [&] {
     Describe("Language=JScript\r\nMacroEnd=a\\nb\r\n" + std::string(3000, 'x'));
