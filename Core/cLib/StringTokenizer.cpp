@@ -17,7 +17,6 @@ void StringTokenizer::EnterDelimiters() {
     const u8 byte = static_cast<u8>(chars[i]);
     delimiterSet[byte >> 3] = static_cast<u8>(delimiterSet[byte >> 3] | 1 << (byte & 7));
   }
-  manyDelimiters = delimiters.Length() > 1;
 }
 
 bool StringTokenizer::IsDelimiter(char ch) const {

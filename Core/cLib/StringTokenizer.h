@@ -42,6 +42,6 @@ class StringTokenizer {
   char quote = 0;
   const char* cursor;  // into `source`; null after its last token
   bool foundDelimiter = false;
-  bool manyDelimiters = false;
+  bool manyDelimiters = delimiters.Length() > 1;
   char lastDelimiter = 0;
 };

@@ -83,7 +83,11 @@ TEST_F(Containers, TokenizerCutsAtDelimiters) {
     Text tokens;
     while (tokenizer.NextToken(keepEmpty)) tokens += Bytes(tokenizer.Token()) + "|";
     EXPECT_EQ((tokens + tokenizer.LastDelimiter()).c_str(), expected) << text;
+    EXPECT_EQ(tokenizer.HasManyDelimiters(), strlen(delimiters) > 1);
   }
+  StringTokenizer single("a,;b", ',');
+  EXPECT_TRUE(single.NextToken(true) && single.NextToken(true) && !single.HasManyDelimiters());
+  EXPECT_EQ(Bytes(single.Token()), ";b");
 }
 
 // --- Random operations compared with the standard containers -------------------------------------
