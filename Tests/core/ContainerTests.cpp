@@ -213,7 +213,10 @@ TEST_F(Containers, StringDZAndTokenizerKeepEveryText) {
   }
   StringDZ many;
   joined.clear();
-  for (int i = 0; i < 40; ++i) many.Add("x", false), joined += "x\0"s;
+  for (char ch = 'A'; ch <= 'Z'; ++ch) joined += Text(1, ch) + '\0';
+  many.AddList(joined.c_str());
   FailAllocation(2);
-  EXPECT_EQ(Text(many.Joined(), 81), joined + '\0') << "more than one block for all of them";
+  EXPECT_EQ(Text(many.Joined(), 53), joined + '\0') << "more than one block for all of them";
+  FailAllocation(0);
+  EXPECT_TRUE((many.AddList(nullptr), many.Count() == 26 && TakeReports("Null list") == 1));
 }
