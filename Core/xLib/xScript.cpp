@@ -224,7 +224,7 @@ static void GetResult(HostContext& context, VARIANT& result) {
   } else if (context.resultKind == kTextResult) {
     const String* text = texts.At(0);
     result.vt = VT_BSTR;
-    result.bstrVal = SysAllocString(WideFromNarrow(text ? text->Text() : ""));
+    result.bstrVal = SysAllocString(WideFromNarrow(text ? text->Text() : nullptr));
   }
 }
 
