@@ -68,7 +68,8 @@ TEST_F(VersionTest, DescriptionFiles) {
         "Language=1234567890123456789012345"s, "Language="s,
         "MacroBegin=a\\n\\tb\\r\\\\n\r\nFunctionPrint=\\n\\n%s\r\nFunctionPrefix=\r\n"
         "FunctionPostfix=\\t;\r\nMacroEnd=\\r\\nend"s,
-        "CRLF=\\\\n\r\nEnter=\\t\r\nTick=\\n\r\nLineFeed=\r\nQuote=\"q\""s,
+        "CRLF=\\\\n\r\nEnter=\\t\r\nTick=\\n\r\nLineFeed=\r\nQuote=\"q\"\r\n"
+        "FunctionPrefix=\\tq.\\n"s,
         "MacroBegin=" + x75 + "y\r\nQuote=" + x75 + "\r\nFunctionPrint=" + x75,
         "MacroBegin=" + x75 + "\r\nExtension=" + x75 + "\r\nMacroEnd=" + x600 +
             "\r\nFunctionPrefix=" + x75 + "\r\nFunctionPostfix=" + x600,
