@@ -132,6 +132,11 @@ TEST_F(Containers, HashTableBehavesAsAMapAndDeletesWhatItOwns) {
   EXPECT_EQ(HashBytes(kText, 30, 0, false), 0x17770551u);
   for (u32 n = 0; n < 26; ++n)
     EXPECT_EQ(HashBytes(kText, n, 0, false), HashBytes(Text(kText, n).c_str(), n, 0, false)) << n;
+  for (u32 n = 1; n < 26; ++n)
+    for (u32 i = 0; i < n; ++i) {
+      const Text changed = Text(kText).replace(i, 1, "?");
+      EXPECT_NE(HashBytes(kText, n, 0, false), HashBytes(changed.c_str(), n, 0, false)) << i;
+    }
   EXPECT_EQ(HashBytes("FOUR SCORE A", 12, 42, true), HashBytes("four score a", 12, 42, false));
   FailAllocation(1);
   cHashTable<Element> none, table;

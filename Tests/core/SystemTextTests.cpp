@@ -206,6 +206,10 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
     ProfileSection(profile, "Options").ReadString(value, "Tick", "");
     EXPECT_EQ(value.Length(), 511u);
   }
+  for (int i = 0; i < 9; ++i)
+    profile.WriteString(Text(500, 'x').c_str(), "Long", ("Key" + std::to_string(i)).c_str());
+  profile.WriteString("last", "Long", "Tick");
+  EXPECT_TRUE(ProfileSection(profile, "Long").ReadString(value, "Tick", "")) << "a long section";
   EXPECT_TRUE(profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick"));
   EXPECT_TRUE(profile.ReadString(value, "Options", "Tick", "", false));
   EXPECT_EQ(value.Length(), 511u);
