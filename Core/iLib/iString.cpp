@@ -49,9 +49,8 @@ const char* String::FormatResource(u32 resourceId, ...) {
 
 bool String::LoadResource(u32 resourceId) {
   if (!EmptyReserve(kLongestResource + 1)) return false;
-  const int loaded = LoadText(resourceId, text, kLongestResource + 1);
+  const int loaded = LoadText(resourceId, text, kLongestResource + 1);  // terminated
   length = loaded > 0 ? static_cast<u32>(loaded) : 0;
-  text[length] = 0;
   if (length == 0) ReportMissing(resourceId);
   return length != 0;
 }
