@@ -18,7 +18,6 @@ static String DescriptionPath() {
     String folder = ModuleFolder();
     if (!MayReadAndWrite(folder.Text())) folder = ProductFolder();
     if (folder.IsEmpty()) return folder;
-    EnsureFolder(folder.Text());
     descriptionPath = folder + kDescriptionFileName;
   }
   return descriptionPath;
