@@ -129,6 +129,7 @@ TEST_F(SystemText, ReadsTheClipboard) {
   memcpy(block, "abc\0def", 8);
   ASSERT_TRUE(OpenClipboard(nullptr) && SetClipboardData(CF_TEXT, block) && CloseClipboard());
   EXPECT_TRUE(GetClipboardText(text) && Bytes(text) == "abc");
+  EXPECT_FALSE(CloseClipboard()) << "still open";
 }
 
 // --- The application and the description file ----------------------------------------------------
