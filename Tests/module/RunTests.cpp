@@ -46,7 +46,7 @@ TEST_F(RunTest, StepsThatFailAndDescriptions) {
        {""s, "Language=rubyscript"s, "Language=NoSuchEngine123456789"s, "Language="s,
         js + "NoCase=1", js + "FixCRLF=yes\r\nFixDelimiter=-1", js + "FixCRLF=1\r\nFixDelimiter=0"})
     Describe(lines), Run();
-  // A thread on which the host has not initialised COM is left so: it may still choose its apartment.
+  // A thread on which the host has not initialised COM is left so: its apartment is still open.
   std::thread([&] {
     Describe("Language=NoSuchEngine"), Run();
     EXPECT_EQ(S_OK, CoInitializeEx(nullptr, COINIT_MULTITHREADED));
