@@ -168,6 +168,8 @@ void MacroRun::Stopping() noexcept {
 MacroResult MacroRun::Perform(std::uint32_t id, const std::string& name,
                               const Arguments& arguments) {
   const bool trace = surroundings.options.trace;
+  if (!trace && !surroundings.options.profile)
+    return CallMacroFunction(id, editor, services, arguments, passage);
   const std::string call = trace ? CallText(name, arguments) : "";
   const Clock::time_point begin = Clock::now();
   try {
