@@ -17,17 +17,10 @@ constexpr std::pair<const char*, Function> kFunctions[] = {
 };
 
 // Hands out the one object, as if it made it.
-class Factory final : public IClassFactory {
+class Factory final : public Resident<IClassFactory> {
  public:
   explicit Factory(BareObject& shared) : object(shared) {}
 
-  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID id, void** result) override {
-    const bool known = id == IID_IUnknown || id == IID_IClassFactory;
-    *result = known ? this : nullptr;
-    return known ? S_OK : E_NOINTERFACE;
-  }
-  ULONG STDMETHODCALLTYPE AddRef() override { return 2; }
-  ULONG STDMETHODCALLTYPE Release() override { return 1; }
   HRESULT STDMETHODCALLTYPE CreateInstance(IUnknown*, REFIID id, void** result) override {
     return object.QueryInterface(id, result);
   }
@@ -37,17 +30,9 @@ class Factory final : public IClassFactory {
   BareObject& object;
 };
 
-class Site final : public IActiveScriptSite {
+class Site final : public Resident<IActiveScriptSite> {
  public:
   explicit Site(IDispatch& tarn) : item(tarn) {}
-
-  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID id, void** object) override {
-    const bool known = id == IID_IUnknown || id == IID_IActiveScriptSite;
-    *object = known ? this : nullptr;
-    return known ? S_OK : E_NOINTERFACE;
-  }
-  ULONG STDMETHODCALLTYPE AddRef() override { return 2; }
-  ULONG STDMETHODCALLTYPE Release() override { return 1; }
 
   HRESULT STDMETHODCALLTYPE GetLCID(LCID*) override { return E_NOTIMPL; }
   HRESULT STDMETHODCALLTYPE GetItemInfo(LPCOLESTR, DWORD, IUnknown** object, ITypeInfo**) override {
@@ -97,12 +82,6 @@ Function FunctionNamed(const std::string& name) {
 
 Function FunctionNamed(const std::wstring& name) {
   return FunctionNamed(std::string(name.begin(), name.end()));
-}
-
-HRESULT BareObject::QueryInterface(REFIID id, void** object) {
-  const bool known = id == IID_IUnknown || id == IID_IDispatch;
-  *object = known ? this : nullptr;
-  return known ? S_OK : E_NOINTERFACE;
 }
 
 HRESULT BareObject::GetTypeInfoCount(UINT* count) {

@@ -31,7 +31,20 @@ class LoopClock {
   double seconds = -1;
 };
 
-class BareObject final : public IDispatch {
+// A COM object that lives in a frame or for good, whatever its references say.
+template <class Interface>
+class Resident : public Interface {
+ public:
+  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID id, void** object) override {
+    const bool known = id == IID_IUnknown || id == __uuidof(Interface);
+    *object = known ? this : nullptr;
+    return known ? S_OK : E_NOINTERFACE;
+  }
+  ULONG STDMETHODCALLTYPE AddRef() override { return 2; }
+  ULONG STDMETHODCALLTYPE Release() override { return 1; }
+};
+
+class BareObject final : public Resident<IDispatch> {
  public:
   // Of win32ole's object, in this process only.
   static constexpr CLSID kClass = {
@@ -41,9 +54,6 @@ class BareObject final : public IDispatch {
   LoopClock clock;
   Comparison* comparisons = nullptr;  // take's, by its index
 
-  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID id, void** object) override;
-  ULONG STDMETHODCALLTYPE AddRef() override { return 2; }
-  ULONG STDMETHODCALLTYPE Release() override { return 1; }
   HRESULT STDMETHODCALLTYPE GetTypeInfoCount(UINT* count) override;
   HRESULT STDMETHODCALLTYPE GetTypeInfo(UINT, LCID, ITypeInfo**) override { return E_NOTIMPL; }
   HRESULT STDMETHODCALLTYPE GetIDsOfNames(REFIID, LPOLESTR* names, UINT, LCID,

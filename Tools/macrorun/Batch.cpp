@@ -72,10 +72,7 @@ void Batch::Write(const fs::path& input, const std::string& bytes) {
 ExitCode Batch::RunGuarded(const fs::path& input) try {
   return RunOne(input);
 } catch (const UsageError& error) {
-  ErrorReport report;
-  report.kind = "file";
-  report.message = error.what();
-  reporter.Error(std::move(report));
+  reporter.Error(PlainError("file", {}, error.what()));
   return kWrongUsage;
 }
 

@@ -81,6 +81,14 @@ bool ContinuesCharacter(char byte) { return (static_cast<unsigned char>(byte) & 
 
 }  // namespace
 
+ErrorReport PlainError(const char* kind, const std::filesystem::path& file, std::string message) {
+  ErrorReport error;
+  error.kind = kind;
+  error.file = ToUtf8(file);
+  error.message = std::move(message);
+  return error;
+}
+
 std::optional<ErrorReport> ParseScriptError(std::string_view report, const MacroName& macro) {
   const std::string_view beginning = kScriptErrorReport;
   if (!report.starts_with(beginning)) return {};

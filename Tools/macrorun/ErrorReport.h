@@ -8,6 +8,7 @@
 // Threading: values.
 #pragma once
 
+#include <filesystem>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -26,6 +27,9 @@ struct ErrorReport {
   int argument = 0;      // from 1; 0: not one of them
   std::string expected;
 };
+
+// An error without a place. No path: of no file.
+ErrorReport PlainError(const char* kind, const std::filesystem::path& file, std::string message);
 
 // How a macro is named: in what `execute` is given and the module's reports say, and to the user.
 struct MacroName {

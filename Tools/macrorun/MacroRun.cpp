@@ -151,10 +151,7 @@ bool MacroRun::Call(std::uint32_t id) noexcept try {
     return WrongCallMade(name, wrong);
   }
 } catch (const std::exception& error) {
-  ErrorReport report;
-  report.kind = "fault";
-  report.message = error.what();
-  reports.Add(std::move(report));
+  reports.Add(PlainError("fault", {}, error.what()));
   return false;
 }
 

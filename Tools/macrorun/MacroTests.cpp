@@ -63,7 +63,6 @@ class MacroTests {
   ExitCode Write(const fs::path& file, const std::string& text);
   void Summarize();
   std::string Count(State state, const char* what) const;
-  void Report(const char* kind, const fs::path& file, std::string message);
 
   Options options;  // with the macro of the present test
   Reporter& reporter;
@@ -136,7 +135,7 @@ ExitCode MacroTests::RunGuarded(Test& test) try {
   test.made = editor.First().Bytes();
   return Judge(test);
 } catch (const UsageError& error) {
-  Report("file", {}, error.what());
+  reporter.Error(PlainError("file", {}, error.what()));
   return kWrongUsage;
 }
 
@@ -155,7 +154,8 @@ ExitCode MacroTests::Judge(Test& test) {
 void MacroTests::Compare(const Test& test, bool there, const std::string& text) {
   const std::string name = ToUtf8(test.Expected().filename());
   const std::string missing = "no " + name + (options.promote ? "" : "; --promote writes it");
-  Report("test", test.macro, there ? "its text is not that of " + name : missing);
+  reporter.Error(
+      PlainError("test", test.macro, there ? "its text is not that of " + name : missing));
   reporter.TestEnd(false, CompareTexts(name, text, ToUtf8(test.macro.filename()), test.made));
 }
 
@@ -178,7 +178,9 @@ void MacroTests::PromoteGroup(const Group& group) {
     names += (names.empty() ? "" : ", ") + ToUtf8(test->macro.filename());
     agree = agree && test->made == group.front()->made;
   }
-  if (!agree) return Report("test", file, "not promoted, since its macros disagree: " + names);
+  if (!agree)
+    return reporter.Error(
+        PlainError("test", file, "not promoted, since its macros disagree: " + names));
   const ExitCode code = Write(file, group.front()->made);
   for (Test* test : group) {
     if (test->state != State::kDiffers) continue;
@@ -193,7 +195,7 @@ ExitCode MacroTests::Write(const fs::path& file, const std::string& text) try {
   reporter.Note("promoted " + ToUtf8(file));
   return kSuccess;
 } catch (const UsageError& error) {
-  Report("file", {}, error.what());
+  reporter.Error(PlainError("file", {}, error.what()));
   return kWrongUsage;
 }
 
@@ -210,14 +212,6 @@ std::string MacroTests::Count(State state, const char* what) const {
   return std::to_string(std::count_if(tests.begin(), tests.end(),
                                       [state](const Test& test) { return test.state == state; })) +
          what;
-}
-
-void MacroTests::Report(const char* kind, const fs::path& file, std::string message) {
-  ErrorReport report;
-  report.kind = kind;
-  report.file = ToUtf8(file);
-  report.message = std::move(message);
-  reporter.Error(std::move(report));
 }
 
 }  // namespace

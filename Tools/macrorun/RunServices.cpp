@@ -58,16 +58,14 @@ std::optional<std::string> RunServices::MacroArgument(const std::string& name) {
 bool RunServices::RunMacro(const fs::path& macro) {
   const fs::path file = macros.back().parent_path() / macro;
   std::error_code error;
-  ErrorReport report;
-  report.kind = "call";
-  report.file = ToUtf8(macros.back());
+  std::string hindrance;
   if (!fs::is_regular_file(file, error))
-    report.message = "there is no macro " + ToUtf8(file);
+    hindrance = "there is no macro " + ToUtf8(file);
   else if (macros.size() >= kDeepest)
-    report.message = "macros run each other more than " + std::to_string(kDeepest) + " deep";
+    hindrance = "macros run each other more than " + std::to_string(kDeepest) + " deep";
   else
-    report.message = Unreadable(file);
-  if (report.message.empty()) return nested.RunNested(file);
-  reporter.Error(std::move(report));
+    hindrance = Unreadable(file);
+  if (hindrance.empty()) return nested.RunNested(file);
+  reporter.Error(PlainError("call", macros.back(), std::move(hindrance)));
   return false;
 }

@@ -34,14 +34,6 @@ std::wstring Widened(const std::string& bytes) {
   return text;
 }
 
-ErrorReport Plain(const fs::path& macro, const char* kind, std::string message) {
-  ErrorReport error;
-  error.kind = kind;
-  error.file = ToUtf8(macro);
-  error.message = std::move(message);
-  return error;
-}
-
 class Checker {
  public:
   Checker(const Options& checkOptions, Reporter& checkReporter)
@@ -69,7 +61,7 @@ ExitCode Checker::Check(const fs::path& macro) try {
   }
   return Parse(macro, engine);
 } catch (const UsageError& error) {
-  reporter.Error(Plain({}, "file", error.what()));
+  reporter.Error(PlainError("file", {}, error.what()));
   return kWrongUsage;
 }
 
@@ -94,7 +86,7 @@ ExitCode Checker::Parse(const fs::path& macro, const std::string& engineName) {
   if (std::optional<ErrorReport> error = site.TakeError())
     reporter.Error(std::move(*error));
   else if (FAILED(result))
-    reporter.Error(Plain(macro, "engine", SystemMessage(static_cast<unsigned long>(result))));
+    reporter.Error(PlainError("engine", macro, SystemMessage(static_cast<unsigned long>(result))));
   return FAILED(result) ? kMacroFailed : kSuccess;
 }
 

@@ -94,10 +94,7 @@ ExitCode Perform(const Options& options, Reporter& reporter) {
 }
 
 ExitCode Fail(Reporter& reporter, const char* kind, const char* text, ExitCode code) {
-  ErrorReport report;
-  report.kind = kind;
-  report.message = text;
-  reporter.Error(std::move(report));
+  reporter.Error(PlainError(kind, {}, text));
   return code;
 }
 
