@@ -366,7 +366,7 @@ int String::FirstNonBlank(int limit) const {
 
 u32 String::SkipBlanks() const {
   u32 i = 0;
-  while (i < length && IsBlank(text[i])) ++i;
+  while (IsBlank(text[i])) ++i;  // up to the terminator at the latest
   return i;
 }
 

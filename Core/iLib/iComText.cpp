@@ -23,7 +23,7 @@ const wchar_t* WideFromNarrow(const char* text) {
   // what is converted lies behind the last unit that is kept.
   wchar_t units[4 * kWideLimit];
   const int bytes = static_cast<int>(strnlen(text, 4 * kWideLimit));
-  const int count = MultiByteToWideChar(CP_ACP, 0, text, bytes, units, 4 * kWideLimit);
+  const int count = MultiByteToWideChar(CP_ACP, 0, text, bytes, units, bytes);
   u32 kept = static_cast<u32>(count);
   if (kept >= kWideLimit) {
     kept = kWideLimit - 1;

@@ -62,7 +62,6 @@ static bool DescriptorGrants(PSECURITY_DESCRIPTOR descriptor) {
 }
 
 bool MayReadAndWrite(const char* folder) {
-  if (!folder || !*folder) return false;
   const SECURITY_INFORMATION parts =
       OWNER_SECURITY_INFORMATION | GROUP_SECURITY_INFORMATION | DACL_SECURITY_INFORMATION;
   DWORD bytes = 0;

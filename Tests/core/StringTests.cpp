@@ -54,6 +54,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"", [](String& s) { s.Format("%.4095s", kLong.c_str()); }, kLong.substr(0, 4095)},
       {"", [](String& s) { s.Format("%.4096s", kLong.c_str()); }, "%.4096s...."},
       {"", [](String& s) { s.Format(kLong.c_str(), 0); }, kLong.substr(0, 4086) + "...."},
+      {"x", [](String& s) { s = String('\0', 3); }, ""},
       {"abc", [](String& s) { s.Append("x", -2), s.SetAt(-1, s.Reserve(0)); }, "abc", 8, 4, 3},
       {"abc", [](String& s) { SetCapacity(s, 3), s.Append("x"), s.AppendChar('x'); }, "abc", 3, 4,
        2},
@@ -118,91 +119,4 @@ TEST_F(StringTest, ComparesAndSearches) {
   EXPECT_TRUE(upper.IsAlpha() && !String().IsAlpha() && !String("1a").IsAlpha());
   EXPECT_TRUE(!String("a1").IsAlpha() && String("\x80").HasHighBit() && high.HasHighBit() &&
               !upper.HasHighBit());
-}
-
-// --- Random operations compared with std::string -------------------------------------------------
-
-static Text Cut(const Text& text) { return text.c_str(); }  // at its first NUL
-
-// Returns how many were replaced.
-static u32 Replace(Text& text, size_t from, const Text& needle, const Text& with, u32 most) {
-  u32 count = 0;
-  for (size_t at; count < most; ++count, from += at + with.size()) {
-    at = Text(text.c_str() + from).find(needle);
-    if (at == Text::npos) break;
-    text = Cut(text.replace(from + at, needle.size(), with));
-  }
-  return count;
-}
-
-TEST_F(StringTest, BehavesAsAPlainTextAndStaysAsItWasWithoutMemory) {
-  Text model, word, given, other;
-  const char* argument = nullptr;  // an own text, or one that stands in the string itself
-  char ch = 0;
-  int pos = 0;
-  size_t at = 0, size = 0;  // `at` is the position, unsigned
-  u32 count = 0, result = 0, expected = 0;
-  bool inside = false;  // at a character, or at 0
-  FailAllocation(1);    // even the first block is missing
-  String real("abc");
-  const std::function<void()> operations[] = {
-      [&] { real.Assign(argument), model = given; },
-      [&] { real.AppendChar(ch), model += ch; },
-      [&] { real.Append(argument), model += given; },
-      [&] {
-        real.InsertChar(ch, pos);
-        if (at <= size) model.insert(at, 1, ch), model.resize(size + (ch != 0));
-      },
-      [&] {
-        real.Insert(argument, pos);
-        if (inside && !given.empty()) model = Cut(model.insert(at, given));
-      },
-      [&] { real.Delete(pos, count), model = inside ? Cut(model.erase(at, count)) : model; },
-      [&] { result = Bytes(real.Mid(pos, count)) != (inside ? Cut(model.substr(at, count)) : ""); },
-      [&] {
-        const u32 most = at < size && !given.empty();
-        result = real.ReplaceFirstWithChar(argument, ch, static_cast<u32>(pos));
-        expected = Replace(model, at, given, Text(1, ch), most);
-      },
-      [&] {
-        if (size && given != other) model = Cut(model);
-        result = real.Substitute(argument, other.c_str());
-        expected = Replace(model, 0, given, other, size && given != other);
-      },
-      [&] {
-        if (!given.empty()) model = Cut(model);
-        result = real.ReplaceAll(argument, other.c_str());
-        expected = Replace(model, 0, given, other, given.empty() ? 0 : UINT_MAX);
-      },
-      [&] {
-        real.SetAt(pos, ch);
-        if (pos < 0 || pos == INT_MAX) return;
-        if (at >= size) model.resize(at + 1, ' ');
-        model[at] = ch;
-      },
-      [&] { real.Format("%s|%s", argument, real.Text()), model = given + "|" + Cut(model); },
-      [&] { result = !real.Reserve(count % 60 + 1) || Bytes(String(real)) != model; },
-      [&] { real.FromLatin1ToUtf8(argument), model = Bytes(real); },
-      [&] { real.Trim(), real.CollapseBlanks(), model = Bytes(real); },
-  };
-  for (int step = 0; step < 600000 && !HasFailure(); ++step) {
-    // A new one now and then: the old one's block has grown so large that all fits in.
-    if (model.size() > 400 || Below(50) == 0)
-      std::destroy_at(&real), std::construct_at(&real), model.clear();
-    const Text before = model;
-    size = model.size(), word = Word(12), other = Word(4), ch = "a \xE9"[Below(4)];
-    argument = Below(3) ? word.c_str() : real.Text() + Below(size + 1);
-    given = argument, count = Below(8) ? Below(6) : UINT_MAX;
-    pos = Position(size), at = static_cast<u32>(pos), inside = at < size || pos == 0;
-    const u32 operation = Below(std::size(operations));
-    FailAllocation(Below(9) ? 0 : 1);
-    result = expected = 0, operations[operation]();
-    const bool failed = FailAllocation(0);
-    if (failed && Bytes(real) == before) model = before;
-    EXPECT_TRUE(result == expected || failed) << "step " << step << ", operation " << operation;
-    EXPECT_EQ(Bytes(real), model) << "step " << step << ", operation " << operation;
-    EXPECT_TRUE(real.Length() < real.Capacity() && real.Text()[real.Length()] == 0) << operation;
-  }
-  FailAllocation(1);
-  EXPECT_STREQ(String("abc").Text(), "") << "the block that stands in for a missing one is changed";
 }

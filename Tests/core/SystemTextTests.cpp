@@ -71,6 +71,7 @@ TEST_F(SystemText, Converts) {
   String utf8, narrow, utf16;
   utf8.FromUtf16ToUtf8(L"ab"), narrow.FromWide(L"ab"), utf16.FromUtf8ToUtf16("ab");
   EXPECT_TRUE(utf8.Capacity() == 29 && narrow.Capacity() == 18 && utf16.Capacity() == 211);
+  EXPECT_TRUE((utf16.FromUtf8ToUtf16("a"), utf16.Length() == 2));
   text.FromUtf8ToUtf16("\xFFzzz");
   EXPECT_TRUE(text.Length() == 104 && text.Text()[0] == 0 && text.Text()[1] == 0);
   for (const auto& [none, n] : {std::pair("abc", 0), {"abc", -2}, {nullptr, 5}})

@@ -4,25 +4,13 @@
 #include <stdlib.h>
 
 #include <iostream>
+#include <stdexcept>
 #include <utility>
 
 #include "cLib/cReport.h"
 
-static int allocationsLeft = 0, allocationFailed = 0;
-
-static void* TestMalloc(size_t bytes) {
-  if (allocationsLeft == 0 || --allocationsLeft > 0) return malloc(bytes);
-  return ++allocationFailed, nullptr;
-}
-
-// The library's own allocation, but for the place where its memory comes from.
-#define malloc TestMalloc
-#include "cLib/cMemory.cpp"
-#undef malloc
-
-bool FailAllocation(int n) {
-  allocationsLeft = n;
-  return std::exchange(allocationFailed, 0);
+void ModelFailed(const char* file, int line, const char* condition) {
+  throw std::logic_error(file + (":" + std::to_string(line) + ": ") + condition);
 }
 
 CoreTest::CoreTest() {
@@ -48,15 +36,4 @@ Text CoreTest::Word(u32 longest) {
   Text word(Below(longest + 1), 0);
   for (char& ch : word) ch = "aAb,, \t\x01\xE9"[Below(9)];
   return word;
-}
-
-int CoreTest::Position(size_t size) {
-  static const int extremes[] = {-1, INT_MIN, INT_MAX};
-  return Below(8) ? static_cast<int>(Below(size + 3)) : extremes[Below(3)];
-}
-
-// Sizes that a 32-bit Windows process could not have fail natively, too.
-extern "C" const char* __asan_default_options();
-extern "C" const char* __asan_default_options() {
-  return "allocator_may_return_null=1:max_allocation_size_mb=64";
 }

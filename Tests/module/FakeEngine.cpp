@@ -61,7 +61,11 @@ HRESULT __stdcall ParseScriptText(void*, LPCOLESTR code, int item, int context, 
                                   int cookie, int line, int flags, int result, EXCEPINFO* info) {
   source = code;
   const bool plain = !(item | context | delimiter | cookie | line | flags | result);
-  return Note(plain && !info->bstrDescription ? "ParseScriptText" : "ParseScriptText, not plain");
+  const HRESULT outcome =
+      Note(plain && !info->bstrDescription ? "ParseScriptText" : "ParseScriptText, not plain");
+  for (BSTR* text : {&info->bstrSource, &info->bstrDescription, &info->bstrHelpFile})
+    if (FAILED(outcome)) *text = SysAllocString(L"text");
+  return outcome;
 }
 
 HRESULT __stdcall CreateInstance(void*, IUnknown*, REFIID riid, void** object) {

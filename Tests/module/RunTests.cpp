@@ -93,8 +93,11 @@ TEST_F(RunTest, MacroFiles) {
   HANDLE file = CreateFileA(large.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_NEW, 0, nullptr);
   SetFilePointerEx(file, {{2, 1}}, nullptr, FILE_BEGIN);  // 4 GiB and two bytes
   EXPECT_TRUE(SetEndOfFile(file) && CloseHandle(file));
-  for (const std::string& path : {testFolder + "\\missing", testFolder, locked, large, ""s,
-                                  "C:\\" + std::string(5000, 'x'), "%s%n*?"s})
+  testing::internal::CaptureStderr();
+  Run(testFolder + "\\missing");
+  Log("standard error: " + testing::internal::GetCapturedStderr());
+  for (const std::string& path :
+       {testFolder, locked, large, ""s, "C:\\" + std::string(5000, 'x'), "%s%n*?"s})
     Run(path);
   CloseHandle(lock);
 

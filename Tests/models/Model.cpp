@@ -1,0 +1,52 @@
+// SPDX-License-Identifier: MIT
+#include "Model.h"
+
+#include <stdlib.h>
+
+#include <utility>
+
+static int allocationsLeft = 0;
+static bool allocationFailed = false;
+
+// What a 32-bit Windows process could not have fails natively, too.
+static constexpr size_t kLargestBlock = 64 << 20;
+
+static void* TestMalloc(size_t bytes) {
+  if (bytes > kLargestBlock) return nullptr;
+  if (allocationsLeft == 0 || --allocationsLeft > 0) return malloc(bytes);
+  allocationFailed = true;
+  return nullptr;
+}
+
+// The library's own allocation, but for the place where its memory comes from.
+#define malloc TestMalloc
+#include "cLib/cMemory.cpp"
+#undef malloc
+
+bool FailAllocation(int n) {
+  allocationsLeft = n;
+  return std::exchange(allocationFailed, false);
+}
+
+char AnyCharacter(Input& input) {
+  const u32 byte = Below(input, 256);
+  if (byte >= 30) return "aAb,; \t\x01\xE9'"[byte % 10];
+  return static_cast<char>(1 + Below(input, 255));
+}
+
+std::string AnyText(Input& input, u32 longest) {
+  std::string text(Below(input, longest + 1), '\0');
+  for (char& ch : text) ch = AnyCharacter(input);
+  return text;
+}
+
+std::string AnyBytes(Input& input, size_t longest) {
+  const std::string bytes = input.ConsumeRandomLengthString(longest);
+  return bytes.substr(0, bytes.find('\0'));
+}
+
+int AnyPlace(Input& input, size_t size) {
+  static constexpr int kExtremes[] = {-1, INT32_MIN, INT32_MAX};
+  const u32 choice = Below(input, 1024);
+  return choice < 128 ? kExtremes[choice % 3] : static_cast<int>(choice % (size + 3));
+}

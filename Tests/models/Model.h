@@ -1,0 +1,56 @@
+// SPDX-License-Identifier: MIT
+// Plain models of what the portable base does, and a program of random steps for each: the class under
+// test goes through the same steps as its model, and the two are compared after each one. The steps
+// are read from any bytes: core_tests makes them at random, the fuzz targets by coverage.
+//
+// Each returns the number of steps. Threading: one thread at a time.
+#pragma once
+
+#include <fuzzer/FuzzedDataProvider.h>
+
+#include <string>
+
+#include "cLib/cString.h"
+#include "cLib/cTypes.h"
+
+using Input = FuzzedDataProvider;
+
+size_t ArrayModel(Input& input);
+size_t FiloModel(Input& input);
+size_t HashTableModel(Input& input);
+size_t LogLineModel(Input& input);
+size_t StringModel(Input& input);
+size_t TokenizerModel(Input& input);
+size_t UnescapeModel(Input& input);
+
+// Each program has its own way to fail.
+[[noreturn]] void ModelFailed(const char* file, int line, const char* condition);
+#define CHECK(condition)                                          \
+  do {                                                            \
+    if (!(condition)) ModelFailed(__FILE__, __LINE__, #condition); \
+  } while (false)
+
+// The n-th allocation from now fails (1: the next one; 0: none does). Returns whether the one of
+// the last call has failed.
+bool FailAllocation(int n);
+
+// What a container holds: it knows how many of its kind live.
+struct Element {
+  static inline int live = 0;
+  int id;
+  explicit Element(int number = 0) : id(number) { ++live; }
+  Element(const Element&) = delete;
+  Element& operator=(const Element&) = delete;
+  virtual ~Element() { --live; }
+};
+
+inline std::string Bytes(const String& s) { return {s.Text(), s.Length()}; }
+
+inline u32 Below(Input& input, u32 limit) { return input.ConsumeIntegralInRange(0u, limit - 1); }
+
+// Without zero bytes; mostly characters that mean something to somebody, or whatever comes.
+char AnyCharacter(Input& input);
+std::string AnyText(Input& input, u32 longest = 16);
+std::string AnyBytes(Input& input, size_t longest);
+// One of `size` places, one near them, or an extreme one.
+int AnyPlace(Input& input, size_t size);
