@@ -88,7 +88,7 @@ void String::TakeBlock(char* block, u32 size) {
 void String::ReplaceAt(u32 pos, u32 count, const char* bytes, u32 size) {
   memmove(text + pos + size, text + pos + count, length - pos - count + 1);
   memcpy(text + pos, bytes, size);
-  length += size - count;
+  length = LengthOf(text);
 }
 
 // --- Construction --------------------------------------------------------------------------------
@@ -265,7 +265,6 @@ void String::Insert(const char* s, int pos) {
   if (capacity - length <= from.size && !Reserve(AddSizes(AddSizes(from.size, capacity), 1)))
     return;
   ReplaceAt(place, 0, from.bytes, from.size);
-  length = LengthOf(text);
 }
 
 void String::Delete(int pos, u32 count) {
@@ -429,7 +428,6 @@ bool String::ReplaceFirstWithChar(const char* needle, char ch, u32 fromPos) {
   const char* found = strstr(text + fromPos, needle);
   if (!found) return false;
   ReplaceAt(static_cast<u32>(found - text), LengthOf(needle), &ch, 1);
-  length = LengthOf(text);
   return true;
 }
 

@@ -115,7 +115,8 @@ TEST_F(StringTest, ComparesAndSearches) {
   EXPECT_TRUE(high.Compare(&upper, true, false) == 1 && String("abcd").Compare(&upper, 0, 1) == 0);
   EXPECT_TRUE(upper.EndsWith("bc", false) && !upper.EndsWith("xc", false) &&
               !upper.Equals("abc", true) && !upper.Equals("AB", 1));
-  EXPECT_TRUE(String(" \tx").FirstNonBlank(2) == 2 && String(" \tx").FirstNonBlank(1) == -1);
+  EXPECT_TRUE(String(" \tx").FirstNonBlank(2) == 2 && String(" \tx").FirstNonBlank(1) == -1 &&
+              String("x").FirstNonBlank(0) == 0);
   EXPECT_TRUE(upper.IsAlpha() && !String().IsAlpha() && !String("1a").IsAlpha());
   EXPECT_TRUE(!String("a1").IsAlpha() && String("\x80").HasHighBit() && high.HasHighBit() &&
               !upper.HasHighBit());

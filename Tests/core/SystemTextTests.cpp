@@ -212,6 +212,8 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
     profile.WriteString(Text(500, 'x').c_str(), "Long", ("Key" + std::to_string(i)).c_str());
   profile.WriteString("last", "Long", "Tick");
   EXPECT_TRUE(ProfileSection(profile, "Long").ReadString(value, "Tick", "")) << "a long section";
+  std::ofstream(path) << "[Options]\na=\nT\nT=x\n";
+  EXPECT_FALSE(ProfileSection(profile, "Options").ReadString(value, "T", "")) << "T has no sign";
   EXPECT_TRUE(profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick"));
   EXPECT_TRUE(profile.ReadString(value, "Options", "Tick", "", false));
   EXPECT_EQ(value.Length(), 511u);

@@ -276,9 +276,9 @@ def _limit_files() -> None:
 
 
 def _failure(status: int, output: str) -> str:
-    failed = re.search(r"^\[  FAILED  \] (\w+\.\w+)", output, re.MULTILINE)
+    failed = re.search(r"^\[  FAILED  \] ([\w/]+\.[\w/]+)", output, re.MULTILINE)
     if failed:
         return failed[1]
-    running = re.findall(r"^\[ RUN      \] (\w+\.\w+)", output, re.MULTILINE)
+    running = re.findall(r"^\[ RUN      \] ([\w/]+\.[\w/]+)", output, re.MULTILINE)
     how = "timed out" if status in (124, 137) else f"ended with {status}"
     return f"{running[-1]} {how}" if running else how

@@ -4,6 +4,7 @@
 #include <process.h>
 
 #include <cstdlib>
+#include <sstream>
 
 #include "Imports.h"
 #include "TortureTest.h"
@@ -77,6 +78,22 @@ TEST_F(AllocationTest, OfACallLikeTheLast) {
     EXPECT_FALSE(FailRequest(0)) << "the arguments do not use the last ones' blocks again";
   };
   Run();
+}
+
+// The module names its log file when it is loaded.
+TEST_F(AllocationTest, OfTheMacroEngineIsReported) {
+  const std::string path = testFolder + "\\memory.log";
+  SetEnvironmentVariableA("SCRIPTRUBY_LOG", path.c_str());
+  const HMODULE shipped = std::exchange(dll, LoadModule(testFolder + "\\logging"));
+  SetEnvironmentVariableA("SCRIPTRUBY_LOG", nullptr);
+  WatchMemory(dll);
+  FailRequest(1);
+  EXPECT_EQ(-1, Run());
+  EXPECT_TRUE(FailRequest(0));
+  FreeLibrary(std::exchange(dll, shipped));
+  std::stringstream log;
+  log << std::ifstream(path).rdbuf();
+  EXPECT_NE(std::string::npos, log.str().find("No memory for the macro engine")) << log.str();
 }
 
 TEST_F(AllocationTest, OfVersion) {
