@@ -4,6 +4,7 @@
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
+PACKAGES+=(python3 python3-clang-19)
 prepare
 say "-- testing"
 cd "$ROOT"

@@ -116,8 +116,10 @@ TEST_F(SystemText, StaysAsItWasWithoutMemory) {
     FailAllocation(1), change(text);
     EXPECT_TRUE(FailAllocation(0) && Bytes(text) == "abc");
   }
-  FailAllocation(2);
-  EXPECT_STREQ(String(wide.c_str(), 1252).Text(), "");
+  for (const int n : {1, 2}) {
+    FailAllocation(n);
+    EXPECT_STREQ(String(wide.c_str(), 1252).Text(), "");
+  }
   FailAllocation(1);
   EXPECT_STREQ(String(1u, "file", 3).Text(), "");
 }
@@ -177,6 +179,7 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
   xScriptInfo defaults(true), info(false), again(false);
   info.NoCase = info.FixCRLF = info.FixDelimiter = true, info.SetDefaults();
   EXPECT_FALSE(info.IsNoCase() || info.IsFixCRLF() || info.IsFixDelimiter());
+  EXPECT_TRUE(info.OpenBracket == '(' && info.CloseBracket == ')');
   EXPECT_FALSE(again.IsNoCase() || again.IsFixCRLF() || again.IsFixDelimiter());
   EXPECT_TRUE(!again.OpenBracket && !again.CloseBracket);
   profile.WriteString("1", "Options", "NoCase");

@@ -57,10 +57,14 @@ class Pair {
                       : [](const char*, u32 value) { walked.push_back(value); });
     CHECK(std::ranges::is_permutation(walked, values));
     CHECK(real.EntryCount() == (removes ? 0 : model.size()));
-    real.Clear();
-    CHECK(real.EntryCount() == 0);
-    if (owned && !removes) CHECK(Element::live == 0);
-    for (const u32 value : owned && !removes ? std::vector<u32>() : values) delete ElementOf(value);
+    const bool deletes = owned && !removes;
+    if (model.size() % 4 < 2) {  // else its destructor clears it
+      real.Clear();
+      CHECK(real.EntryCount() == 0);
+      CHECK(Element::live == static_cast<int>(deletes ? 0 : values.size()));
+    }
+    for (const u32 value : values)
+      if (!deletes) delete ElementOf(value);
   }
 
  private:

@@ -1,9 +1,9 @@
 # SPDX-License-Identifier: MIT
 """Mutates the module's sources, one place at a time, and tells which mutants the tests catch.
 
-Run by scripts/mutate.sh. A mutant that the compiler refuses, or that makes the same DLL and the
-same objects of the tests, does not count. One that all tests pass has survived. Of the mutants that
-survivors.txt does not explain, at least 95 % must be caught.
+Run by scripts/mutate.sh and, in its short form, by ctest. A mutant that the compiler refuses, or
+that makes the same DLL and the same objects of the tests, does not count. One that all tests pass has
+survived. Of the mutants that survivors.txt does not explain, at least 95 % must be caught.
 """
 
 import argparse
@@ -13,13 +13,17 @@ import signal
 import sys
 import time
 from collections import Counter
+from collections.abc import Callable, Iterable
 from pathlib import Path
 
+from nativeplace import NativePlace
 from sites import Finder, Site
-from workplace import BuildFailed, Workplace
+from workplace import BuildFailed, Outcome, Workplace
 
 SURVIVORS = "Tests/mutation/survivors.txt"
 WANTED_SHARE = 0.95
+# Of the few of the short form; enough to know that its parts work together.
+WANTED_SHARE_IN_SHORT = 0.5
 COUNTED = ("killed", "SURVIVED")
 
 
@@ -30,8 +34,12 @@ def parse_arguments() -> argparse.Namespace:
     add("seed", nargs="?", type=int, help="of the random choice (default: a new one, printed)")
     add("--only", nargs="+", metavar="MUTANT", help="these, by number or as FILE:LINE[:KIND]")
     add("--list", action="store_true", help="print all mutants and test none")
-    for path in ("root", "work", "cruby", "pcre2"):
-        add(f"--{path}", required=True, help=argparse.SUPPRESS)
+    for path in ("root", "work"):
+        add(f"--{path}", required=True, type=Path, help=argparse.SUPPRESS)
+    for path in ("cruby", "pcre2"):
+        add(f"--{path}", help=argparse.SUPPRESS)
+    # The portable base only, with what this build folder of the tree itself has.
+    add("--short", type=Path, help=argparse.SUPPRESS)
     return parser.parse_args()
 
 
@@ -94,8 +102,8 @@ def shuffle(sites: list[Site], seed: int) -> list[int]:
 class Session:
     """Tests mutants and counts what became of them."""
 
-    def __init__(self, place: Workplace, sites: list[Site], explained: dict):
-        self.place = place
+    def __init__(self, judge: Callable[[Site, int], Outcome], sites: list[Site], explained: dict):
+        self.judge = judge
         self.sites = sites
         self.explained = explained
         self.verdicts: Counter[str] = Counter()
@@ -109,7 +117,7 @@ class Session:
     def test(self, number: int) -> None:
         site = self.sites[number - 1]
         began = time.monotonic()
-        outcome = self.place.judge(site, number)
+        outcome = self.judge(site, number)
         self.verdicts[outcome.verdict] += 1
         if outcome.verdict in COUNTED:
             self.files.add(site.file)
@@ -130,8 +138,8 @@ class Session:
         self.unexplained += 1
         return " UNEXPLAINED\n" + entry_of(site) + "\n      "
 
-    def report(self) -> bool:
-        """Whether enough were killed of those that can be."""
+    def report(self) -> float:
+        """The share that was killed of those that can be."""
         killed = self.verdicts["killed"]
         share = killed / max(1, killed + self.unexplained)
         killers = ", ".join(f"{name} {count}" for name, count in self.killers.most_common())
@@ -142,18 +150,42 @@ figure: {self.counted()} mutants of {len(self.files)} files: {killed} killed, \
 figure: killed by {killers or "none"}
 figure: besides, {self.verdicts["refused"]} were refused by the compiler and \
 {self.verdicts["same"]} changed nothing in what it made""")
-        return share >= WANTED_SHARE
+        return share
+
+
+def find_sites(tree: Path, build: Path, explained: dict) -> list[Site]:
+    sites = Finder(tree).find(build / "compile_commands.json")
+    for key in explained.keys() - {site.key() for site in sites}:
+        raise SystemExit(f"error: {SURVIVORS} has a mutant that does not exist: " + ", ".join(key))
+    return sites
+
+
+def test_at_random(session: Session, options: argparse.Namespace, numbers: Iterable[int]) -> float:
+    for number in numbers:
+        if session.counted() == options.count:
+            break
+        session.test(number)
+    return session.report()
+
+
+def test_in_short(options: argparse.Namespace, explained: dict) -> int:
+    sites = find_sites(options.root, options.short, explained)
+    place = NativePlace(options.short / "native", options.work)
+    session = Session(lambda site, _: place.judge(options.root, site), sites, explained)
+    numbers = (n for n in shuffle(sites, options.seed) if place.takes(options.root, sites[n - 1]))
+    return 0 if test_at_random(session, options, numbers) >= WANTED_SHARE_IN_SHORT else 1
 
 
 def main() -> int:
     options = parse_arguments()
-    root = Path(options.root)
-    explained = read_survivors(root / SURVIVORS)
-    place = Workplace(root, Path(options.work))
+    explained = read_survivors(options.root / SURVIVORS)
+    if options.seed is None:
+        options.seed = secrets.randbelow(1 << 32)
+    if options.short:
+        return test_in_short(options, explained)
+    place = Workplace(options.root, options.work)
     place.copy_tree(options.cruby, options.pcre2)
-    sites = Finder(place.tree).find(place.build("release") / "compile_commands.json")
-    for key in explained.keys() - {site.key() for site in sites}:
-        raise SystemExit(f"error: {SURVIVORS} has a mutant that does not exist: " + ", ".join(key))
+    sites = find_sites(place.tree, place.build("release"), explained)
     if options.list:
         for number, site in enumerate(sites, 1):
             print(f"{describe(number, site)}\n{entry_of(site)}")
@@ -161,19 +193,15 @@ def main() -> int:
     chosen = choose(options.only, sites) if options.only else []
 
     place.build_original()
-    session = Session(place, sites, explained)
+    session = Session(place.judge, sites, explained)
     if chosen:
         for number in chosen:
             session.test(number)
         session.report()
         return 1 if session.unexplained else 0
-    seed = secrets.randbelow(1 << 32) if options.seed is None else options.seed
-    print(f"{options.count} of {len(sites)} mutants, seed {seed}", flush=True)
-    for number in shuffle(sites, seed):
-        if session.counted() == options.count:
-            break
-        session.test(number)
-    return 0 if session.report() else 1
+    print(f"{options.count} of {len(sites)} mutants, seed {options.seed}", flush=True)
+    share = test_at_random(session, options, shuffle(sites, options.seed))
+    return 0 if share >= WANTED_SHARE else 1
 
 
 if __name__ == "__main__":

@@ -239,7 +239,9 @@ class Workplace:
                 stderr=output,
                 preexec_fn=_limit_files,
             ).returncode
-        return _failure(status, log.read_bytes()[start:].decode(errors="replace")) if status else ""
+        if not status:
+            return ""
+        return failure_of(status, log.read_bytes()[start:].decode(errors="replace"))
 
     def _clean_up(self) -> None:
         """What a test that was cut short has left in its folders."""
@@ -275,7 +277,7 @@ def _limit_files() -> None:
     resource.setrlimit(resource.RLIMIT_CORE, (0, 0))
 
 
-def _failure(status: int, output: str) -> str:
+def failure_of(status: int, output: str) -> str:
     failed = re.search(r"^\[  FAILED  \] ([\w/]+\.[\w/]+)", output, re.MULTILINE)
     if failed:
         return failed[1]
