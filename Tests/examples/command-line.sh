@@ -47,7 +47,8 @@ expect_js 0 'text' 'tarn.message("done");'
 expect 0 'Debug: GetIDsOfNames call succeeded.' --trace macro.js
 expect_js 1 'Syntax error' 'x = = 1;'
 expect_js 1 'macro.js:2:' "$(printf 'tarn.write("x");\nnothing.here();')"
-expect_js 1 'nothing is no macro function' 'tarn.nothing();'
+expect_js 1 'nothing is no macro function (see' 'tarn.nothing();'
+expect_js 1 'lineCount is no macro function; did you mean line_count? (see' 'tarn.lineCount();'
 expect_js 0 '' 'try { tarn.nothing(); } catch (error) {}'
 expect 1 "Error creating 'No.Engine'" --engine No.Engine macro.js
 echo 'tarn.message("as JScript");' > macro.xyz

@@ -1,8 +1,11 @@
 // SPDX-License-Identifier: MIT
 #include "MacroFunctions.h"
 
+#include <algorithm>
+#include <cctype>
 #include <cstring>
 #include <iterator>
+#include <numeric>
 
 #include "Encoding.h"
 #include "MacroCall.h"
@@ -35,6 +38,21 @@ std::string Hindrance(const std::string& text, TextPassage passage) {
          "macro (in UTF-8, capital umlauts and dashes have one)";
 }
 
+// How many characters have to be changed, added or left out to make one text the other.
+std::size_t EditDistance(std::string_view from, std::string_view to) {
+  std::vector<std::size_t> row(to.size() + 1);  // from the text so far to each beginning of `to`
+  std::iota(row.begin(), row.end(), std::size_t{0});
+  for (const char ch : from) {
+    std::size_t diagonal = row[0]++;
+    for (std::size_t i = 0; i < to.size(); ++i) {
+      const std::size_t replaced = diagonal + (std::tolower(static_cast<unsigned char>(ch)) != to[i]);
+      diagonal = row[i + 1];
+      row[i + 1] = std::min({replaced, diagonal + 1, row[i] + 1});
+    }
+  }
+  return row.back();
+}
+
 void CheckResult(const MacroFunction& function, const MacroCall& call, const MacroResult& result,
                  TextPassage passage) {
   const std::string* text = std::get_if<std::string>(&result);
@@ -62,6 +80,14 @@ std::uint32_t MacroFunctionId(std::string_view name) {
       return id;
   }
   return kUnknownId;
+}
+
+std::string NoMacroFunction(std::string_view name) {
+  const auto distance = [name](const MacroFunction& each) { return EditDistance(name, each.name); };
+  const MacroFunction& nearest = *std::ranges::min_element(MacroFunctions(), {}, distance);
+  const bool alike = distance(nearest) <= std::max<std::size_t>(1, name.size() / 4);
+  return std::string(name) + " is no macro function" +
+         (alike ? "; did you mean " + std::string(nearest.name) + "?" : "") + " (see --functions)";
 }
 
 MacroResult CallMacroFunction(std::uint32_t id, Editor& editor, EditorServices& services,

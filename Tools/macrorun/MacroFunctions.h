@@ -88,6 +88,8 @@ std::span<const MacroFunction> MacroFunctions();
 // The number of a function, in any case (some script languages know none); kUnknownId if there is
 // none. Never 0, which engines call for an object's default value.
 std::uint32_t MacroFunctionId(std::string_view name);
+// What to say of such a name; with the function that may have been meant.
+std::string NoMacroFunction(std::string_view name);
 
 // How a script engine shows its macros a text result, which it gets in UTF-16 by the system's ANSI
 // code page.

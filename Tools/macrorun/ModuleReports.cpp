@@ -4,6 +4,7 @@
 #include <utility>
 
 #include "EngineWatch.h"
+#include "MacroFunctions.h"
 #include "xLib/xTexts.h"
 
 namespace {
@@ -45,7 +46,7 @@ void ModuleReports::TakeScriptError(ErrorReport error) {
   const bool names = error.message.empty() || error.message.find(unknown) != std::string::npos;
   if (!unknown.empty() && names) {
     error.function = unknown;
-    error.message = unknown + " is no macro function (see --functions)";
+    error.message = NoMacroFunction(unknown);
   }
   run.unknownFunction.clear();
   if (error.message.empty()) error.message = "script error";
