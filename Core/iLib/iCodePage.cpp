@@ -10,11 +10,11 @@ u32 ActiveCodePage() { return activeCodePage; }
 
 void SetActiveCodePageFromKeyboard() {
   const WORD language = LOWORD(reinterpret_cast<DWORD_PTR>(GetKeyboardLayout(0)));
-  char digits[16];
-  const int size = GetLocaleInfoA(MAKELCID(language, SORT_DEFAULT), LOCALE_IDEFAULTANSICODEPAGE,
-                                  digits, sizeof digits);
+  char digits[16] = "";
+  GetLocaleInfoA(MAKELCID(language, SORT_DEFAULT), LOCALE_IDEFAULTANSICODEPAGE, digits,
+                 sizeof digits);
   // A language that is only written in Unicode has the number 0.
-  const u32 codePage = size > 0 ? static_cast<u32>(atoi(digits)) : 0;
+  const u32 codePage = static_cast<u32>(atoi(digits));
   activeCodePage = codePage ? codePage : kUtf8CodePage;
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include <algorithm>
 #include <map>
-#include <memory>
+#include <set>
 
 #include "TestSupport.h"
 #include "cLib/StringDZ.h"
@@ -31,7 +31,7 @@ TEST_F(Containers, ReportMisuseAndChangeNothing) {
       {2, "cArray",
        [&] { return array.SetAt(none, -1) == -1 && array.SetAt(none, INT_MAX) == -1; }},
       {0, "leak deteched", [&] { return array.Clear(), array.SetAt(&element, 0) == 0; }},
-      {2, "cArray", [&] { return array.Grow(0), !array.Detach(1); }},
+      {3, "cArray", [&] { return array.Grow(0), array.Grow(-1), !array.Detach(1); }},
       {1, "cArray", [&] { return FailAllocation(1), array.Grow(1), true; }},
       {1, "beyond capacity",
        [&] { return breakCount(51) && (broken.Grow(1), broken.Clear(), broken.Count() == 0); }},
@@ -105,6 +105,26 @@ TEST_F(Containers, HashTableHashesEveryByteAndLivesWithoutMemory) {
   FailAllocation(1);
   cHashTable<Element> none;
   EXPECT_EQ(none.Insert("key", 1) + none.Find("key") + none.Remove("key"), 0u);
+}
+
+// Nobody may, but it costs no more than the elements that are not deleted.
+TEST_F(Containers, HashTableBearsElementsThatClearAnother) {
+  static std::set<Element*> alive;
+  struct Clearing : Element {
+    cHashTable<Element>& other;
+    explicit Clearing(cHashTable<Element>& table) : other(table) { alive.insert(this); }
+    ~Clearing() override { other.Clear(), alive.erase(this); }
+  };
+  cHashTable<Element> other;
+  {
+    cHashTable<Element> table;
+    for (const char* key : {"a", "b", "c"})
+      table.Insert(key, reinterpret_cast<u32>(new Clearing(other)));
+    table.Clear();
+    EXPECT_TRUE(table.EntryCount() == 2 && alive.size() == 2);
+  }
+  ASSERT_EQ(alive.size(), 1u) << "the destructor has deleted one more";
+  delete *alive.begin();
 }
 
 TEST_F(Containers, HashTableIsWalkedBucketByBucketNewestFirst) {

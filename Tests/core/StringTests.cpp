@@ -91,7 +91,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
   EXPECT_TRUE(AddSizes(UINT_MAX - 1, 1) == UINT_MAX && AddSizes(UINT_MAX, 2) == UINT_MAX);
   EXPECT_TRUE(MultiplySizes(INT_MAX, 2) == UINT_MAX - 1 && MultiplySizes(3, 1u << 31) == UINT_MAX);
   EXPECT_EQ(MultiplySizes(3, 0), 0u);
-  for (int i = 0; i < 14; ++i, string.Reserve(1)) EXPECT_EQ(string.GrowBy(), 4u << std::min(i, 13));
+  for (int i = 0; i < 15; ++i, string.Reserve(1)) EXPECT_EQ(string.GrowBy(), 4u << std::min(i, 13));
   EXPECT_TRUE(string.Reserve(string.Capacity()) && Text(string.Text(), 5) == "ab\0\0\0"s);
 }
 

@@ -88,15 +88,16 @@ TEST_F(SystemText, Converts) {
   EXPECT_EQ(Bytes(text), Bytes(String(L"a\u00E9", ActiveCodePage())));
   text = "hELLO wORLD-foo 3D x", text.CapitalizeWords();
   EXPECT_EQ(Bytes(text), "Hello World-Foo 3d X");
-  for (const int room : {1, 2, 3, 8}) {
-    const int count = room > 1 ? 2 : 0;
-    Text bytes(8, '#');
-    std::wstring units(8, '#');
-    EXPECT_EQ(Utf16ToMultiByte(L"ab", 2, bytes.data(), room, 1252), count);
-    EXPECT_EQ(MultiByteToUtf16("ab", 2, units.data(), room, 1252), count);
-    EXPECT_EQ(std::count(bytes.begin(), bytes.end(), 0), count ? std::min(room - 2, 2) : 1);
-    EXPECT_EQ(std::count(units.begin(), units.end(), 0), count ? std::min(room - 2, 4) : 0);
-  }
+  for (const int size : {1, 2})
+    for (const int room : {1, 2, 3, 8}) {
+      const int count = room < size ? 0 : size;
+      Text bytes(8, '#');
+      std::wstring units(8, '#');
+      EXPECT_EQ(Utf16ToMultiByte(L"ab", size, bytes.data(), room, 1252), count);
+      EXPECT_EQ(MultiByteToUtf16("ab", size, units.data(), room, 1252), count);
+      EXPECT_EQ(std::count(bytes.begin(), bytes.end(), 0), count ? std::min(room - size, 2) : 1);
+      EXPECT_EQ(std::count(units.begin(), units.end(), 0), count ? std::min(room - size, 4) : 0);
+    }
 }
 
 TEST_F(SystemText, StaysAsItWasWithoutMemory) {
@@ -177,9 +178,10 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
   const Text path = testing::TempDir() + "core-description.ini";
   Profile profile(path.c_str()), impossible("?:\\no\\x.ini");
   xScriptInfo defaults(true), info(false), again(false);
-  info.NoCase = info.FixCRLF = info.FixDelimiter = true, info.SetDefaults();
+  info.NoCase = info.FixCRLF = info.FixDelimiter = true, info.FunctionPrefix = "x";
+  info.SetDefaults();
   EXPECT_FALSE(info.IsNoCase() || info.IsFixCRLF() || info.IsFixDelimiter());
-  EXPECT_TRUE(info.OpenBracket == '(' && info.CloseBracket == ')');
+  EXPECT_TRUE(info.OpenBracket == '(' && info.CloseBracket == ')' && info.FunctionPrefix.IsEmpty());
   EXPECT_FALSE(again.IsNoCase() || again.IsFixCRLF() || again.IsFixDelimiter());
   EXPECT_TRUE(!again.OpenBracket && !again.CloseBracket);
   profile.WriteString("1", "Options", "NoCase");
