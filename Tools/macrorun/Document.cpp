@@ -216,28 +216,10 @@ void Document::Apply(Edit edit) {
   if (!same) history.Add(std::move(edit));
 }
 
-void Document::Exchange(const Edit& edit, bool forward) {
-  const Edit::State& old = forward ? edit.before : edit.after;
-  const Edit::State& now = forward ? edit.after : edit.before;
-  const bool endsStay = old.lastLineEnds == now.lastLineEnds;
-  if (flat && endsStay && edit.first - 1 + old.lines.size() < lines.size())
-    UpdateFlat(edit.first, old.lines.size(), now.lines);
-  else
-    flat.reset();
-  const std::size_t common = std::min(old.lines.size(), now.lines.size());
-  const auto place = lines.begin() + static_cast<std::ptrdiff_t>(edit.first - 1);
-  const auto source = now.lines.begin();
-  const auto count = static_cast<std::ptrdiff_t>(common);
-  std::copy(source, source + count, place);
-  if (old.lines.size() > common)
-    lines.erase(place + count, place + static_cast<std::ptrdiff_t>(old.lines.size()));
-  else
-    lines.insert(place + count, source + count, now.lines.end());
-  lastLineEnds = now.lastLineEnds;
-}
-
-void Document::UpdateFlat(std::size_t first, std::size_t count, const std::vector<TextLine>& now) {
-  auto& [text, starts, utf8] = *flat;
+// Puts lines into the place of `count` others that have lines behind them.
+static void UpdateFlat(FlatText& flatText, std::size_t first, std::size_t count,
+                       const std::vector<TextLine>& now) {
+  auto& [text, starts, utf8] = flatText;
   const auto place = starts.begin() + static_cast<std::ptrdiff_t>(first - 1);
   const auto rest = place + static_cast<std::ptrdiff_t>(count);
   const std::size_t begin = *place, end = *rest;
@@ -252,6 +234,26 @@ void Document::UpdateFlat(std::size_t first, std::size_t count, const std::vecto
     *start = *start - end + begin + newText.size();
   text.replace(begin, end - begin, newText);
   starts.insert(starts.erase(place, rest), newStarts.begin(), newStarts.end());
+}
+
+void Document::Exchange(const Edit& edit, bool forward) {
+  const Edit::State& old = forward ? edit.before : edit.after;
+  const Edit::State& now = forward ? edit.after : edit.before;
+  const bool endsStay = old.lastLineEnds == now.lastLineEnds;
+  if (flat && endsStay && edit.first - 1 + old.lines.size() < lines.size())
+    UpdateFlat(*flat, edit.first, old.lines.size(), now.lines);
+  else
+    flat.reset();
+  const std::size_t common = std::min(old.lines.size(), now.lines.size());
+  const auto place = lines.begin() + static_cast<std::ptrdiff_t>(edit.first - 1);
+  const auto source = now.lines.begin();
+  const auto count = static_cast<std::ptrdiff_t>(common);
+  std::copy(source, source + count, place);
+  if (old.lines.size() > common)
+    lines.erase(place + count, place + static_cast<std::ptrdiff_t>(old.lines.size()));
+  else
+    lines.insert(place + count, source + count, now.lines.end());
+  lastLineEnds = now.lastLineEnds;
 }
 
 void Document::MovePlaces(const Edit& edit, bool forward) {

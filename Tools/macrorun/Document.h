@@ -94,8 +94,6 @@ class Document {
   void Apply(Edit edit);
   // Puts an edit's new lines into the place of its old ones, or the other way round.
   void Exchange(const Edit& edit, bool forward);
-  // For lines that have lines behind them, before and after.
-  void UpdateFlat(std::size_t first, std::size_t count, const std::vector<TextLine>& now);
   void MovePlaces(const Edit& edit, bool forward);
   Position NearestCharacter(Position place) const;
 

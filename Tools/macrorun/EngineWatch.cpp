@@ -93,6 +93,7 @@ HRESULT EngineWatch::Create(REFIID riid, void** object) {
   const HRESULT created =
       registration != 0 ? CreateRegistered(&engine) : CreateFromManifest(&engine);
   if (FAILED(created)) return created;
+  if (!engine) return E_POINTER;
   IActiveScriptParse* parser = nullptr;
   const HRESULT parses =
       engine->QueryInterface(kActiveScriptParse, reinterpret_cast<void**>(&parser));

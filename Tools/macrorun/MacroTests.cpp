@@ -96,8 +96,9 @@ bool MacroTests::RunAll() {
   std::size_t number = 0;
   for (Test& test : tests) {
     const std::string name = ToUtf8(test.macro), textCase = ToUtf8(test.textCase);
-    reporter.Progress(++number, tests.size(),
-                      name + (textCase.empty() ? "" : " (" + textCase + ")"));
+    std::string shown = name;
+    if (!textCase.empty()) shown.append(" (").append(textCase).append(")");
+    reporter.Progress(++number, tests.size(), shown);
     UseLanguageOf(test.macro);
     reporter.SetMacro(name, textCase);
     RunOne(test);

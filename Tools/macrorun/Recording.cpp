@@ -71,7 +71,9 @@ class StepReader {
   std::string String(const std::string& key, const char* expected) const;
   void CheckText(const std::string& key, const std::string& text) const;
   std::string Bytes(const std::string& key, const json& list) const;
-  RecordedStep Typed(std::string text) const { return {place, RecordedStep::Kind::kText, text}; }
+  RecordedStep Typed(std::string text) const {
+    return {place, RecordedStep::Kind::kText, std::move(text)};
+  }
   RecordedStep Key() const;
   RecordedStep Call() const;
   StepArgument Argument(std::size_t number, const json& value) const;
@@ -150,7 +152,7 @@ RecordedStep StepReader::Key() const {
 RecordedStep StepReader::Call() const {
   const std::string name = String("call", "the name of a macro function");
   const MacroFunction* function = FunctionNamed(name);
-  if (!function) Fail("call", name + " is no macro function (see --functions)");
+  if (!function) Fail("call", NoMacroFunction(name));
   RecordedStep call = {place, RecordedStep::Kind::kCall, {}, function};
   const json arguments = step.value("arguments", json::array());
   if (!arguments.is_array()) Fail("arguments", "expected a list, got " + Shown(arguments));

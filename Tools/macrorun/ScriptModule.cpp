@@ -25,7 +25,7 @@ using VersionFunction = bool(__stdcall*)(ScriptInfoRecord* record, const char* h
 
 template <class Function>
 Function As(FARPROC address) {
-  return reinterpret_cast<Function>(reinterpret_cast<void*>(address));
+  return reinterpret_cast<Function>(reinterpret_cast<void (*)()>(address));
 }
 
 void Copy(const fs::path& from, const fs::path& to) {
@@ -99,12 +99,14 @@ PrivateFolder::PrivateFolder() {
                    error.message());
 }
 
-PrivateFolder::~PrivateFolder() {
+PrivateFolder::~PrivateFolder() try {
   std::error_code error;
   RemoveFolder(path, error);
   if (error)
     std::fprintf(stderr, "macrorun: the temporary folder %s is left behind: %s\n",
                  ToUtf8(path).c_str(), error.message().c_str());
+} catch (const std::bad_alloc&) {
+  return;  // a later program removes it
 }
 
 ScriptModule::ScriptModule(const fs::path& file, const Language* language) {
