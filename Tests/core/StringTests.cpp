@@ -50,6 +50,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
        "\xC3\xA9\x7F\xC2\x80", 35, 4},
       {"abcd", [](String& s) { s = s.Mid(1, UINT_MAX) + s.MidFrom(3).Text(); }, "bcdd"},
       {"abc", [](String& s) { s.Format("%s", ""); }, "", 8, 4},
+      {"abc", [](String& s) { s.Format(kNull, 0); }, "...."},
       {"%s", [](String& s) { s.Format(s.Text(), kLong.c_str()); }, "%s...."},
       {"", [](String& s) { s.Format("%.4095s", kLong.c_str()); }, kLong.substr(0, 4095)},
       {"", [](String& s) { s.Format("%.4096s", kLong.c_str()); }, "%.4096s...."},

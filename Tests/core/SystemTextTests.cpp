@@ -34,6 +34,7 @@ TEST_F(SystemText, LoadsResources) {
   EXPECT_EQ(strlen(text.FormatResource(2)), 1024u);
   EXPECT_TRUE(text.LoadResource(2) && text.Length() == 1024 && TakeReports() == 0);
   EXPECT_TRUE(!text.LoadResource(77) && text.IsEmpty() && TakeReports(missing) == 1);
+  text = "old";
   EXPECT_TRUE(!*text.FormatResource(77) && text.IsEmpty() && TakeReports(missing) == 1);
 }
 

@@ -99,14 +99,16 @@ PrivateFolder::PrivateFolder() {
                    error.message());
 }
 
-PrivateFolder::~PrivateFolder() try {
-  std::error_code error;
-  RemoveFolder(path, error);
-  if (error)
-    std::fprintf(stderr, "macrorun: the temporary folder %s is left behind: %s\n",
-                 ToUtf8(path).c_str(), error.message().c_str());
-} catch (const std::bad_alloc&) {
-  return;  // a later program removes it
+PrivateFolder::~PrivateFolder() {
+  try {
+    std::error_code error;
+    RemoveFolder(path, error);
+    if (error)
+      std::fprintf(stderr, "macrorun: the temporary folder %s is left behind: %s\n",
+                   ToUtf8(path).c_str(), error.message().c_str());
+  } catch (...) {
+    std::fputs("macrorun: no memory to remove the temporary folder; a later run does\n", stderr);
+  }
 }
 
 ScriptModule::ScriptModule(const fs::path& file, const Language* language) {
