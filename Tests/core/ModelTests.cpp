@@ -8,6 +8,8 @@ struct Program {
   size_t steps;
 };
 
+void PrintTo(const Program& program, std::ostream* out) { *out << program.name; }
+
 class Models : public CoreTest, public testing::WithParamInterface<Program> {};
 
 TEST_P(Models, AgreeAfterEachStep) {

@@ -43,9 +43,10 @@ std::size_t EditDistance(std::string_view from, std::string_view to) {
   std::vector<std::size_t> row(to.size() + 1);  // from the text so far to each beginning of `to`
   std::iota(row.begin(), row.end(), std::size_t{0});
   for (const char ch : from) {
+    const int small = std::tolower(static_cast<unsigned char>(ch));
     std::size_t diagonal = row[0]++;
     for (std::size_t i = 0; i < to.size(); ++i) {
-      const std::size_t replaced = diagonal + (std::tolower(static_cast<unsigned char>(ch)) != to[i]);
+      const std::size_t replaced = diagonal + (small != to[i]);
       diagonal = row[i + 1];
       row[i + 1] = std::min({replaced, diagonal + 1, row[i] + 1});
     }
