@@ -125,7 +125,8 @@ class Workplace:
 
     def _copy_files(self) -> None:
         """Files that are the same keep their times; what no build reads stays out."""
-        left_out = (f"--exclude=/{name}" for name in ("build", ".git", "Docs", "Tests/mutation"))
+        harness = (f"Tests/mutation/{name}" for name in ("*.py", "survivors.txt"))
+        left_out = (f"--exclude=/{name}" for name in ("build", ".git", "Docs", *harness))
         command = ("rsync", "-rlpci", "--delete", *left_out, f"{self.root}/", f"{self.tree}/")
         if subprocess.run(command, check=True, capture_output=True).stdout:
             self.stamp.unlink(missing_ok=True)
