@@ -128,7 +128,7 @@ String::String(char ch, u32 count) {
 void String::Assign(const char* s) {
   const Argument from(*this, s, TextLength(s));
   if (s && !from.bytes) return;
-  if (from.size >= capacity && AddSizes(growBy, from.size) >= capacity) {
+  if (from.size >= capacity) {
     const u32 wanted = AddSizes(AddSizes(growBy, 1), from.size);
     char* block = static_cast<char*>(AllocateBlock(wanted));
     if (!block) return;
@@ -437,8 +437,10 @@ bool String::Substitute(const char* oldText, const char* newText) {
   const Argument to(*this, newText, TextLength(newText));
   if (!from.bytes || !to.bytes || !Reserve(AddSizes(length, to.size))) return false;
   const char* found = strstr(text, from.bytes);
-  if (found) ReplaceAt(static_cast<u32>(found - text), from.size, to.bytes, to.size);
-  length = LengthOf(text);
+  if (found)
+    ReplaceAt(static_cast<u32>(found - text), from.size, to.bytes, to.size);
+  else
+    length = LengthOf(text);
   return found != nullptr;
 }
 

@@ -180,7 +180,8 @@ class String {
   u32 TextLength(const char* s, u32 most = kLargestSize) const;  // of an argument
   bool Begin(u32 n);                      // the first block, for `n` characters
   void TakeBlock(char* block, u32 size);  // in place of the old one
-  void ReplaceAt(u32 pos, u32 count, const char* bytes, u32 size);  // the block has room
+  // The block has room. The length is counted anew, up to a zero byte.
+  void ReplaceAt(u32 pos, u32 count, const char* bytes, u32 size);
   void ReplaceEach(u32 occurrences, const Argument& from, const Argument& to, u32 result);
   void DeleteThroughSlot(u32& pos);
   void FromWideIn(u32 codePage, const wchar_t* w, u32 units, u32 room);

@@ -19,7 +19,7 @@ const char* NarrowFromWide(const wchar_t* text) { return NarrowFromWide(text, na
 
 const wchar_t* WideFromNarrow(const char* text) {
   if (!text) text = "";
-  // Four bytes a unit are more than any code page needs, so a character that is cut at the end of
+  // A byte makes one unit at most. Four bytes a unit are more than any code page needs, so a character that is cut at the end of
   // what is converted lies behind the last unit that is kept.
   wchar_t units[4 * kWideLimit];
   const int bytes = static_cast<int>(strnlen(text, 4 * kWideLimit));

@@ -11,7 +11,8 @@
 String ModuleFolder();
 
 // Whether the current user, as the thread's token has it when it impersonates, else the process's,
-// may read and write the folder by its security descriptor. Nothing is written to find out.
+// may read and write the folder by its security descriptor. Nothing is written to find out. False
+// for a folder that is missing, and for null.
 bool MayReadAndWrite(const char* folder);
 
 // Makes the folder and its missing parents. Whether it is there afterwards; false for empty.

@@ -45,7 +45,7 @@ bool ProfileSection::Load() {
     if (units[i] != 0 && (units[i] < ' ' || units[i] > '~')) return false;
     entries[i] = static_cast<char>(units[i]);
   }
-  entries[size] = entries[size + 1] = 0;
+  entries[size] = 0;  // the last one's terminator is counted
   for (const char* entry = entries; *entry; entry += strlen(entry) + 1)
     if (IsBlank(*entry) || !strchr(entry, '=')) return false;
   return true;

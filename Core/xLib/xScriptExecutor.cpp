@@ -141,10 +141,9 @@ void xScriptExecutor::SendReport(HRESULT result, const char* format, const char*
   String text = FormatName(format, name);
   // A message that wants inserts has none to show: it counts as no message.
   char reason[2048] = "";
-  const DWORD length =
-      FormatMessageA(FORMAT_MESSAGE_FROM_SYSTEM, nullptr, static_cast<DWORD>(result),
-                     MAKELANGID(LANG_NEUTRAL, SUBLANG_DEFAULT), reason, sizeof reason, nullptr);
-  if (length != 0 && *reason) {
+  FormatMessageA(FORMAT_MESSAGE_FROM_SYSTEM, nullptr, static_cast<DWORD>(result),
+                 MAKELANGID(LANG_NEUTRAL, SUBLANG_DEFAULT), reason, sizeof reason, nullptr);
+  if (*reason) {
     text.Append("\nReason: ");
     text.Append(reason);
   }

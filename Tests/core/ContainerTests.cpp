@@ -38,6 +38,8 @@ TEST_F(Containers, ReportMisuseAndChangeNothing) {
       {2, "beyond capacity",
        [&] { return breakCount(1000) && (broken.Grow(1), broken.Clear(), broken.Count() == 0); }},
       {1, "cArray", [&] { return FailAllocation(1), firstSlot(Array<Element>()) == 1; }},
+      // The slots that a fifth more takes have no number of 32 bits with a sign.
+      {1, "No memory for the slots", [&] { return array.SetAt(none, 1789569707) == -1; }},
       {1, "leak deteched", [&] { return array.SetAt(none, 0) == 0; }},
       {1, "leak deteched", [&] { return fifo.Push(&other); }},
       {2, "cFilo", [&] { return !fifo.SetAt(none, 1) && fifo.SetAt(none, 0) && fifo.Push(none); }},

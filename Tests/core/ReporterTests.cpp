@@ -6,6 +6,7 @@
 #include "TestSupport.h"
 #include "cLib/cCompat.h"
 #include "cLib/cReport.h"
+#include "cLib/cStop.h"
 
 class Reporter : public CoreTest {
  protected:
@@ -62,4 +63,16 @@ TEST_F(Reporter, WritesLinesWhereItIsToldAndNeverCallsTheHookFromWithin) {
   EXPECT_EQ(_setmode(1, _O_TEXT), _O_TEXT) << "as it was";
 #endif
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "a\n%s");
+}
+
+TEST_F(Reporter, TellsOfAStopWithoutARunAndJumpsWithItsValue) {
+  StopMacro();
+  EXPECT_EQ(TakeReports("Stop without a run to stop"), 1);
+  const int value = setjmp(CurrentStopPoint().buffer);
+  if (value == 0) {
+    CurrentStopPoint().armed = true;
+    StopMacro();
+  }
+  CurrentStopPoint().armed = false;
+  EXPECT_EQ(value, -1);
 }

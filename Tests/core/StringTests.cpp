@@ -23,6 +23,8 @@ struct Case {
 TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
   const Case cases[] = {
       {"", [](String& s) { s.Reserve(10); }, "", 15, 8},
+      {"", [](String& s) { s.Reserve(1019), s.Reserve(2000); }, "", 2009, 16},
+      {"", [](String& s) { s.Reserve(1020), s.Reserve(2000); }, "", 2009 * 13 / 10, 16},
       {"abc", [](String& s) { s = "1234567"; }, "1234567", 8, 4},
       {"abc", [](String& s) { s = "12345678"; }, "12345678", 13, 4},
       {"abc", [](String& s) { s = "1234567", s.Reserve(4); }, "1234567", 9, 8},
@@ -55,7 +57,7 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"", [](String& s) { s.Format("%.4095s", kLong.c_str()); }, kLong.substr(0, 4095)},
       {"", [](String& s) { s.Format("%.4096s", kLong.c_str()); }, "%.4096s...."},
       {"", [](String& s) { s.Format(kLong.c_str(), 0); }, kLong.substr(0, 4086) + "...."},
-      {"x", [](String& s) { s = String('\0', 3); }, ""},
+      {"x", [](String& s) { s.FromLatin1ToUtf8("x", -2); }, ""},
       {"abc", [](String& s) { s.Append("x", -2), s.SetAt(-1, s.Reserve(0)); }, "abc", 8, 4, 3},
       {"abc", [](String& s) { SetCapacity(s, 3), s.Append("x"), s.AppendChar('x'); }, "abc", 3, 4,
        2},
@@ -118,6 +120,7 @@ TEST_F(StringTest, ComparesAndSearches) {
               !upper.Equals("abc", true) && !upper.Equals("AB", 1));
   EXPECT_TRUE(String(" \tx").FirstNonBlank(2) == 2 && String(" \tx").FirstNonBlank(1) == -1 &&
               String("x").FirstNonBlank(0) == 0);
+  EXPECT_TRUE(String('\0', 3).IsEmpty() && String('x', 3).Equals("xxx", true));
   EXPECT_TRUE(upper.IsAlpha() && !String().IsAlpha() && !String("1a").IsAlpha());
   EXPECT_TRUE(!String("a1").IsAlpha() && String("\x80").HasHighBit() && high.HasHighBit() &&
               !upper.HasHighBit());

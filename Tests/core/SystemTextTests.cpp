@@ -23,9 +23,13 @@ using SystemText = CoreTest;
 TEST_F(SystemText, LoadsResources) {
   const Text missing = "Unexpected error loading '77' string resource";
   String text("old");
+  KeepModuleHandle(nullptr);
+  EXPECT_FALSE(IsInModule(&onBox));
   KeepModuleHandle(GetModuleHandleA(nullptr));
+  EXPECT_TRUE(IsInModule(&onBox) && !IsInModule(&text));
   EXPECT_EQ(Bytes(String(1u, "file", 3)), "file has 3 lines");
   EXPECT_TRUE(String(2u).Length() == 1023 && String(77u).IsEmpty() && Bytes(String(3u)) == "x");
+  EXPECT_EQ(String(77u).Capacity(), 5u) << "nothing to format";
   String loaded;
   EXPECT_TRUE(loaded.LoadResource(3) && loaded.Capacity() == 1030) << "room for the longest";
   EXPECT_STREQ(text.FormatResource(1, "file", 4), "file has 4 lines");
@@ -44,6 +48,7 @@ TEST_F(SystemText, NamesErrors) {
   SetLastError(ERROR_ACCESS_DENIED);
   EXPECT_FALSE(missing.FromError(code) || last.FromError(none));
   EXPECT_TRUE(none == ERROR_ACCESS_DENIED && !last.Equals(missing.Text(), true));
+  EXPECT_EQ(Bytes(last).substr(0, 6), "Access") << "in English";
   SetLastError(ERROR_FILE_NOT_FOUND);
   EXPECT_TRUE(!last.FromLastError() && last.Equals(missing.Text(), true) && last.Length() > 5);
   EXPECT_TRUE(!last.FromError(unknown) && last.EndsWith("performing the operation request!", true));
@@ -130,11 +135,12 @@ TEST_F(SystemText, ReadsTheClipboard) {
   String text("old");
   ASSERT_TRUE(OpenClipboard(nullptr) && EmptyClipboard() && CloseClipboard());
   EXPECT_TRUE(!GetClipboardText(text) && text.IsEmpty());
-  const HGLOBAL block = GlobalAlloc(GMEM_FIXED, 8);
-  memcpy(block, "abc\0def", 8);
+  const HGLOBAL block = GlobalAlloc(GMEM_MOVEABLE, 8);
+  memcpy(GlobalLock(block), "abc\0def", 8), GlobalUnlock(block);
   ASSERT_TRUE(OpenClipboard(nullptr) && SetClipboardData(CF_TEXT, block) && CloseClipboard());
   EXPECT_TRUE(GetClipboardText(text) && Bytes(text) == "abc");
   EXPECT_FALSE(CloseClipboard()) << "still open";
+  EXPECT_EQ(GlobalFlags(block) & GMEM_LOCKCOUNT, 0u) << "still locked";
 }
 
 // --- The application and the description file ----------------------------------------------------
@@ -183,6 +189,7 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
   info.SetDefaults();
   EXPECT_FALSE(info.IsNoCase() || info.IsFixCRLF() || info.IsFixDelimiter());
   EXPECT_TRUE(info.OpenBracket == '(' && info.CloseBracket == ')' && info.FunctionPrefix.IsEmpty());
+  EXPECT_STREQ(info.Description.Text(), "Object Rexx WSH Version 1.40");
   EXPECT_FALSE(again.IsNoCase() || again.IsFixCRLF() || again.IsFixDelimiter());
   EXPECT_TRUE(!again.OpenBracket && !again.CloseBracket);
   profile.WriteString("1", "Options", "NoCase");
@@ -220,6 +227,7 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
   EXPECT_TRUE(ProfileSection(profile, "Long").ReadString(value, "Tick", "")) << "a long section";
   std::ofstream(path) << "[Options]\na=\nT\nT=x\n";
   EXPECT_FALSE(ProfileSection(profile, "Options").ReadString(value, "T", "")) << "T has no sign";
+  EXPECT_FALSE(ProfileSection(profile, "Options").ReadString(value, "None", nullptr));
   EXPECT_TRUE(profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick"));
   EXPECT_TRUE(profile.ReadString(value, "Options", "Tick", "", false));
   EXPECT_EQ(value.Length(), 511u);

@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: MIT
 // Plain models of what the portable base does, and a program of random steps for each: the class under
 // test goes through the same steps as its model, and the two are compared after each one. The steps
-// are read from any bytes: core_tests makes them at random, the fuzz targets by coverage.
+// are read from any bytes: the fuzz targets choose those by coverage, and core_tests at random for all
+// models but those of log lines and escapes.
 //
 // Each returns the number of steps. Threading: one thread at a time.
 #pragma once

@@ -37,8 +37,8 @@ class Pair {
     // A new one now and then: the old one's block has grown so large that all fits in.
     if (model.size() > kLongest || Below(input, 64) == 0) Renew();
     // The argument as a text of its own, or as a part of the string.
-    const u32 from = Below(input, 1024);
-    const bool own = input.ConsumeBool() && from <= model.size();
+    const size_t from = Below(input, 1024) % (model.size() + 1);
+    const bool own = input.ConsumeBool();
     const std::string given = own ? Cut(model.substr(from)) : AnyText(input), before = model;
     FailAllocation(Below(input, 9) ? 0 : 1);
     u32 answer = 0;

@@ -24,7 +24,8 @@ TEST_F(DispatchTest, ArgumentsAndResults) {
       {VT_I4, -5},   {VT_I4, LONG_MIN}, {VT_INT, 12},    {VT_I2, 0xFFFE}, {VT_I1, 0x80},
       {VT_BSTR, 0},  {VT_BOOL, 1},      {VT_UI1, 200},   {VT_CY, 15000},  {VT_NULL, 0},
       {VT_EMPTY, 0}, {VT_UNKNOWN, 0},   {VT_DISPATCH, 0}};
-  const double reals[] = {2.5, -2.7, 2147483647.5, 2147483648.0, -2147483648.5, -1e20, 0.0 / 0.0};
+  const double reals[] = {2.5,           -2.7,          2147483647.5, 2147483648.0, -2147483648.5,
+                          -2147483649.0, -1e20,         0.0 / 0.0};
   const std::wstring texts[] = {L"a\u00E9\u20AC", L"cut\u0100here", std::wstring(600, 'x')};
   const std::string w1022(1022, 'w'), w5110(5110, 'w');
   const std::pair<std::vector<std::string>, unsigned> answers[] = {

@@ -114,6 +114,14 @@ TEST_F(VersionTest, AFolderThatMayNotBeWritten) {
   EXPECT_TRUE(fs::is_directory(product)) << "made for the description file";
   WriteBytes((product / "xMacroWSH.qwsh").string(), "[Options]\r\nLanguage=PerUser\r\n");
   Fill(392, 77, 392, "", other);
+  // A folder that may be written is replaced by the user's own, which is made.
+  std::error_code ignored;
+  fs::remove_all(product), fs::remove(product.parent_path(), ignored);
+  Fill(392, 77, 392, testFolder);
+  EXPECT_TRUE(fs::is_directory(product.parent_path()));
+  EXPECT_TRUE(CallExport<bool>(dll, "version", std::string(392, '\0').replace(0, 2, "\x88\1").data(),
+                               nullptr))
+      << "no folder at all";
   Permit(folder, "FA");
   FreeLibrary(other);
   fs::remove_all(product);

@@ -4,6 +4,9 @@
 Run by scripts/mutate.sh and, in its short form, by ctest. A mutant that the compiler refuses, or
 that makes the same DLL and the same objects of the tests, does not count. One that all tests pass has
 survived. Of the mutants that survivors.txt does not explain, at least 95 % must be caught.
+
+The short form has mutants of the portable base only and builds it natively, where an object says
+nothing about whether it is the same. Half of its few mutants are enough.
 """
 
 import argparse

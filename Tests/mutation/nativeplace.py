@@ -4,15 +4,16 @@ what has been built of the tree. Nothing of the tree or its build folder is chan
 """
 
 import json
+import os
 import shlex
 import subprocess
+import time
 from pathlib import Path
 
 from sites import Site
-from workplace import FAIL_FAST, Outcome, failure_of
+from workplace import FAIL_FAST, BuildFailed, Outcome, failure_of, limit_files
 
 PROGRAM = "bin/core_tests"
-SECONDS = 30  # for one run of it
 
 
 class NativePlace:
@@ -26,6 +27,12 @@ class NativePlace:
         listing = ("ninja", "-C", str(build), "-t", "commands", PROGRAM)
         steps = subprocess.run(listing, check=True, capture_output=True, text=True).stdout
         self.link = steps.splitlines()[-1]
+        self.limit = 600.0  # seconds, for one run
+        began = time.monotonic()
+        failed = self._run(build / PROGRAM)
+        if failed:
+            raise BuildFailed(f"{PROGRAM} fails without any mutation: {failed}")
+        self.limit = 10 + 5 * (time.monotonic() - began)
 
     def takes(self, tree: Path, site: Site) -> bool:
         return str(tree / site.file) in self.commands
@@ -38,13 +45,27 @@ class NativePlace:
         built, program = f"{mutated}.o", self.scratch / "core_tests"
         swapped = {str(source): str(mutated), target: built}
         compiled = [swapped.get(word, word) for word in command]
-        linked = self.link.replace(target, built).replace(f"-o {PROGRAM}", f"-o {program}")
+        linked = self.link
+        for old, new in ((f" {target} ", f" {built} "), (f"-o {PROGRAM} ", f"-o {program} ")):
+            if linked.count(old) != 1:
+                raise BuildFailed(f"no{old} in how {PROGRAM} is linked: {self.link}")
+            linked = linked.replace(old, new)
         for step in (compiled, ["sh", "-c", linked]):
             if subprocess.run(step, cwd=self.build, capture_output=True).returncode:
                 return Outcome("refused")
-        run = ("timeout", "-k", "5", str(SECONDS), str(program), FAIL_FAST)
-        tested = subprocess.run(run, cwd=self.scratch, capture_output=True)
-        if not tested.returncode:
-            return Outcome("SURVIVED")
-        output = tested.stdout.decode(errors="replace")
-        return Outcome("killed", f"core.native: {failure_of(tested.returncode, output)}")
+        failed = self._run(program)
+        return Outcome("killed", f"core.native: {failed}") if failed else Outcome("SURVIVED")
+
+    def _run(self, program: Path) -> str:
+        """What failed, empty when nothing did."""
+        log = self.scratch / "output.txt"
+        with log.open("wb") as output:
+            status = subprocess.run(
+                ("timeout", "-k", "5", f"{self.limit:.0f}", str(program), FAIL_FAST),
+                cwd=self.scratch,
+                env={**os.environ, "CORE_TEST_SEED": "1"},
+                stdout=output,
+                stderr=output,
+                preexec_fn=limit_files,
+            ).returncode
+        return failure_of(status, log.read_text(errors="replace")) if status else ""

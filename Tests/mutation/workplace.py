@@ -238,7 +238,7 @@ class Workplace:
                 stdin=subprocess.DEVNULL,
                 stdout=output,
                 stderr=output,
-                preexec_fn=_limit_files,
+                preexec_fn=limit_files,
             ).returncode
         if not status:
             return ""
@@ -273,7 +273,7 @@ def _same_file(a: Path, b: Path) -> bool:
     return (x.st_mtime_ns, x.st_size) == (y.st_mtime_ns, y.st_size)
 
 
-def _limit_files() -> None:
+def limit_files() -> None:
     resource.setrlimit(resource.RLIMIT_FSIZE, (LARGEST_FILE, LARGEST_FILE))
     resource.setrlimit(resource.RLIMIT_CORE, (0, 0))
 

@@ -82,7 +82,9 @@ TEST_F(AllocationTest, OfACallLikeTheLast) {
 
 // The module names its log file when it is loaded.
 TEST_F(AllocationTest, OfTheMacroEngineIsReported) {
-  const std::string path = testFolder + "\\memory.log";
+  std::string path = testFolder;
+  while (path.size() < 230) path += "\\.";
+  path += "\\" + std::string(254 - path.size(), 'l');  // the longest that there may be
   SetEnvironmentVariableA("SCRIPTRUBY_LOG", path.c_str());
   const HMODULE shipped = std::exchange(dll, LoadModule(testFolder + "\\logging"));
   SetEnvironmentVariableA("SCRIPTRUBY_LOG", nullptr);
@@ -97,11 +99,17 @@ TEST_F(AllocationTest, OfTheMacroEngineIsReported) {
 }
 
 TEST_F(AllocationTest, OfVersion) {
+  const auto fill = [] {
+    char record[392] = {'\x88', 1};  // its size
+    return CallExport<bool>(dll, "version", &record[0], "C:\\windows\\temp\\torture");
+  };
   FailEach(dll, "version", [&] {
     Describe("Language=JScript\r\nMacroEnd=a\\nb\r\n" + std::string(3000, 'x'));
-    char record[392] = {'\x88', 1};  // its size
-    CallExport<bool>(dll, "version", &record[0], "C:\\windows\\temp\\torture");
+    fill();
   });
+  FailRequest(1);
+  EXPECT_FALSE(fill()) << "without the macro engine";
+  EXPECT_TRUE(FailRequest(0) && fill());
 }
 
 class RubyAllocationTest : public AllocationTest {

@@ -55,6 +55,7 @@ TEST_F(MacroFileTest, IsConvertedHalfWay) {
 }
 
 TEST_F(MacroFileTest, ThatIsWrongHasTextsToFree) {
+  textsFreed = 0;
   results = {{"ParseScriptText", E_FAIL}};
   EXPECT_TRUE(SourceWith("SysFreeString", FreeText, "x = = 1") == L"x = = 1");
   results.clear();

@@ -38,7 +38,8 @@ std::string Hindrance(const std::string& text, TextPassage passage) {
          "macro (in UTF-8, capital umlauts and dashes have one)";
 }
 
-// How many characters have to be changed, added or left out to make one text the other.
+// How many characters have to be changed, added or left out to make one text the other, which is in
+// small letters; case does not count.
 std::size_t EditDistance(std::string_view from, std::string_view to) {
   std::vector<std::size_t> row(to.size() + 1);  // from the text so far to each beginning of `to`
   std::iota(row.begin(), row.end(), std::size_t{0});
