@@ -9,7 +9,7 @@
 # Docs/reliability.md as well, each under the command that made it. SCRIPTRUBY_TORTURE_SEED, or in
 # the section profile CORE_TEST_SEED, repeats a random test by the seed that it printed; FUZZ_SECONDS
 # is the time for each fuzz target (60), MUTANTS and MUTANT_SEED are how many mutants are tested (205)
-# and which (2027).
+# and which (2035).
 #
 # Sets the machine up and builds first when needed.
 set -euo pipefail
@@ -106,7 +106,7 @@ run() {
   undefined) record undefined "scripts/torture.sh undefined" undefined ;;
   tidy) record tidy "scripts/torture.sh tidy" tidy ;;
   mutation)
-    local mutants=${MUTANTS:-205} seed=${MUTANT_SEED:-2027}
+    local mutants=${MUTANTS:-205} seed=${MUTANT_SEED:-2035}
     record mutation "scripts/mutate.sh $mutants $seed" scripts/mutate.sh "$mutants" "$seed"
     ;;
   esac
