@@ -60,6 +60,7 @@ TEST_F(Reporter, WritesLinesWhereItIsToldAndNeverCallsTheHookFromWithin) {
   testing::internal::CaptureStdout();
   WriteStdout("a\n%s"), WriteStdout(nullptr);
 #if defined(_WIN32)
+  EXPECT_EQ(_lseek(1, 0, SEEK_CUR), 4) << "the bytes as they are";
   EXPECT_EQ(_setmode(1, _O_TEXT), _O_TEXT) << "as it was";
 #endif
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "a\n%s");
