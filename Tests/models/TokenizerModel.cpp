@@ -60,7 +60,10 @@ size_t TokenizerModel(Input& input) {
     const std::optional<std::string> token = model.Next(keepEmpty);
     CHECK(real.NextToken(keepEmpty) == token.has_value());
     CHECK(real.FoundDelimiter() == model.found && real.LastDelimiter() == model.last);
-    if (!token) return steps;
+    if (!token) {
+      CHECK(!real.NextToken(true));
+      return steps;
+    }
     CHECK(Bytes(real.Token()) == *token);
   }
 }
