@@ -109,6 +109,16 @@ TEST_F(Containers, HashTableHashesEveryByteAndLivesWithoutMemory) {
   EXPECT_EQ(none.Insert("key", 1) + none.Find("key") + none.Remove("key"), 0u);
 }
 
+TEST_F(Containers, AnElementLeavesItsSlotBeforeItIsDeleted) {
+  struct Looking : Element {
+    const FIFO<Element>& fifo;
+    explicit Looking(const FIFO<Element>& history) : fifo(history) {}
+    ~Looking() override { EXPECT_EQ(fifo.At(0), nullptr); }
+  };
+  FIFO<Element> fifo(1);
+  fifo.Push(new Looking(fifo)), fifo.RemoveAt(0);
+}
+
 // Nobody may, but it costs no more than the elements that are not deleted.
 TEST_F(Containers, HashTableBearsElementsThatClearAnother) {
   static std::set<Element*> alive;
