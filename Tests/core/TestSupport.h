@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What the Core library's tests share: allocations that fail on request, recorded reports, and
-// random operations, repeatable by the environment variable CORE_TEST_SEED.
+// What the Core library's tests share besides what the models have: recorded reports, and random
+// operations, repeatable by the environment variable CORE_TEST_SEED.
 #pragma once
 
 #include <gtest/gtest.h>
