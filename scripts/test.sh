@@ -4,7 +4,7 @@
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
-PACKAGES+=(python3 python3-clang-19)
+PACKAGES+=(python3)
 prepare
 say "-- testing"
 cd "$ROOT"

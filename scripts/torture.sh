@@ -3,20 +3,19 @@
 # The whole length of what ctest does for seconds, and prints its figures:
 #
 #   scripts/torture.sh [memory | values | files | profile | hosts | faults | soak | recordings |
-#                       fuzz | undefined | tidy | mutation]...
+#                       fuzz | undefined | tidy]...
 #
 # Without arguments all of them, which takes one to two hours on an idle machine. The figures go to
 # Docs/reliability.md as well, each under the command that made it. SCRIPTRUBY_TORTURE_SEED, or in
 # the section profile CORE_TEST_SEED, repeats a random test by the seed that it printed; FUZZ_SECONDS
-# is the time for each fuzz target (60), MUTANTS and MUTANT_SEED are how many mutants are tested (205)
-# and which (2035).
+# is the time for each fuzz target (60).
 #
 # Sets the machine up and builds first when needed.
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 REPORT=$ROOT/Docs/reliability.md
-ALL=(memory values files profile hosts faults soak recordings fuzz undefined tidy mutation)
+ALL=(memory values files profile hosts faults soak recordings fuzz undefined tidy)
 failed=0
 
 # Puts the standard input in place of the section's block of figures.
@@ -105,10 +104,6 @@ run() {
   fuzz) record fuzz "FUZZ_SECONDS=${FUZZ_SECONDS:-60} scripts/torture.sh fuzz" fuzz ;;
   undefined) record undefined "scripts/torture.sh undefined" undefined ;;
   tidy) record tidy "scripts/torture.sh tidy" tidy ;;
-  mutation)
-    local mutants=${MUTANTS:-205} seed=${MUTANT_SEED:-2035}
-    record mutation "scripts/mutate.sh $mutants $seed" scripts/mutate.sh "$mutants" "$seed"
-    ;;
   esac
 }
 
