@@ -2,7 +2,7 @@
 #include <stdlib.h>
 
 #include "Interpreter.h"
-#include "Values.h"
+#include "VariantConversion.h"
 // Last: they rename what the headers above use.
 #include "ComObject.h"
 #include "RubyCall.h"
@@ -265,7 +265,7 @@ VALUE InvokeWith(const Wrapped& wrapped, VALUE name, DISPID id, WORD flags, int 
   if (rb_block_given_p()) rb_raise(rb_eArgError, "a call of a COM object takes no block");
   VALUE buffer = Qnil;
   VALUE* const passable = ALLOCV_N(VALUE, buffer, count + 1);
-  for (int i = 0; i < count; ++i) passable[i] = Passable(arguments[i], wrapped.form);
+  for (int i = 0; i < count; ++i) passable[i] = ToVariantValue(arguments[i], wrapped.form);
   if (wrapped.form == TextForm::kBytes) CheckPlaces(passable, count);
   CheckCallable(wrapped);  // conversions may have run anything
   const VALUE result = Invoke(wrapped, name, id, flags, count, passable);

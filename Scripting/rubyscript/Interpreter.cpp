@@ -3,10 +3,11 @@
 
 #include <signal.h>
 
-#include "FrameWatch.h"
-#include "HostProcess.h"
+#include "FaultHandler.h"
 #include "Interrupter.h"
+#include "ProcessStateSnapshot.h"
 #include "RubyRuntime.h"
+#include "UnwindHandler.h"
 
 namespace {
 
@@ -19,7 +20,7 @@ struct Entry {
   bool interrupted = false;
   bool interruptible = false;
   bool leaving = false;  // its Ruby code is being unwound
-  HostProcess process = {};
+  ProcessStateSnapshot process = {};
 };
 
 // What the side that switches tells the other one.
@@ -44,7 +45,7 @@ struct State {
   Entry* innermost = nullptr;
   unsigned tasks = 0;  // so far
   EXCEPTION_RECORD fault = {};
-  FaultBase* faultBase = nullptr;
+  FaultHandler* faultHandler = nullptr;
   // Guards `innermost` and its chain, for Interrupt; changed by the interpreter's thread alone.
   SRWLOCK lock = SRWLOCK_INIT;
 };
@@ -67,9 +68,9 @@ void SetFloatControl(const FloatControl& control) {
 
 void SwitchToHost(Message message) {
   state.message = message;
-  state.faultBase->SetActive(false);
+  state.faultHandler->SetActive(false);
   SwitchToFiber(state.hostFiber);
-  state.faultBase->SetActive(true);
+  state.faultHandler->SetActive(true);
   SetFloatControl(kRubyFloatControl);
 }
 
@@ -116,14 +117,14 @@ bool IsFaultOfRubyThread(const EXCEPTION_RECORD& fault) {
 
 // It loses the interpreter as one on the main thread does, as soon as that has come to the task's end.
 [[noreturn]] void EndFaultyThread() {
-  state.fault = state.faultBase->ThreadFault();
+  state.fault = state.faultHandler->ThreadFault();
   Interrupter::StopMainThread();
   EndRubyThread();
 }
 
 void CALLBACK RunFiber(void*) {
-  FaultBase base(state.fault, Land, IsFaultOfRubyThread, EndFaultyThread);
-  state.faultBase = &base;
+  FaultHandler handler(state.fault, Land, IsFaultOfRubyThread, EndFaultyThread);
+  state.faultHandler = &handler;
   SetFloatControl(kRubyFloatControl);
   state.started = StartRuby();
   Serve(Message::kFinished);
@@ -145,12 +146,12 @@ void Abandon(Entry* entry) {
   entry->abandoned = true;
   Interrupter::Wake();             // in case its `ensure` blocks do not end by themselves
   SwitchToRuby(Message::kResume);  // ends the task: it can make no further call
-  if (!Interpreter::LostTo()) delete task;
+  if (!Interpreter::FatalExceptionCode()) delete task;
 }
 
 // Inner frames are older victims of the same jump.
 void AbandonUpTo(Entry* last) {
-  while (state.innermost && !Interpreter::LostTo()) {
+  while (state.innermost && !Interpreter::FatalExceptionCode()) {
     Entry* const entry = state.innermost;
     Abandon(entry);
     if (entry == last) break;
@@ -191,10 +192,10 @@ void RestoreHost() {
 
 bool Interpreter::HasStarted() { return state.rubyFiber != nullptr; }
 
-DWORD Interpreter::LostTo() { return state.fault.ExceptionCode; }
+DWORD Interpreter::FatalExceptionCode() { return state.fault.ExceptionCode; }
 
 HRESULT Interpreter::Start() {
-  if (LostTo()) return E_ABORT;
+  if (FatalExceptionCode()) return E_ABORT;
   const LONG caller = static_cast<LONG>(GetCurrentThreadId());
   const LONG owner = InterlockedCompareExchange(&state.thread, caller, 0);
   if (owner != 0 && owner != caller) return RPC_E_WRONG_THREAD;
@@ -205,25 +206,25 @@ HRESULT Interpreter::Start() {
   const HRESULT result = CreateRubyFiber();
   if (FAILED(result)) return result;
   SwitchToRuby(Message::kStart);
-  if (LostTo()) RaiseFault();
+  if (FatalExceptionCode()) RaiseFault();
   return state.started ? S_OK : E_FAIL;
 }
 
 HRESULT Interpreter::Enter(RubyTask* task) {
-  if (LostTo()) return E_ABORT;
+  if (FatalExceptionCode()) return E_ABORT;
   state.task = task;
   SwitchToRuby(Message::kBegin);
   for (;;) {
-    if (LostTo()) RaiseFault();
+    if (FatalExceptionCode()) RaiseFault();
     if (state.message == Message::kFinished) return S_OK;
     Entry* const entry = state.innermost;
     {
-      FrameWatch watch(OnFrameDiscarded, entry);
+      UnwindHandler unwindHandler(OnFrameDiscarded, entry);
       state.call->Run();
     }
     // A run that was nested into the call may have lost the interpreter; or a host with fibers of
     // its own has left one there that is not done, and only the innermost can go on.
-    if (LostTo() || state.innermost != entry) return E_ABORT;
+    if (FatalExceptionCode() || state.innermost != entry) return E_ABORT;
     SwitchToRuby(Message::kResume);
   }
 }

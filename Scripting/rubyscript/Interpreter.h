@@ -10,7 +10,7 @@
 //     returns  -------------------------------->    goes on
 //   returns  <----------------------------------  is done
 //
-// Around each task the host's process state is put back (see HostProcess.h). When the host discards
+// Around each task the host's process state is put back (see ProcessStateSnapshot.h). When the host discards
 // the frame of a call, the pending CallHost answers false, the task unwinds its Ruby code (`ensure`
 // blocks run, but no further call is made) and is deleted.
 //
@@ -58,7 +58,7 @@ class Interpreter {
   // caller's frame is discarded, the task is deleted.
   static HRESULT Enter(RubyTask* task);
   // Any thread. The exception code that lost the interpreter; 0 while it is whole.
-  static DWORD LostTo();
+  static DWORD FatalExceptionCode();
   // Any thread. Ends what runs for the owner, and what is nested into it: within a tenth of a second
   // when it is in Ruby code, at the call's return when it is in a call of the host.
   static void Interrupt(const void* owner);

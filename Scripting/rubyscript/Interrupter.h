@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // Ends Ruby code that calls nothing: an endless loop, a long sleep, a long match. A second Ruby thread
 // waits outside of the interpreter's lock for Wake; then it raises `ActiveScript::Stop` on the main
-// thread, which no `rescue` takes (see prelude/guest.rb). `ensure` blocks get a grace of half a
+// thread, which no `rescue` takes (see prelude/process_guards.rb). `ensure` blocks get a grace of half a
 // second; code that goes on after it is left wherever it is.
 #pragma once
 

@@ -8,9 +8,9 @@
 // Last: they rename what the headers above use.
 #include "ComObject.h"
 #include "RubyCall.h"
-#include "Values.h"
+#include "VariantConversion.h"
 
-static_assert(sizeof(VALUE) == sizeof(unsigned long) && Qfalse == 0, "RubyHalf holds a value");
+static_assert(sizeof(VALUE) == sizeof(unsigned long) && Qfalse == 0, "EngineState holds a value");
 
 MacroTask::~MacroTask() {
   SysFreeString(text);
@@ -28,35 +28,36 @@ static VALUE StringOf(BSTR text, TextForm form) {
 VALUE MacroTask::PrepareBody(VALUE data) {
   MacroTask& task = From(data);
   Interrupter::EnsureAlive();
-  if (!task.half.context) {
-    const VALUE isByteHost = task.half.form == TextForm::kBytes ? Qtrue : Qfalse;
+  if (!task.engineState.context) {
+    const VALUE isByteHost = task.engineState.form == TextForm::kBytes ? Qtrue : Qfalse;
     const volatile VALUE context =  // collecting finds it on the stack
         rb_funcall(ActiveScriptConst("Context"), rb_intern("new"), 1, isByteHost);
-    task.half.context = context;
-    rb_gc_register_address(&task.half.context);
+    task.engineState.context = context;
+    rb_gc_register_address(&task.engineState.context);
   }
   for (NamedItem* item = task.items; item; item = item->next) {
     if (!item->dispatch) continue;
     const VALUE name = StringOf(item->name, TextForm::kUtf16);
-    const VALUE object = NewComObject(item->dispatch, task.half.form, name);
+    const VALUE object = NewComObject(item->dispatch, task.engineState.form, name);
     item->dispatch = nullptr;
-    rb_funcall(task.half.context, rb_intern("add_item"), 2, name, object);
+    rb_funcall(task.engineState.context, rb_intern("add_item"), 2, name, object);
   }
-  return rb_funcall(task.half.context, rb_intern("enter"), 0);
+  return rb_funcall(task.engineState.context, rb_intern("enter"), 0);
 }
 
 VALUE MacroTask::Compile() {
   // A unit that is no byte shows that this text is not an 8-bit host's.
-  const TextForm form = HoldsBytes(text, SysStringLen(text)) ? half.form : TextForm::kUtf16;
-  return rb_funcall(half.context, rb_intern("compile"), 4, StringOf(text, form),
+  const TextForm form = HoldsBytes(text, SysStringLen(text)) ? engineState.form : TextForm::kUtf16;
+  return rb_funcall(engineState.context, rb_intern("compile"), 4, StringOf(text, form),
                     ULONG2NUM(firstLine + 1), ULONG2NUM(cookie), persistent ? Qtrue : Qfalse);
 }
 
 VALUE MacroTask::CallFunction() {
   const VALUE list = rb_ary_new();
   for (UINT i = arguments->cArgs; i-- > 0;)
-    rb_ary_push(list, FromVariant(arguments->rgvarg[i], half.form));
-  return rb_funcall(half.context, rb_intern("call"), 2, StringOf(text, TextForm::kUtf16), list);
+    rb_ary_push(list, FromVariant(arguments->rgvarg[i], engineState.form));
+  return rb_funcall(engineState.context, rb_intern("call"), 2, StringOf(text, TextForm::kUtf16),
+                    list);
 }
 
 VALUE MacroTask::WorkBody(VALUE data) {
@@ -65,13 +66,13 @@ VALUE MacroTask::WorkBody(VALUE data) {
     case Kind::kCompile:
       return task.Compile();
     case Kind::kRun: {
-      const VALUE value = rb_funcall(task.half.context, rb_intern("run"), 0);
-      return task.wantsValue ? Passable(value, task.half.form) : Qnil;
+      const VALUE value = rb_funcall(task.engineState.context, rb_intern("run"), 0);
+      return task.wantsValue ? ToVariantValue(value, task.engineState.form) : Qnil;
     }
     case Kind::kCall:
-      return Passable(task.CallFunction(), task.half.form);
+      return ToVariantValue(task.CallFunction(), task.engineState.form);
     case Kind::kDefines:
-      return rb_funcall(task.half.context, rb_intern("defines?"), 1,
+      return rb_funcall(task.engineState.context, rb_intern("defines?"), 1,
                         StringOf(task.text, TextForm::kUtf16));
     case Kind::kDiscard:
       break;
@@ -80,16 +81,17 @@ VALUE MacroTask::WorkBody(VALUE data) {
 }
 
 VALUE MacroTask::LeaveBody(VALUE data) {
-  return rb_funcall(From(data).half.context, rb_intern("leave"), 0);
+  return rb_funcall(From(data).engineState.context, rb_intern("leave"), 0);
 }
 
 VALUE MacroTask::DiscardBody(VALUE data) {
-  RubyHalf& half = From(data).half;
-  rb_funcall(half.context, rb_intern("close"), 0);
-  half.context = From(data).persistent ? rb_funcall(half.context, rb_intern("successor"), 0) : Qnil;
-  if (NIL_P(half.context)) {
-    rb_gc_unregister_address(&half.context);
-    half.context = 0;
+  EngineState& engineState = From(data).engineState;
+  rb_funcall(engineState.context, rb_intern("close"), 0);
+  engineState.context =
+      From(data).persistent ? rb_funcall(engineState.context, rb_intern("successor"), 0) : Qnil;
+  if (NIL_P(engineState.context)) {
+    rb_gc_unregister_address(&engineState.context);
+    engineState.context = 0;
   }
   return Qnil;
 }
@@ -100,7 +102,7 @@ void MacroTask::SetValue(VALUE passable) {
   } else if (kind == Kind::kCompile) {
     result = S_OK;
   } else {
-    result = FillVariant(passable, half.form, value) ? S_OK : E_OUTOFMEMORY;
+    result = FillVariant(passable, engineState.form, value) ? S_OK : E_OUTOFMEMORY;
   }
 }
 
@@ -140,8 +142,8 @@ VALUE MacroTask::DescribeBody(VALUE data) {
 
 // Asks the exception, which may run the macro's own code: Ruby's exceptions have methods.
 void MacroTask::SetError(VALUE exception, BSTR hostText) {
-  Description description = {half.context, exception, hostText, half.form, nullptr, 0, 0,
-                             nullptr,      0};
+  Description description = {
+      engineState.context, exception, hostText, engineState.form, nullptr, 0, 0, nullptr, 0};
   VALUE ignored;
   if (Protect(DescribeBody, reinterpret_cast<VALUE>(&description), ignored) == Outcome::kLeft) {
     result = E_ABORT;
@@ -158,7 +160,7 @@ void MacroTask::SetError(VALUE exception, BSTR hostText) {
 // exception, which knows where.
 void MacroTask::TellInterruption(VALUE exception) {
   const BSTR hostText = static_cast<BSTR>(
-      InterlockedExchangePointer(reinterpret_cast<void**>(&half.interruption), nullptr));
+      InterlockedExchangePointer(reinterpret_cast<void**>(&engineState.interruption), nullptr));
   if (hostText && RTEST(rb_obj_is_kind_of(exception, StopClass()))) SetError(exception, hostText);
   SysFreeString(hostText);
 }
@@ -185,7 +187,7 @@ void MacroTask::Run() {
   VALUE ignored;
   const VALUE self = reinterpret_cast<VALUE>(this);
   if (kind == Kind::kDiscard) {
-    if (half.context) Protect(DiscardBody, self, ignored);
+    if (engineState.context) Protect(DiscardBody, self, ignored);
     result = S_OK;
     return;
   }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // What a script engine has done in the interpreter: compile a text, run what is compiled, call a
 // macro's function. Around each one the engine's context is entered and left (prelude/context.rb),
-// and the host's process state is put back (see HostProcess.h).
+// and the host's process state is put back (see ProcessStateSnapshot.h).
 //
 // Ownership: as RubyTask. What a task points to belongs to the engine and outlives the task, which
 // may go on after the host has jumped away; what it holds itself goes with it.
@@ -25,9 +25,9 @@ struct NamedItem {
   NamedItem* next;
 };
 
-// The Ruby half of an engine.
-struct RubyHalf {
-  ~RubyHalf() { SysFreeString(interruption); }
+// What a script engine keeps between its tasks.
+struct EngineState {
+  ~EngineState() { SysFreeString(interruption); }
 
   unsigned long context = 0;  // a Ruby value, kept from collection; 0: none yet
   TextForm form = TextForm::kUtf16;
@@ -45,13 +45,13 @@ class MacroTask final : public RubyTask {
     kDiscard,  // the context; what was persistent is compiled for the next one
   };
 
-  MacroTask(const void* engine, Kind taskKind, RubyHalf& rubyHalf, NamedItem* const& namedItems)
-      : RubyTask(engine), kind(taskKind), half(rubyHalf), items(namedItems) {}
+  MacroTask(const void* engine, Kind taskKind, EngineState& state, NamedItem* const& namedItems)
+      : RubyTask(engine), kind(taskKind), engineState(state), items(namedItems) {}
   ~MacroTask() override;
   void Run() override;
 
   const Kind kind;
-  RubyHalf& half;
+  EngineState& engineState;
   NamedItem* const& items;  // the engine's list
   BSTR text = nullptr;      // owned
   ULONG firstLine = 0;      // of the text, from 0

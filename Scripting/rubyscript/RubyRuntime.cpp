@@ -3,12 +3,12 @@
 
 #include <io.h>
 
-#include "HostProcess.h"
 #include "Interpreter.h"
+#include "ProcessStateSnapshot.h"
 // Last: they rename what the headers above use.
 #include "ComObject.h"
 #include "RubyCall.h"
-#include "Values.h"
+#include "VariantConversion.h"
 
 namespace {
 
@@ -22,11 +22,11 @@ constexpr char kHostOutput[] = {
 constexpr char kContext[] = {
 #embed "prelude/context.rb"
 };
-constexpr char kGuest[] = {
-#embed "prelude/guest.rb"
+constexpr char kProcessGuards[] = {
+#embed "prelude/process_guards.rb"
 };
-constexpr char kWorld[] = {
-#embed "prelude/world.rb"
+constexpr char kGlobalsSnapshot[] = {
+#embed "prelude/globals_snapshot.rb"
 };
 
 struct PreludeFile {
@@ -39,14 +39,14 @@ struct PreludeFile {
 constexpr PreludeFile kPrelude[] = {
     {"rubyscript/host_objects.rb", kHostObjects, sizeof kHostObjects},
     {"rubyscript/host_output.rb", kHostOutput, sizeof kHostOutput},
-    {"rubyscript/guest.rb", kGuest, sizeof kGuest},
+    {"rubyscript/process_guards.rb", kProcessGuards, sizeof kProcessGuards},
     {"rubyscript/context.rb", kContext, sizeof kContext},
-    {"rubyscript/world.rb", kWorld, sizeof kWorld},
+    {"rubyscript/globals_snapshot.rb", kGlobalsSnapshot, sizeof kGlobalsSnapshot},
 };
 
 // The state at the start; keeps the variables that CRuby has added. No block of the heap: a start that
 // fails for want of one would be the last.
-[[clang::no_destroy]] constinit HostProcess startState;
+[[clang::no_destroy]] constinit ProcessStateSnapshot startState;
 
 VALUE SystemMessage(VALUE, VALUE code) {
   wchar_t text[512];

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // Starts CRuby inside a process that is not its own: without a command line, rubygems or the
-// environment's options, and with the host's process state as it was (see HostProcess.h). Defines
+// environment's options, and with the host's process state as it was (see ProcessStateSnapshot.h). Defines
 // the engine's module `ActiveScript`, native part and prelude/.
 //
 // Threading: Ruby side (see Interpreter.h) unless stated otherwise.

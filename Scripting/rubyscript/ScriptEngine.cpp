@@ -8,9 +8,9 @@
 #include <new>
 
 #include "ComObject.h"
-#include "FrameWatch.h"
 #include "ScriptDispatch.h"
 #include "Server.h"
+#include "UnwindHandler.h"
 
 // The 32-bit form of the parser's interface; libraries carry only the other one.
 static constexpr IID kActiveScriptParse = {
@@ -20,10 +20,10 @@ static constexpr IID kActiveScriptParse = {
 static constexpr wchar_t kByteHostItem[] = L"tarn";
 
 HRESULT CreateScriptEngine(REFIID riid, void** object) {
-  RubyHalf* const half = new (std::nothrow) RubyHalf;
-  ScriptEngine* const engine = half ? new (std::nothrow) ScriptEngine(half) : nullptr;
+  EngineState* const engineState = new (std::nothrow) EngineState;
+  ScriptEngine* const engine = engineState ? new (std::nothrow) ScriptEngine(engineState) : nullptr;
   if (!engine) {
-    delete half;
+    delete engineState;
     return E_OUTOFMEMORY;
   }
   const HRESULT result = engine->QueryInterface(riid, object);
@@ -31,10 +31,10 @@ HRESULT CreateScriptEngine(REFIID riid, void** object) {
   return result;
 }
 
-ScriptEngine::ScriptEngine(RubyHalf* rubyHalf) : half(rubyHalf) { AddServerReference(); }
+ScriptEngine::ScriptEngine(EngineState* newState) : engineState(newState) { AddServerReference(); }
 
 ScriptEngine::~ScriptEngine() {
-  if (!half->context) delete half;
+  if (!engineState->context) delete engineState;
   ReleaseServerReference();
 }
 
@@ -70,7 +70,8 @@ ULONG ScriptEngine::Release() {
 // go of them meanwhile, and gives both back when its frame is discarded.
 class ScriptEngine::Call {
  public:
-  explicit Call(ScriptEngine* called) : engine(called), site(called->site), watch(End, this) {
+  explicit Call(ScriptEngine* called)
+      : engine(called), site(called->site), unwindHandler(End, this) {
     engine->AddRef();
     if (site) site->AddRef();
     ++engine->calls;
@@ -90,7 +91,7 @@ class ScriptEngine::Call {
 
   ScriptEngine* const engine;
   IActiveScriptSite* const site;
-  FrameWatch watch;
+  UnwindHandler unwindHandler;
 };
 
 // --- Site and states -----------------------------------------------------------------------------
@@ -214,14 +215,14 @@ void ScriptEngine::FinishClose() {
 
 // Lets go of the context and of the items; what is persistent stays unless `all`.
 void ScriptEngine::Reset(bool all) {
-  if (half->context && Interpreter::Start() == S_OK) {
+  if (engineState->context && Interpreter::Start() == S_OK) {
     MacroTask* const task = NewTask(MacroTask::Kind::kDiscard, nullptr);
     if (task) {
       task->persistent = !all;
       if (Interpreter::Enter(task) == S_OK) delete task;
     }
   }
-  if (Interpreter::IsMainThread() && !Interpreter::LostTo()) {
+  if (Interpreter::IsMainThread() && !Interpreter::FatalExceptionCode()) {
     ReleaseObjectsOf(this);
     ReleaseCollectedObjects();
   }
@@ -309,7 +310,7 @@ HRESULT ScriptEngine::GetScriptDispatch(LPCOLESTR itemName, IDispatch** dispatch
 // --- Code ----------------------------------------------------------------------------------------
 
 MacroTask* ScriptEngine::NewTask(MacroTask::Kind kind, LPCOLESTR text) {
-  MacroTask* const task = new (std::nothrow) MacroTask(this, kind, *half, items);
+  MacroTask* const task = new (std::nothrow) MacroTask(this, kind, *engineState, items);
   if (!task || !text) return task;
   task->text = SysAllocString(text);
   if (task->text) return task;
@@ -327,7 +328,8 @@ HRESULT ScriptEngine::ParseScriptText(LPCOLESTR code, LPCOLESTR itemName, IUnkno
   if (itemName && *itemName && !FindItem(itemName)) return E_INVALIDARG;
   const Call call(this);
   if (!textFormKnown)
-    half->form = FindItem(kByteHostItem) && IsByteText(code) ? TextForm::kBytes : TextForm::kUtf16;
+    engineState->form =
+        FindItem(kByteHostItem) && IsByteText(code) ? TextForm::kBytes : TextForm::kUtf16;
   textFormKnown = true;
   MacroTask* const task = NewTask(MacroTask::Kind::kCompile, code);
   if (!task) return E_OUTOFMEMORY;
@@ -399,11 +401,11 @@ HRESULT ScriptEngine::Enter(MacroTask* task, EXCEPINFO* exception) {
   wchar_t text[256] = L"Ruby could not be started in this process.";
   if (started == RPC_E_WRONG_THREAD)
     swprintf(text, 256, L"Ruby macros run on the thread that ran the first one.");
-  if (Interpreter::LostTo())
+  if (Interpreter::FatalExceptionCode())
     swprintf(text, 256,
              L"Ruby was lost to a fault (exception 0x%08lX) in an earlier macro. Start the program "
              L"anew to run Ruby macros again.",
-             Interpreter::LostTo());
+             Interpreter::FatalExceptionCode());
   ScriptError* const error =
       new (std::nothrow) ScriptError(started, SysAllocString(text), 0, 0, nullptr, 0);
   return error ? Report(error, exception) : started;
@@ -449,9 +451,9 @@ HRESULT ScriptEngine::InterruptScriptThread(SCRIPTTHREADID id, const EXCEPINFO* 
   if (state == SCRIPTSTATE_CLOSED) return E_UNEXPECTED;
   if (!IsEngineThread(id, thread)) return E_INVALIDARG;
   if (exception && exception->bstrDescription && Interpreter::IsRunning(this))
-    SysFreeString(
-        static_cast<BSTR>(InterlockedExchangePointer(reinterpret_cast<void**>(&half->interruption),
-                                                     SysAllocString(exception->bstrDescription))));
+    SysFreeString(static_cast<BSTR>(
+        InterlockedExchangePointer(reinterpret_cast<void**>(&engineState->interruption),
+                                   SysAllocString(exception->bstrDescription))));
   Interpreter::Interrupt(this);
   return S_OK;
 }

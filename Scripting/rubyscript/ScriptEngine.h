@@ -29,7 +29,7 @@ HRESULT CreateScriptEngine(REFIID riid, void** object);
 
 class ScriptEngine final : public IActiveScript, public IActiveScriptParse, public IObjectSafety {
  public:
-  explicit ScriptEngine(RubyHalf* half);  // takes it over
+  explicit ScriptEngine(EngineState* newState);  // takes it over
   ScriptEngine(const ScriptEngine&) = delete;
   ScriptEngine& operator=(const ScriptEngine&) = delete;
 
@@ -99,5 +99,5 @@ class ScriptEngine final : public IActiveScript, public IActiveScriptParse, publ
   int calls = 0;         // of the host that are under way and may call it back
   bool closing = false;  // as soon as the last of them has ended
   NamedItem* items = nullptr;
-  RubyHalf* const half;  // outlives an engine that cannot enter the interpreter any more
+  EngineState* const engineState;  // outlives an engine that cannot enter the interpreter any more
 };

@@ -74,7 +74,8 @@ static bool NamesItsEncoding(const wchar_t* text) {
   for (int line = 0; line < 2 && *text; ++line) {
     const size_t length = wcscspn(text, L"\n");
     const wchar_t* const word = wcsstr(text, L"coding");
-    if (text[wcsspn(text, L" \t")] == '#' && word && word < text + length && (word[6] == ':' || word[6] == '='))
+    if (text[wcsspn(text, L" \t")] == '#' && word && word < text + length &&
+        (word[6] == ':' || word[6] == '='))
       return true;
     text += length + (text[length] == '\n');
   }

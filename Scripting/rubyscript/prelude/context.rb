@@ -29,12 +29,12 @@ module ActiveScript
       @left_open = []
       @output = HostOutput.new(self, STDOUT)
       @error_output = HostOutput.new(self, STDERR)
-      @world = World.new({ "$stdout": @output, "$stderr": @error_output })
+      @globals_snapshot = GlobalsSnapshot.new({ "$stdout": @output, "$stderr": @error_output })
     end
 
     def add_item(name, object)
       @items[name] = object
-      @world.main.instance_variable_set(:"@#{name}", object)
+      @globals_snapshot.main.instance_variable_set(:"@#{name}", object)
     end
 
     # The first item that has a function `message`; nil without one. An 8-bit host tells its user of
@@ -72,8 +72,8 @@ module ActiveScript
     def enter = Thread.handle_interrupt(Object => :never) { begin_part }
     def leave = Thread.handle_interrupt(Object => :never) { end_part }
 
-    def put_aside = @world.put_aside
-    def put_back = @world.put_back
+    def put_aside = @globals_snapshot.put_aside
+    def put_back = @globals_snapshot.put_back
 
     # Threads that are not the macro's to see.
     def foreign_threads = @threads - [Thread.main]
@@ -88,7 +88,7 @@ module ActiveScript
       value
     end
 
-    def call(name, arguments) = work { @world.main.__send__(name, *arguments) }
+    def call(name, arguments) = work { @globals_snapshot.main.__send__(name, *arguments) }
 
     # Files that the macro has left open would stay locked. Closing the pipe of a process would wait
     # for its end.
@@ -104,7 +104,7 @@ module ActiveScript
 
     # Whether the host may call the name: what the macro has defined at its top level.
     def defines?(name)
-      own = @world.main.method(name)
+      own = @globals_snapshot.main.method(name)
       own.source_location&.then { |path, _| @sources.key?(path) } || false
     rescue NameError
       false
@@ -141,7 +141,7 @@ module ActiveScript
       @fiber = Fiber.current
       @descriptor = ActiveScript.lowest_descriptor
       @files = outer ? open_files : []
-      @world.put_back
+      @globals_snapshot.put_back
     end
 
     def end_part

@@ -21,12 +21,12 @@
 
 #include <signal.h>
 
-class HostProcess {
+class ProcessStateSnapshot {
  public:
-  HostProcess() = default;
-  HostProcess(const HostProcess&) = delete;
-  HostProcess& operator=(const HostProcess&) = delete;
-  ~HostProcess();
+  ProcessStateSnapshot() = default;
+  ProcessStateSnapshot(const ProcessStateSnapshot&) = delete;
+  ProcessStateSnapshot& operator=(const ProcessStateSnapshot&) = delete;
+  ~ProcessStateSnapshot();
 
   // Replaces the snapshot by the present state.
   void Save();

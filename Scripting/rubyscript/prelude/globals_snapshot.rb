@@ -12,10 +12,10 @@ module ActiveScript
 
     def initialize
       @folder = File.dirname($LOAD_PATH.grep(%r{/ruby/\d[^/]*\z}).first)
-      @constants = Object.constants(false).to_h { |name| [name, World.constant(name)] }
-      @methods = World.method_names(Object).to_h { |name| [name, true] }
-      @settings = World.settings
-      @lists = World::LISTS.map(&:dup)
+      @constants = Object.constants(false).to_h { |name| [name, GlobalsSnapshot.constant(name)] }
+      @methods = GlobalsSnapshot.method_names(Object).to_h { |name| [name, true] }
+      @settings = GlobalsSnapshot.settings
+      @lists = GlobalsSnapshot::LISTS.map(&:dup)
       @features = $LOADED_FEATURES.to_h { |path| [path, true] }
       @locals = Thread.current.keys
       @globals = {}
@@ -34,7 +34,7 @@ module ActiveScript
     def library_constant?(location, value)
       return true if location.empty? || library?(location)
       return false unless Module === value
-      methods = World.method_names(value).map { |name| value.instance_method(name) } +
+      methods = GlobalsSnapshot.method_names(value).map { |name| value.instance_method(name) } +
                 value.singleton_methods(false).map { |name| value.method(name) }
       methods.any? { |method| method.source_location&.then { |place| library?(place) } }
     end
@@ -54,7 +54,7 @@ module ActiveScript
   # A macro's share of the top level: an object of its own and the methods, constants, variables and
   # settings that belong to Ruby as a whole. It is in place while the macro runs and put aside when it
   # does not.
-  class World
+  class GlobalsSnapshot
     LISTS = [ARGV, $LOAD_PATH].freeze
     FEATURES = $LOADED_FEATURES
 
@@ -106,14 +106,14 @@ module ActiveScript
     def put_aside
       GC.stress = false
       set_trace_func(nil)
-      @settings = World.settings.merge(gc_disabled: GC.enable)
+      @settings = GlobalsSnapshot.settings.merge(gc_disabled: GC.enable)
       $VERBOSE = nil # redefining is what follows
       take_constants
       take_methods
       take_globals
       take_lists
       take_locals
-      World.apply(baseline.settings)
+      GlobalsSnapshot.apply(baseline.settings)
       ActiveScript.top_self = MAIN
     end
 
@@ -130,17 +130,17 @@ module ActiveScript
       FEATURES.concat(@features)
       @locals.each { |name, value| Thread.current[name] = value }
       @thread_variables.each { |name, value| Thread.current.thread_variable_set(name, value) }
-      World.apply(@settings)
+      GlobalsSnapshot.apply(@settings)
     end
 
     private
 
-    def baseline = World.baseline
+    def baseline = GlobalsSnapshot.baseline
 
     def take_constants
       known = baseline.constants
       Object.constants(false).each do |name|
-        value = World.constant(name)
+        value = GlobalsSnapshot.constant(name)
         next restore_constant(name, value, known) if known.key?(name)
         path = Object.autoload?(name)
         next @autoloads[name] = path.tap { Object.__send__(:remove_const, name) } if path
@@ -159,7 +159,7 @@ module ActiveScript
     end
 
     def take_methods
-      @methods = World.method_names(Object).filter_map do |name|
+      @methods = GlobalsSnapshot.method_names(Object).filter_map do |name|
         next if baseline.methods.key?(name)
         method = Object.instance_method(name)
         location = method.source_location # an alias of a method in C has none
@@ -226,5 +226,5 @@ module ActiveScript
     end
   end
 
-  World.baseline = Baseline.new
+  GlobalsSnapshot.baseline = Baseline.new
 end

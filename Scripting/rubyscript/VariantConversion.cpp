@@ -2,7 +2,7 @@
 #include <string.h>
 
 #include "ComObject.h"
-#include "Values.h"
+#include "VariantConversion.h"
 // Last: they rename what the headers above use.
 #include <ruby/encoding.h>
 
@@ -17,7 +17,7 @@ constexpr long kMostBytesToByteHost = 512;
 
 constexpr int kMostNesting = 32;  // of arrays
 
-VALUE PassableInteger(VALUE value) {
+VALUE ToIntegerForVariant(VALUE value) {
   if (FIXNUM_P(value)) return value;
   if (rb_absint_size(value, nullptr) < sizeof(LONG_LONG)) {
     const LONG_LONG integer = NUM2LL(value);
@@ -39,7 +39,7 @@ void CheckByteHostText(VALUE text) {
     rb_raise(rb_eArgError, "text contains a null byte, which ends it for the editor");
 }
 
-VALUE PassableText(VALUE text, TextForm form) {
+VALUE ToTextForVariant(VALUE text, TextForm form) {
   const int encoding = rb_enc_get_index(text);
   const bool binary = encoding == rb_ascii8bit_encindex();
   if (encoding != rb_utf8_encindex() && encoding != rb_usascii_encindex() && !binary)
@@ -56,21 +56,21 @@ VALUE PassableText(VALUE text, TextForm form) {
   return text;
 }
 
-VALUE PassableValue(VALUE value, TextForm form, int nesting);
+VALUE ToValueForVariant(VALUE value, TextForm form, int nesting);
 
 // The bridge of an 8-bit host would make an empty text of an array.
-VALUE PassableArray(VALUE array, TextForm form, int nesting) {
+VALUE ToArrayForVariant(VALUE array, TextForm form, int nesting) {
   if (form == TextForm::kBytes)
     rb_raise(rb_eTypeError, "no Array can be passed to the editor; make a text of it, with join");
   if (nesting > kMostNesting)
     rb_raise(rb_eArgError, "array nested more than %d deep, or in itself", kMostNesting);
   const VALUE result = rb_ary_new_capa(RARRAY_LEN(array));
   for (long i = 0; i < RARRAY_LEN(array); ++i)
-    rb_ary_push(result, PassableValue(RARRAY_AREF(array, i), form, nesting + 1));
+    rb_ary_push(result, ToValueForVariant(RARRAY_AREF(array, i), form, nesting + 1));
   return result;
 }
 
-VALUE PassableObject(VALUE value, TextForm form, int nesting) {
+VALUE ToObjectForVariant(VALUE value, TextForm form, int nesting) {
   if (IsComObject(value)) {
     if (!DispatchOf(value)) rb_raise(rb_eArgError, "the COM object is gone: its engine is closed");
     return value;
@@ -78,14 +78,14 @@ VALUE PassableObject(VALUE value, TextForm form, int nesting) {
   const VALUE date = rb_funcall(ActiveScriptModule(), rb_intern("ole_date"), 1, value);
   if (!NIL_P(date)) return date;
   const VALUE text = rb_check_string_type(value);
-  if (!NIL_P(text)) return PassableText(text, form);
+  if (!NIL_P(text)) return ToTextForVariant(text, form);
   const VALUE array = rb_check_array_type(value);
-  if (!NIL_P(array)) return PassableArray(array, form, nesting);
+  if (!NIL_P(array)) return ToArrayForVariant(array, form, nesting);
   rb_raise(rb_eTypeError, "no %" PRIsVALUE " can be passed to a COM object; convert it first",
            rb_obj_class(value));
 }
 
-VALUE PassableValue(VALUE value, TextForm form, int nesting) {
+VALUE ToValueForVariant(VALUE value, TextForm form, int nesting) {
   switch (TYPE(value)) {
     case T_NIL:
     case T_TRUE:
@@ -94,15 +94,15 @@ VALUE PassableValue(VALUE value, TextForm form, int nesting) {
       return value;
     case T_FIXNUM:
     case T_BIGNUM:
-      return PassableInteger(value);
+      return ToIntegerForVariant(value);
     case T_STRING:
-      return PassableText(value, form);
+      return ToTextForVariant(value, form);
     case T_SYMBOL:
-      return PassableText(rb_sym2str(value), form);
+      return ToTextForVariant(rb_sym2str(value), form);
     case T_ARRAY:
-      return PassableArray(value, form, nesting);
+      return ToArrayForVariant(value, form, nesting);
     default:
-      return PassableObject(value, form, nesting);
+      return ToObjectForVariant(value, form, nesting);
   }
 }
 
@@ -123,7 +123,7 @@ bool FillArray(VALUE array, TextForm form, VARIANT& variant) {
 
 }  // namespace
 
-VALUE Passable(VALUE value, TextForm form) { return PassableValue(value, form, 0); }
+VALUE ToVariantValue(VALUE value, TextForm form) { return ToValueForVariant(value, form, 0); }
 
 bool FillVariant(VALUE passable, TextForm form, VARIANT& variant) {
   switch (TYPE(passable)) {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "HostProcess.h"
+#include "ProcessStateSnapshot.h"
 
 #include <fcntl.h>
 #include <io.h>
@@ -120,7 +120,7 @@ static bool IsSet(wchar_t* line) {
 
 // First what is to go, as the same name may come back in another case. A variable that only changes
 // its value is never missing: other threads of the host may look for it.
-void HostProcess::RestoreEnvironment() const {
+void ProcessStateSnapshot::RestoreEnvironment() const {
   wchar_t* const current = CopyEnvironment();
   if (!current) return;
   const size_t bytes = BlockBytes(environment);
@@ -138,7 +138,7 @@ void HostProcess::RestoreEnvironment() const {
 }
 
 // The block's own memory takes the remaining lines. Current directories of drives are no addition.
-void HostProcess::KeepAdditions() {
+void ProcessStateSnapshot::KeepAdditions() {
   if (!environment) return;
   free(additions);
   additions = CopyEnvironment();
@@ -154,14 +154,14 @@ void HostProcess::KeepAdditions() {
   *end = 0;
 }
 
-void HostProcess::ApplyAdditions() const {
+void ProcessStateSnapshot::ApplyAdditions() const {
   if (!additions) return;
   for (wchar_t* line = additions; *line; line = Next(line))
     if (!IsSet(line)) SetVariable(line);
 }
 
 // The system opens the directory anew, which takes longer than all the rest of a restoration.
-void HostProcess::RestoreDirectory() const {
+void ProcessStateSnapshot::RestoreDirectory() const {
   wchar_t* const current = CurrentDirectory();
   if (!current || wcscmp(current, directory) != 0) SetCurrentDirectoryW(directory);
   free(current);
@@ -169,7 +169,7 @@ void HostProcess::RestoreDirectory() const {
 
 // --- The whole -----------------------------------------------------------------------------------
 
-void HostProcess::Save() {
+void ProcessStateSnapshot::Save() {
   Forget();
   errorMode = GetErrorMode();
   fileMask = _umask(0);
@@ -183,7 +183,7 @@ void HostProcess::Save() {
   saved = true;
 }
 
-void HostProcess::Restore() const {
+void ProcessStateSnapshot::Restore() const {
   if (!saved) return;
   SetErrorMode(errorMode);
   _umask(fileMask);
@@ -196,7 +196,7 @@ void HostProcess::Restore() const {
   if (environment) RestoreEnvironment();
 }
 
-void HostProcess::Forget() {
+void ProcessStateSnapshot::Forget() {
   free(locale);
   free(directory);
   free(environment);
@@ -204,7 +204,7 @@ void HostProcess::Forget() {
   directory = environment = nullptr;
 }
 
-HostProcess::~HostProcess() {
+ProcessStateSnapshot::~ProcessStateSnapshot() {
   Forget();
   free(additions);
 }

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // The host's process-wide state through a run: everything that a script can change of it comes back.
-#include "../../Scripting/rubyscript/HostProcess.h"
+#include "../../Scripting/rubyscript/ProcessStateSnapshot.h"
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
@@ -85,14 +85,14 @@ static void SetScriptState() {
   SetState(L"C:\\", "C", SEM_NOOPENFILEERRORBOX, {ScriptHandler}, {_O_TEXT, _O_BINARY, _O_TEXT});
 }
 
-TEST(HostProcess, PutsTheStateBack) {
+TEST(ProcessStateSnapshot, PutsTheStateBack) {
   SetHostState();
   const Lines host = TakeState();
   SetScriptState();
   const Lines script = TakeState();
   for (size_t i = 0; i < host.size(); ++i) EXPECT_NE(host[i], script[i]);
 
-  HostProcess process;
+  ProcessStateSnapshot process;
   SetHostState(), process.Restore();  // without a snapshot
   EXPECT_EQ(TakeState(), host);
   SetHostState(), process.Save();
@@ -106,8 +106,8 @@ TEST(HostProcess, PutsTheStateBack) {
   EXPECT_EQ(TakeState(), script);
 }
 
-TEST(HostProcess, LeavesWhatIsMissing) {
-  HostProcess process;
+TEST(ProcessStateSnapshot, LeavesWhatIsMissing) {
+  ProcessStateSnapshot process;
   const int kept = _dup(0);
   for (const int mode : {_O_TEXT, _O_BINARY}) {
     _close(0), process.Save();
@@ -119,7 +119,7 @@ TEST(HostProcess, LeavesWhatIsMissing) {
   _dup2(kept, 0), _close(kept);
 }
 
-TEST(HostProcess, PutsTheEnvironmentBack) {
+TEST(ProcessStateSnapshot, PutsTheEnvironmentBack) {
   const std::wstring large(20000, 'v');
   for (const wchar_t* line : {L"HP_changed=host", L"HP_removed=host=1;=2", L"HP_direct=host",
                               L"HP_direct_removed=host", L"HP_Case=host", L"HP_kept=host"})
@@ -128,7 +128,7 @@ TEST(HostProcess, PutsTheEnvironmentBack) {
   SetDirect(L"HP_empty", L""), SetDirect(L"=Q:", L"Q:\\host"), SetDirect(L"=R:", L"R:\\host");
   const Lines host = EnvironmentLines();
 
-  HostProcess process;
+  ProcessStateSnapshot process;
   process.Save();
   EXPECT_EQ(EnvironmentLines(), host);
   for (int round = 0; round < 2; ++round) {
@@ -152,18 +152,18 @@ TEST(HostProcess, PutsTheEnvironmentBack) {
   }
 }
 
-TEST(HostProcess, WritesOnlyWhatChanged) {
+TEST(ProcessStateSnapshot, WritesOnlyWhatChanged) {
   CrtValue(L"HP_unknown");            // makes msvcrt's wide copy
   SetDirect(L"HP_unknown", L"host");  // msvcrt hears of it only when it sets another one
   ASSERT_EQ(CrtValue(L"HP_unknown"), L"(none)");
-  HostProcess process;
+  ProcessStateSnapshot process;
   process.Save(), process.Restore();
   SetDirect(L"=U:", L"U:\\script"), process.Restore();
   EXPECT_EQ(CrtValue(L"HP_unknown"), L"(none)");
 }
 
-TEST(HostProcess, ShowsAdditionsToScriptsOnly) {
-  HostProcess process;
+TEST(ProcessStateSnapshot, ShowsAdditionsToScriptsOnly) {
+  ProcessStateSnapshot process;
   process.KeepAdditions(), process.ApplyAdditions();  // nothing to compare with, nothing to set
   _wputenv(L"HP_own=host"), _wputenv(L"HP_gone=host");
   process.Save();

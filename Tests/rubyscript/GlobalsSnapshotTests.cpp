@@ -84,7 +84,7 @@ static std::string ProcessState() {
   return Hex(x87) + " " + Hex(sse & ~0x3F) + " " + folder + " " + setlocale(LC_ALL, nullptr);
 }
 
-// What else belongs to the process, HostProcess is tested for by itself.
+// What else belongs to the process, ProcessStateSnapshot is tested for by itself.
 TEST(World, LeavesTheProcessAlone) {
   constexpr unsigned short kX87 = 0x0A3F;  // 53 bits, upwards, all masked
   constexpr unsigned int kSse = 0x5F80;    // upwards
@@ -108,9 +108,8 @@ TEST(World, LeavesTheProcessAlone) {
       "@item.f [0.1 + 0.2, 1.0 / 3, 2.0 / 3, 1e16 + 1, Math.sqrt(2), '0.1'.to_f * 3].to_s\n";
   hostState();
   for (const char* ending : {"", "raise 'x'", "exit", "@item.stop"}) {
-    const std::string log =
-        host.Run(arithmetic + "@item.check\n" + arithmetic +
-                 "Dir.chdir('C:/'); require 'json'\n" + ending);
+    const std::string log = host.Run(arithmetic + "@item.check\n" + arithmetic +
+                                     "Dir.chdir('C:/'); require 'json'\n" + ending);
     asm volatile("fldcw %0" : : "m"(kX87));
     const std::string numbers =
         "item.f('[0.30000000000000004, 0.3333333333333333, 0.6666666666666666, 1.0e+16, "

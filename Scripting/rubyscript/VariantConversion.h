@@ -27,7 +27,7 @@
 
 // What FillVariant takes: the value itself or a simpler one. Raises TypeError, RangeError,
 // ArgumentError or EncodingError for what the host cannot get.
-VALUE Passable(VALUE value, TextForm form);
+VALUE ToVariantValue(VALUE value, TextForm form);
 
 // Sets an initialised variant to a passable value and never raises. False: no memory; the variant
 // is as before. The caller clears it.

@@ -19,13 +19,13 @@ module ActiveScript
   Thread.singleton_class.prepend(ThreadList)
 
   # A macro that is started inside a fiber of another one must not yield for it.
-  module GuestFiber
+  module FiberGuard
     def yield(*)
       return super unless ::Fiber.current.equal?(Context.current&.fiber)
       raise FiberError, "can't yield from root fiber"
     end
   end
-  Fiber.singleton_class.prepend(GuestFiber)
+  Fiber.singleton_class.prepend(FiberGuard)
 
   # The process's own streams stay open and where they are.
   [STDIN, STDOUT, STDERR].each do |stream|
@@ -37,7 +37,7 @@ module ActiveScript
   end
 
   # The process is the host's: what would end or replace it ends the macro at most.
-  module Guest
+  module ProcessGuards
     private
 
     def at_exit(&block)
@@ -57,17 +57,17 @@ module ActiveScript
       raise NotImplementedError, "exec would replace the host's process; use system or spawn"
     end
   end
-  Kernel.prepend(Guest)
+  Kernel.prepend(ProcessGuards)
 
   # As functions of a module they can be called from everywhere.
-  module GuestFunctions
-    include Guest
-    public(*Guest.private_instance_methods)
+  module PublicProcessGuards
+    include ProcessGuards
+    public(*ProcessGuards.private_instance_methods)
   end
-  Kernel.singleton_class.prepend(GuestFunctions)
-  Process.singleton_class.prepend(GuestFunctions)
+  Kernel.singleton_class.prepend(PublicProcessGuards)
+  Process.singleton_class.prepend(PublicProcessGuards)
 
-  module GuestProcess
+  module ProcessKillGuard
     def kill(signal, *processes)
       name = ::Integer === signal ? signal : signal.to_s.delete_prefix("SIG")
       asks = [0, "EXIT"].include?(name) # only whether the process is there
@@ -75,5 +75,5 @@ module ActiveScript
       raise SignalException, name
     end
   end
-  Process.singleton_class.prepend(GuestProcess)
+  Process.singleton_class.prepend(ProcessKillGuard)
 end
