@@ -6,6 +6,7 @@ source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 PACKAGES+=(python3)
 prepare
+"$ROOT/scripts/count-lines.sh" --check >&2
 say "-- testing"
 cd "$ROOT"
 exec ctest --preset release -j "$(nproc)" "$@"
