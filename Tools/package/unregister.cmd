@@ -1,9 +1,9 @@
 @echo off
 rem SPDX-License-Identifier: MIT
-rem Takes back what register.cmd has done.
+rem Undoes register.cmd.
 "%SystemRoot%\System32\regsvr32.exe" /s /u "%~dp0ruby\bin\rubyscript.dll"
 if errorlevel 1 (
   echo The Ruby engine could not be unregistered.
   exit /b 1
 )
-echo The Ruby engine is not registered any more.
+echo The Ruby engine is no longer registered.
