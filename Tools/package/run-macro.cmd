@@ -4,7 +4,7 @@ rem Runs a macro that is dropped on this file, with NAME.in beside it as input i
 rem Keeps the window open.
 setlocal
 if "%~1"=="" (
-  echo Drop a Ruby macro ^(a .rbs file^) on this file to run it and see its result.
+  echo Drop a Ruby macro, a .rbs file, on this file to run it and see its result.
   goto end
 )
 if not exist "%~f1" (
