@@ -81,7 +81,7 @@ undefined() {
 }
 
 tidy() {
-  local files=(Core/*/*.cpp Scripting/*/*.cpp Tools/*/*.cpp Tools/*/*/*.cpp)
+  local files=(Core/*/*.cpp Scripting/*/*.cpp Tools/*/*/*.cpp Tools/*/*/*/*.cpp)
   printf '%s\0' "${files[@]}" |
     xargs -0 -n 1 -P "$(nproc)" \
       clang-tidy-19 -p build/release --quiet --extra-arg=-Wno-unused-command-line-argument &&

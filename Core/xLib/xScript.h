@@ -8,7 +8,7 @@
 // a function is not an error here. Threading: the macro run's thread; only the reference count is
 // atomic.
 //
-// Next on the reader's path: back in the host (Tools/macrorun/HostLink.h).
+// Next on the reader's path: back in the host (Tools/macrorun/host/HostLink.h).
 #pragma once
 
 #include <oaidl.h>

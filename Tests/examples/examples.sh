@@ -2,7 +2,7 @@
 # SPDX-License-Identifier: MIT
 # examples.sh MACRORUN FOLDER: each macro in the folder makes of its text what it should, and none is
 # passed over.
-. "$(dirname "$0")/wine.sh"
+. "$(dirname "$0")/../wine.sh"
 report=$(mktemp)
 trap 'rm -f "$report"' EXIT
 wine "$1" --test "$2" 2> "$report"

@@ -1,7 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # registration.sh RUBYSCRIPT_DLL: what regsvr32 writes for the user, and that it takes only that back.
-. "$(dirname "$0")/../examples/wine.sh"
+. "$(dirname "$0")/../wine.sh"
 dll=Z:$(echo "$1" | tr / '\\')
 classes='HKCU\Software\Classes'
 class='{5C0B6E2C-4F0D-4B6B-9E0F-7B1C3A9D52E4}'

@@ -7,7 +7,7 @@
 # LIST has a program of the folder SAMPLES a line, relative to it. A program that prints nothing has
 # the word `silent` behind its name: then its value and its variables are shown.
 set -euo pipefail
-. "$(dirname "$0")/../examples/wine.sh"
+. "$(dirname "$0")/../wine.sh"
 run_sample=$1 engine=$2 samples=$3 list=$4
 ruby=$(dirname "$engine")/ruby.exe
 folder=$(mktemp -d)

@@ -1,0 +1,125 @@
+// SPDX-License-Identifier: MIT
+#include "cli/Batch.h"
+
+#include <algorithm>
+
+#include "host/Language.h"
+#include "host/MacroRun.h"
+#include "platform/Console.h"
+#include "platform/Encoding.h"
+#include "platform/Files.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+class Batch {
+ public:
+  Batch(const Options& runOptions, Reporter& runReporter)
+      : options(runOptions),
+        reporter(runReporter),
+        language(ChooseLanguage(options.language, options.run.macro)),
+        module(options.module, &language),
+        engines(language.engine),
+        surroundings{options.run, module, engines, reporter, profile} {}
+
+  ExitCode RunOne(const fs::path& input);
+  ExitCode RunEach();
+  void ShowProfile();
+  // What the user may have meant otherwise.
+  void ShowUnused(ExitCode outcome);
+
+ private:
+  std::string Read(const fs::path& input);
+  void Write(const fs::path& input, const std::string& bytes);
+  ExitCode RunGuarded(const fs::path& input);
+
+  const Options& options;
+  Reporter& reporter;
+  const Language language;
+  ScriptModule module;
+  EngineWatch engines;  // goes before the module, whose engines it may hold
+  CallProfile profile;
+  RunSurroundings surroundings;
+};
+
+// In bytes, unless somebody types it.
+std::string Batch::Read(const fs::path& input) {
+  if (input != "-" || !IsTerminal(stdin)) return ReadInput(input);
+  reporter.Note("type the text; Ctrl+Z (under Wine Ctrl+D) and Enter in a line of its own end it");
+  return ReadTerminalText();
+}
+
+ExitCode Batch::RunOne(const fs::path& input) {
+  if (options.inPlace) RequireReplaceable(input, true);
+  Editor editor(Document(Read(input)), input == "-" ? fs::path() : input);
+  if (const ExitCode code = RunMacro(surroundings, editor); code != kSuccess) return code;
+  Write(input, editor.First().Bytes());
+  return kSuccess;
+}
+
+void Batch::Write(const fs::path& input, const std::string& bytes) {
+  reporter.EndProgress();
+  if (options.inPlace)
+    ReplaceFileBytes(input, bytes);
+  else if (!options.output.empty())
+    ReplaceFileBytes(options.output, bytes);
+  else
+    WriteStandardOutput(bytes);
+}
+
+// A file that cannot be read or written keeps no other from its turn.
+ExitCode Batch::RunGuarded(const fs::path& input) try {
+  return RunOne(input);
+} catch (const UsageError& error) {
+  reporter.Error(PlainError("file", {}, error.what()));
+  return kWrongUsage;
+}
+
+ExitCode Batch::RunEach() {
+  ExitCode worst = kSuccess;
+  std::size_t done = 0, succeeded = 0;
+  for (const fs::path& input : options.inputs) {
+    reporter.Progress(++done, options.inputs.size(), ToUtf8(input));
+    const ExitCode code = RunGuarded(input);
+    succeeded += code == kSuccess;
+    if (code != kSuccess) reporter.Note(ToUtf8(input) + ": failed");
+    worst = std::max(worst, code);
+    if (code == kStopped || code == kFault) break;
+  }
+  std::string summary = std::to_string(succeeded) + " of " + std::to_string(options.inputs.size()) +
+                        " files done, " + std::to_string(done - succeeded) + " failed";
+  if (done < options.inputs.size())
+    summary += ", " + std::to_string(options.inputs.size() - done) + " not begun";
+  reporter.Note(summary);
+  return worst;
+}
+
+void Batch::ShowProfile() {
+  reporter.EndProgress();
+  if (options.run.profile) reporter.Profile(profile.Table());
+}
+
+void Batch::ShowUnused(ExitCode outcome) {
+  if (options.inputs.empty() && InputIsLeft())
+    reporter.Note(
+        "the macro began with an empty text; for the one of standard input name - behind it");
+  if (outcome != kSuccess) return;  // before it could ask
+  for (const auto& [name, value] : options.run.arguments)
+    if (!surroundings.argumentsRead.contains(name))
+      reporter.Note("--arg " + name + ": the macro has not asked for it");
+}
+
+}  // namespace
+
+ExitCode RunBatch(const Options& options, Reporter& reporter) {
+  RequireMacro(options.run.macro);
+  if (!options.output.empty()) RequireReplaceable(options.output, false);
+  Batch batch(options, reporter);
+  const ExitCode code =
+      options.each ? batch.RunEach()
+                   : batch.RunOne(options.inputs.empty() ? fs::path() : options.inputs.front());
+  batch.ShowProfile();
+  batch.ShowUnused(code);
+  return code;
+}

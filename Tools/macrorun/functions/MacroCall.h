@@ -1,0 +1,27 @@
+// SPDX-License-Identifier: MIT
+// One call of a macro function: its checked arguments, and what the function works on.
+#pragma once
+
+#include <cstddef>
+#include <span>
+
+#include "functions/ArgumentCheck.h"
+
+// A number that fits: no document is as long as a script's integers go.
+inline MacroResult Answer(std::size_t number) { return static_cast<std::int32_t>(number); }
+
+class MacroCall : public ArgumentCheck {
+ public:
+  // Checks the arguments. Throws WrongCall.
+  MacroCall(const MacroFunction& function, Editor& editor, EditorServices& services,
+            std::span<const HostArgument> arguments);
+
+  Editor& editor;
+  EditorServices& services;
+  Document& document() { return editor.Current(); }
+
+  // Of the arguments line and column.
+  Position At(std::size_t lineIndex) const;
+  // The line of an optional argument, by default the cursor's, which must be an existing one.
+  std::size_t LineOrCursor(std::size_t index);
+};

@@ -1,0 +1,125 @@
+// SPDX-License-Identifier: MIT
+#include "functions/MacroFunctions.h"
+
+#include <algorithm>
+#include <cctype>
+#include <cstring>
+#include <iterator>
+#include <numeric>
+
+#include "functions/MacroCall.h"
+#include "functions/groups/Families.h"
+#include "iLib/iComText.h"
+#include "platform/Encoding.h"
+
+namespace {
+
+std::vector<MacroFunction> AllFunctions() {
+  std::vector<MacroFunction> all;
+  for (const Family& family : {TextFamily(), LineFamily(), CursorFamily(), SelectionFamily(),
+                               DeletingFamily(), FindFamily(), CaseFamily(), MarkFamily(),
+                               ClipboardFamily(), UndoFamily(), DocumentFamily(), MacroFamily()})
+    for (MacroFunction function : family.functions) {
+      function.family = family.name;
+      all.push_back(std::move(function));
+    }
+  return all;
+}
+
+// Why a macro would not receive this text as it is; empty when it would.
+std::string Hindrance(const std::string& text, TextPassage passage) {
+  const std::size_t length = WideLength(text);
+  if (length >= kWideLimit)
+    return std::to_string(length) +
+           " characters, and a macro receives at most 1023; get_text gives pieces of it";
+  if (text.find('\0') != text.npos) return "a zero byte, which would end it";
+  if (passage == TextPassage::kBytes || LowBytesStay(text)) return {};
+  return "a byte from 0x80 to 0x9F, which the system's code page would change on its way to the "
+         "macro (in UTF-8, capital umlauts and dashes have one)";
+}
+
+// How many characters have to be changed, added or left out to make one text the other, which is in
+// small letters; case does not count.
+std::size_t EditDistance(std::string_view from, std::string_view to) {
+  std::vector<std::size_t> row(to.size() + 1);  // from the text so far to each beginning of `to`
+  std::iota(row.begin(), row.end(), std::size_t{0});
+  for (const char ch : from) {
+    const int small = std::tolower(static_cast<unsigned char>(ch));
+    std::size_t diagonal = row[0]++;
+    for (std::size_t i = 0; i < to.size(); ++i) {
+      const std::size_t replaced = diagonal + (small != to[i]);
+      diagonal = row[i + 1];
+      row[i + 1] = std::min({replaced, diagonal + 1, row[i] + 1});
+    }
+  }
+  return row.back();
+}
+
+void CheckResult(const MacroFunction& function, const MacroCall& call, const MacroResult& result,
+                 TextPassage passage) {
+  const std::string* text = std::get_if<std::string>(&result);
+  const std::string hindrance = text ? Hindrance(*text, passage) : "";
+  if (hindrance.empty()) return;
+  const bool line = call.Has(0) && function.parameters.front().kind == ParameterKind::kLine;
+  const std::string what = line ? "line " + std::to_string(call.Number(0)) : "the text";
+  throw WrongCall(function.name, 0, "a text that can pass to the macro",
+                  std::string(function.name) + ": " + what + " has " + hindrance);
+}
+
+}  // namespace
+
+std::span<const MacroFunction> MacroFunctions() {
+  static const std::vector<MacroFunction> functions = AllFunctions();
+  return functions;
+}
+
+std::uint32_t MacroFunctionId(std::string_view name) {
+  std::uint32_t id = 0;
+  for (const MacroFunction& function : MacroFunctions()) {
+    ++id;
+    if (name.size() == std::strlen(function.name) &&
+        _strnicmp(name.data(), function.name, name.size()) == 0)
+      return id;
+  }
+  return kUnknownId;
+}
+
+std::string NoMacroFunction(std::string_view name) {
+  const auto distance = [name](const MacroFunction& each) { return EditDistance(name, each.name); };
+  const MacroFunction& nearest = *std::ranges::min_element(MacroFunctions(), {}, distance);
+  const bool alike = distance(nearest) <= std::max<std::size_t>(1, name.size() / 4);
+  return std::string(name) + " is no macro function" +
+         (alike ? "; did you mean " + std::string(nearest.name) + "?" : "") + " (see --functions)";
+}
+
+MacroResult CallMacroFunction(std::uint32_t id, Editor& editor, EditorServices& services,
+                              std::span<const HostArgument> arguments, TextPassage passage) {
+  const std::span<const MacroFunction> functions = MacroFunctions();
+  if (id < 1 || id > functions.size())
+    throw WrongCall("", 0, "a macro function",
+                    "call of macro function " + std::to_string(id) + ", which does not exist");
+  const MacroFunction& function = functions[id - 1];
+  MacroCall call(function, editor, services, arguments);
+  const EditorStep step(editor);
+  MacroResult result = function.run(call);
+  CheckResult(function, call, result, passage);
+  return result;
+}
+
+std::string ParameterList(const MacroFunction& function) {
+  std::string list, brackets;
+  for (const MacroParameter& parameter : function.parameters) {
+    const bool texts = parameter.kind == ParameterKind::kTexts;
+    if (parameter.Optional()) brackets += "]";
+    list += (parameter.Optional() ? "[" : "") + std::string(list.empty() ? "" : ", ") +
+            parameter.name + (texts ? "..." : "");
+  }
+  return "(" + list + brackets + ")";
+}
+
+std::string WordList(const MacroParameter& parameter) {
+  std::string list;
+  for (const std::string_view word : parameter.words)
+    list += (list.empty() ? "" : ", ") + std::string(word);
+  return list;
+}

@@ -1,0 +1,85 @@
+// SPDX-License-Identifier: MIT
+// The text as a whole and in pieces. What passes in one call is limited (MacroFunctions.h), so long
+// texts are read by get_text with a count and written by set_text followed by append_text.
+#include <limits>
+
+#include "document/Characters.h"
+#include "functions/MacroCall.h"
+#include "functions/groups/Families.h"
+
+namespace {
+
+using Kind = ParameterKind;
+
+// Stops early: no more than what can pass is of use, but one character more shows that it is more.
+MacroResult GetText(MacroCall& call) {
+  const Document& document = call.document();
+  std::size_t left = call.Number(2, std::numeric_limits<std::size_t>::max());
+  Position from;
+  if (call.Has(0)) from = {call.Number(0), 0};
+  if (call.Has(1)) from = call.At(0);
+  std::string text;
+  for (Position at = from; left > 0 && at < document.TextEnd() && text.size() < 8192;) {
+    const Position end = document.EndOfLine(at.line);
+    const std::string_view rest = std::string_view(document.Line(at.line)).substr(at.offset);
+    const std::size_t length = OffsetOfCharacter(rest, left);
+    text += rest.substr(0, length);
+    left -= CharacterCount(rest.substr(0, length));
+    at.offset += length;
+    if (at != end || left == 0 || end == document.TextEnd()) break;
+    text += '\n';
+    --left;
+    at = {at.line + 1, 0};
+  }
+  return text;
+}
+
+MacroResult SetText(MacroCall& call) {
+  Document& document = call.document();
+  document.Replace({{{{}, document.End()}, call.Text(0)}});
+  document.MoveCursor({});
+  return 0;
+}
+
+constexpr ResultKind kNone = ResultKind::kNone, kNumber = ResultKind::kNumber;
+
+const std::vector<MacroFunction> kFunctions = {
+    {"write",
+     {{"text", Kind::kText}},
+     kNone,
+     "inserts text at the cursor, or for the selection, and moves the cursor behind it",
+     [](MacroCall& call) -> MacroResult {
+       call.document().Write(call.Text(0));
+       return 0;
+     }},
+    {"get_text",
+     {{"line", Kind::kLineOrEnd, "1"},
+      {"column", Kind::kColumn, "1"},
+      {"count", Kind::kCount, "all that follow"}},
+     ResultKind::kText,
+     "the text from a place on",
+     GetText},
+    {"set_text",
+     {{"text", Kind::kText}},
+     kNone,
+     "replaces the whole text; the cursor goes to its start",
+     SetText},
+    {"append_text",
+     {{"text", Kind::kText}},
+     kNone,
+     "adds text at the end",
+     [](MacroCall& call) -> MacroResult {
+       const Position end = call.document().TextEnd();
+       call.document().Replace({{{end, end}, call.Text(0)}});
+       return 0;
+     }},
+    {"text_length",
+     {},
+     kNumber,
+     "the number of characters; a line end is one",
+     [](MacroCall& call) { return Answer(CharacterCount(call.document().Flat().text)); }},
+};
+
+}  // namespace
+
+Family TextFamily() { return {"Text", kFunctions}; }

@@ -1,0 +1,64 @@
+// SPDX-License-Identifier: MIT
+#include "host/Language.h"
+
+#include <windows.h>
+
+#include <cwchar>
+#include <system_error>
+
+#include "platform/Encoding.h"
+#include "platform/ExitCode.h"
+#include "platform/Files.h"
+#include "platform/ProgramFile.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+// What the module keeps of a ProgID.
+constexpr std::size_t kLongestEngine = 18;
+
+std::string EngineOf(const fs::path& description) {
+  wchar_t name[kLongestEngine + 1];
+  GetPrivateProfileStringW(L"Options", L"Language", L"RubyScript", name,
+                           static_cast<DWORD>(std::size(name)), fs::absolute(description).c_str());
+  return WideToUtf8(name);
+}
+
+bool IsRuby(const fs::path& macro) { return _wcsicmp(macro.extension().c_str(), L".rbs") == 0; }
+
+// The description of the language that has the macro's extension; there may be none.
+fs::path DescriptionFor(const fs::path& macro) {
+  const std::wstring extension = macro.extension().wstring();
+  const std::wstring language = extension.empty() ? extension : extension.substr(1);
+  return ProgramFolder() / "languages" / (language + L".qwsh");
+}
+
+Language Described(const fs::path& description) { return {description, EngineOf(description)}; }
+
+}  // namespace
+
+Language ChooseLanguage(const LanguageOptions& options, const fs::path& macro) {
+  if (options.engine.size() > kLongestEngine)
+    throw UsageError("--engine " + options.engine + ": the module takes " +
+                     std::to_string(kLongestEngine) + " characters at most");
+  if (!options.engine.empty()) return {{}, options.engine};
+  if (!options.description.empty()) {
+    RequireReadable(options.description, "language description (--description)");
+    return Described(options.description);
+  }
+  if (IsRuby(macro)) return {{}, "RubyScript"};
+  const fs::path file = DescriptionFor(macro);
+  if (HasLanguage(macro)) return Described(file);
+  if (_wcsicmp(macro.extension().c_str(), L".rb") == 0)
+    throw UsageError(ToUtf8(macro) +
+                     ": the names of Ruby macros end in .rbs; rename it, or name the "
+                     "engine with --engine RubyScript");
+  throw UsageError("no language description for " + ToUtf8(macro) + " (" + ToUtf8(file) +
+                   "); name the engine with --engine, or a description with --description");
+}
+
+bool HasLanguage(const fs::path& macro) {
+  std::error_code error;
+  return IsRuby(macro) || fs::is_regular_file(DescriptionFor(macro), error);
+}

@@ -1,0 +1,89 @@
+// SPDX-License-Identifier: MIT
+#include "host/ModuleReports.h"
+
+#include <utility>
+
+#include "functions/MacroFunctions.h"
+#include "host/EngineWatch.h"
+#include "xLib/xTexts.h"
+
+namespace {
+
+constexpr std::string_view kUnknownFunction = "Call to unknown macro scripting function:  ";
+constexpr std::string_view kFollowUps[] = {"\nError parsing '", "\nError executing '"};
+
+bool IsFollowUp(std::string_view report) {
+  for (std::string_view beginning : kFollowUps)
+    if (report.starts_with(beginning)) return true;
+  return false;
+}
+
+}  // namespace
+
+void ModuleReports::Take(std::string_view report) noexcept {
+  if (report.starts_with(kFaultReport)) {
+    faulted = true;
+    Add(Plain("fault", report));
+  } else if (std::optional<ErrorReport> error = ParseScriptError(report, runs.back().macro)) {
+    error->columnInBytes = columnsInBytes;
+    if (error->message == kInterruption)
+      AddStop(std::move(*error));
+    else
+      TakeScriptError(std::move(*error));
+  } else if (report.starts_with(kUnknownFunction)) {
+    runs.back().unknownFunction = report.substr(kUnknownFunction.size());
+  } else if (IsFollowUp(report)) {
+    runs.back().followUp = report;
+  } else {
+    Add(Plain("engine", report));
+  }
+}
+
+void ModuleReports::TakeScriptError(ErrorReport error) {
+  Run& run = runs.back();
+  // A macro may have caught the error of the unknown name, and this is another one.
+  const std::string& unknown = run.unknownFunction;
+  const bool names = error.message.empty() || error.message.find(unknown) != std::string::npos;
+  if (!unknown.empty() && names) {
+    error.function = unknown;
+    error.message = NoMacroFunction(unknown);
+  }
+  run.unknownFunction.clear();
+  if (error.message.empty()) error.message = "script error";
+  run.errorSeen = true;
+  reporter.Error(std::move(error));
+}
+
+void ModuleReports::Add(ErrorReport error) {
+  Run& run = runs.back();
+  if (error.file.empty()) error.file = run.macro.shown;
+  run.errorSeen = true;
+  reporter.Error(std::move(error));
+}
+
+void ModuleReports::AddStop(ErrorReport place) {
+  if (stop.file.empty()) stop = std::move(place);
+}
+
+void ModuleReports::EndRun(bool stopped) {
+  Run& run = runs.back();
+  if (!run.followUp.empty() && !run.errorSeen && !stopped) Add(Plain("engine", run.followUp));
+}
+
+// The first line is the message.
+ErrorReport ModuleReports::Plain(const char* kind, std::string_view report) {
+  ErrorReport error;
+  error.kind = kind;
+  while (!report.empty()) {
+    const std::size_t end = report.find('\n');
+    std::string_view line = report.substr(0, end);
+    report.remove_prefix(end == report.npos ? report.size() : end + 1);
+    line = line.substr(0, line.find_last_not_of("\r ") + 1);
+    if (line.empty()) continue;
+    if (error.message.empty())
+      error.message = line;
+    else
+      error.details.emplace_back(line);
+  }
+  return error;
+}

@@ -1,0 +1,42 @@
+// SPDX-License-Identifier: MIT
+// The site of a script engine that only parses: it keeps the first error.
+//
+// Ownership: the caller's, which closes the engine first; references are not counted.
+// Errors: HRESULTs. Threading: the engine's thread.
+#pragma once
+
+#include <activscp.h>
+#include <windows.h>
+
+#include <optional>
+#include <string>
+
+#include "report/ErrorReport.h"
+
+class ParseSite final : public IActiveScriptSite {
+ public:
+  // `countsBytes`: whether the engine counts columns in bytes.
+  ParseSite(std::string macroName, bool countsBytes)
+      : macro(std::move(macroName)), columnsInBytes(countsBytes) {}
+
+  std::optional<ErrorReport> TakeError() { return std::move(error); }
+
+  STDMETHODIMP QueryInterface(REFIID riid, void** object) override;
+  STDMETHODIMP_(ULONG) AddRef() override { return 1; }
+  STDMETHODIMP_(ULONG) Release() override { return 1; }
+  STDMETHODIMP GetLCID(LCID*) override { return E_NOTIMPL; }
+  STDMETHODIMP GetItemInfo(LPCOLESTR, DWORD, IUnknown**, ITypeInfo**) override {
+    return TYPE_E_ELEMENTNOTFOUND;
+  }
+  STDMETHODIMP GetDocVersionString(BSTR*) override { return E_NOTIMPL; }
+  STDMETHODIMP OnScriptTerminate(const VARIANT*, const EXCEPINFO*) override { return S_OK; }
+  STDMETHODIMP OnStateChange(SCRIPTSTATE) override { return S_OK; }
+  STDMETHODIMP OnScriptError(IActiveScriptError* scriptError) override;
+  STDMETHODIMP OnEnterScript() override { return S_OK; }
+  STDMETHODIMP OnLeaveScript() override { return S_OK; }
+
+ private:
+  const std::string macro;
+  const bool columnsInBytes;
+  std::optional<ErrorReport> error;
+};

@@ -1,0 +1,162 @@
+// SPDX-License-Identifier: MIT
+#include "platform/Console.h"
+
+#include <fcntl.h>
+#include <io.h>
+#include <windows.h>
+
+#include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <memory>
+#include <thread>
+#include <utility>
+
+#include "platform/Encoding.h"
+#include "platform/ExitCode.h"
+
+namespace {
+
+HANDLE HandleOf(std::FILE* stream) {
+  return reinterpret_cast<HANDLE>(_get_osfhandle(_fileno(stream)));
+}
+
+bool ColourWanted() {
+  wchar_t value[2];
+  return GetEnvironmentVariableW(L"NO_COLOR", value, 2) == 0;
+}
+
+WORD Attributes(Colour colour, WORD plain) {
+  switch (colour) {
+    case Colour::kError:
+      return FOREGROUND_RED | FOREGROUND_INTENSITY;
+    case Colour::kHighlight:
+      return FOREGROUND_GREEN | FOREGROUND_INTENSITY;
+    case Colour::kFaint:
+      return FOREGROUND_GREEN | FOREGROUND_BLUE;
+    case Colour::kPlain:
+      break;
+  }
+  return plain;
+}
+
+// The system's own attributes and not escape sequences: every console takes them.
+void WriteTerminal(std::FILE* terminal, std::string_view text, Colour colour) {
+  const HANDLE console = HandleOf(terminal);
+  CONSOLE_SCREEN_BUFFER_INFO before = {};
+  const bool coloured =
+      colour != Colour::kPlain && ColourWanted() && GetConsoleScreenBufferInfo(console, &before);
+  if (coloured) SetConsoleTextAttribute(console, Attributes(colour, before.wAttributes));
+  const std::wstring wide = PathFromUtf8(text).wstring();
+  DWORD written = 0;
+  for (std::size_t from = 0; from < wide.size(); from += written) {
+    const DWORD length = static_cast<DWORD>(std::min<std::size_t>(wide.size() - from, 8192));
+    if (!WriteConsoleW(console, wide.data() + from, length, &written, nullptr) || !written) break;
+  }
+  if (coloured) SetConsoleTextAttribute(console, before.wAttributes);
+}
+
+// What ends the input at the start of a line: Windows's own and, since Wine drops that one, Unix's.
+constexpr wchar_t kControlZ = L'\x1A', kControlD = L'\x04';
+
+using Line = std::optional<std::string>;
+
+Line ReadLine() {
+  std::wstring line;
+  wchar_t block[256];
+  DWORD count = 0;
+  while (ReadConsoleW(HandleOf(stdin), block, 256, &count, nullptr) && count > 0) {
+    line.append(block, count);
+    if (line.back() != L'\n') continue;
+    line.erase(line.find_last_not_of(L"\r\n") + 1);
+    if (!line.empty() && (line.front() == kControlZ || line.front() == kControlD)) return {};
+    return WideToUtf8(line);
+  }
+  return {};
+}
+
+}  // namespace
+
+void PrepareStandardError() { _setmode(_fileno(stderr), _O_BINARY); }
+
+bool IsTerminal(std::FILE* stream) {
+  DWORD mode = 0;
+  return GetConsoleMode(HandleOf(stream), &mode);
+}
+
+bool InputIsLeft() {
+  const HANDLE input = HandleOf(stdin);
+  DWORD waiting = 0;
+  if (GetFileType(input) == FILE_TYPE_PIPE)
+    return PeekNamedPipe(input, nullptr, 0, nullptr, &waiting, nullptr)
+               ? waiting > 0
+               : GetLastError() == ERROR_NOT_SUPPORTED;
+  LARGE_INTEGER size, place;
+  return GetFileType(input) == FILE_TYPE_DISK && GetFileSizeEx(input, &size) &&
+         SetFilePointerEx(input, {}, &place, FILE_CURRENT) && place.QuadPart < size.QuadPart;
+}
+
+ErrorCapture::ErrorCapture() : file(-1), saved(-1) {
+  wchar_t folder[MAX_PATH], name[MAX_PATH];
+  if (!GetTempPathW(MAX_PATH, folder) || !GetTempFileNameW(folder, L"mac", 0, name)) return;
+  file = _wopen(name, _O_RDWR | _O_BINARY | _O_TEMPORARY);
+  if (file < 0) return;
+  saved = _dup(_fileno(stderr));
+  _dup2(file, _fileno(stderr));
+}
+
+std::string ErrorCapture::Take() {
+  std::string text;
+  if (file < 0) return text;
+  _dup2(saved, _fileno(stderr));
+  _close(saved);
+  _lseek(file, 0, SEEK_SET);
+  char block[4096];
+  for (int count; (count = _read(file, block, sizeof block)) > 0;)
+    text.append(block, static_cast<std::size_t>(count));
+  _close(file);  // deletes it
+  file = -1;
+  return text;
+}
+
+// A terminal is told in UTF-16: its code page is seldom that of the text.
+void WriteStandardOutput(std::string_view bytes) {
+  if (IsTerminal(stdout)) return WriteTerminal(stdout, bytes, Colour::kPlain);
+  _setmode(_fileno(stdout), _O_BINARY);
+  if (std::fwrite(bytes.data(), 1, bytes.size(), stdout) != bytes.size() || std::fflush(stdout))
+    throw UsageError("cannot write to standard output");
+}
+
+void WriteError(std::string_view text, Colour colour) {
+  if (IsTerminal(stderr)) {
+    WriteTerminal(stderr, text, colour);
+    return;
+  }
+  std::fwrite(text.data(), 1, text.size(), stderr);
+  std::fflush(stderr);
+}
+
+std::string ReadTerminalText() {
+  std::string text;
+  while (const Line line = ReadLine()) text += *line + "\n";
+  return text;
+}
+
+// By a thread of its own, since no call ends a read of the terminal everywhere: Ctrl+C does on Windows,
+// but not under Wine.
+std::optional<std::string> ReadTerminalLine(const std::function<bool()>& isGivenUp) {
+  struct Reading {
+    Line line;
+    std::atomic<bool> done = false;
+  };
+  const auto reading = std::make_shared<Reading>();  // with the thread it may outlive the call
+  std::thread([reading] {
+    reading->line = ReadLine();
+    reading->done = true;
+  }).detach();
+  while (!reading->done) {
+    if (isGivenUp()) return {};
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+  }
+  return reading->line;
+}
