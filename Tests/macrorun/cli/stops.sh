@@ -45,20 +45,20 @@ js|2|tarn.message("started"); while (true);
 MACROS
 
 # What has been stopped by force says so; its ensure blocks have run
-expect_rbs 3 'timed out' 'begin; sleep; ensure; File.write("ensured", "x"); end' --timeout 0.3
+expect_rbs 3 'timed out' 'begin; sleep; ensure; File.write("ensured", "x"); end' --timeout 2
 [ -e ensured ] || fail 'an interrupted macro has not run its ensure block'
 expect_js 3 'the program ends' 'while (true);' --timeout 0.3
 
 # It says where the macro was, as far as that can be known
 expect_js 3 'macro.js: timed out' 'while (true) tarn.line_count();' --timeout 0.3
-expect_rbs 3 '' "$(printf 'def f\n  sleep\nend\nf')" --timeout 1
+expect_rbs 3 '' "$(printf 'def f\n  sleep\nend\nf')" --timeout 2
 expect_lines err 'macro.rbs:2:3: timed out' '    sleep' '    ^' "$(printf "\tfrom macro.rbs:2:in \`sleep'")" \
   "$(printf "\tfrom macro.rbs:2:in \`f'")" "$(printf "\tfrom macro.rbs:4:in \`<main>'")"
-expect_rbs 3 '' "$(printf 'x = 1\nbegin\n  @tarn.line_count while true\nensure\n  x = 2\nend')" --timeout 1
+expect_rbs 3 '' "$(printf 'x = 1\nbegin\n  @tarn.line_count while true\nensure\n  x = 2\nend')" --timeout 2
 expect_lines err 'macro.rbs:3: timed out' '    @tarn.line_count while true'
-expect 3 '{"type":"error","kind":"stop","file":"macro.rbs","line":3,' --timeout 1 --errors=json macro.rbs
+expect 3 '{"type":"error","kind":"stop","file":"macro.rbs","line":3,' --timeout 2 --errors=json macro.rbs
 echo 'begin; sleep; ensure; sleep 0.2; File.write("ensured", "inner"); end' > inner.rbs
-expect_rbs 3 'inner.rbs:1:8: timed out' '@tarn.run_macro("inner.rbs"); @tarn.message("after")' --timeout 1
+expect_rbs 3 'inner.rbs:1:8: timed out' '@tarn.run_macro("inner.rbs"); @tarn.message("after")' --timeout 2
 grep -q inner ensured || fail 'the ensure block of an inner macro has not come to its end'
 ! grep -q after err || fail 'a macro goes on after the one that it ran was stopped'
 expect_rbs 0 '' '@tarn.line_count' --timeout 30
