@@ -41,7 +41,7 @@ std::string Do(Editor& editor, EditorServices& services, const Call& call) {
   for (const std::string& text : call.arguments)
     arguments.push_back({0, text.c_str(), 0, kTextArgument});
   const MacroResult result = CallMacroFunction(MacroFunctionId(call.function), editor, services,
-                                               arguments, TextPassage::kBytes);
+                                               arguments, ResultEncoding::kBytes);
   if (const auto* number = std::get_if<std::int32_t>(&result)) return std::to_string(*number);
   return std::get<std::string>(result);
 }

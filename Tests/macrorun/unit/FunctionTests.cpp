@@ -357,7 +357,7 @@ TEST(FunctionTest, ResultsThatCannotPass) {
   const HostArgument line = {0, "1", 0, kTextArgument};
   Editor umlaut(Document("\xc3\x84"));
   EXPECT_THROW(CallMacroFunction(MacroFunctionId("get_line"), umlaut, services, {&line, 1},
-                                 TextPassage::kCharacters),
+                                 ResultEncoding::kCharacters),
                WrongCall);
 }
 
@@ -366,7 +366,7 @@ TEST(FunctionTest, TheTable) {
   for (const MacroFunction& function : MacroFunctions()) {
     SCOPED_TRACE(function.name);
     EXPECT_TRUE(names.insert(function.name).second);
-    EXPECT_STRNE(function.family, "");
+    EXPECT_STRNE(function.group, "");
     bool optional = false;
     for (const MacroParameter& parameter : function.parameters) {
       EXPECT_TRUE(parameter.Optional() || !optional) << parameter.name;
@@ -378,7 +378,7 @@ TEST(FunctionTest, TheTable) {
   FakeServices services;
   Editor editor(FromPicture(""));
   for (const std::uint32_t id : {0u, kUnknownId})
-    EXPECT_THROW(CallMacroFunction(id, editor, services, {}, TextPassage::kBytes), WrongCall);
+    EXPECT_THROW(CallMacroFunction(id, editor, services, {}, ResultEncoding::kBytes), WrongCall);
 }
 
 }  // namespace

@@ -79,8 +79,8 @@ Call RandomCall(Random& random, const Document& document) {
   const std::span<const MacroFunction> functions = MacroFunctions();
   for (;;) {
     const MacroFunction& function = random.Of(functions);
-    const std::string family = function.family;
-    if (family == "Documents" || family == "Macro" || family == "Undo") continue;
+    const std::string group = function.group;
+    if (group == "Documents" || group == "Macro" || group == "Undo") continue;
     Call call = {function.name, {}};
     for (const MacroParameter& parameter : function.parameters) {
       if (parameter.Optional() && random.Below(2) == 0) break;

@@ -15,6 +15,7 @@
 
 #include "FunctionTable.h"
 #include "document/Characters.h"
+#include "host/EngineWatch.h"
 #include "host/MacroRun.h"
 #include "platform/ProgramFile.h"
 #include "recording/LanguageTemplates.h"
@@ -43,7 +44,7 @@ class RandomRecording {
  public:
   RandomRecording(std::uint32_t seed, const std::string& language)
       : engine(seed),
-        passage(language == "rbs" ? TextPassage::kBytes : TextPassage::kCharacters),
+        encoding(language == "rbs" ? ResultEncoding::kBytes : ResultEncoding::kCharacters),
         loneReturns(language != "vbs"),
         undoes(Below(2) == 0),
         start(Text(Below(8))),
@@ -57,7 +58,7 @@ class RandomRecording {
  private:
   // Those that the others are made with stand first.
   std::mt19937 engine;
-  const TextPassage passage;
+  const ResultEncoding encoding;
   const bool loneReturns;
   const bool undoes;  // what undo takes back is certain only where all adjacent text is one call
   FakeServices services;
@@ -127,7 +128,7 @@ class RandomRecording {
     const PassedArguments passed(arguments);
     EndTyping();
     try {
-      CallMacroFunction(MacroFunctionId(function), editor, services, passed.List(), passage);
+      CallMacroFunction(MacroFunctionId(function), editor, services, passed.List(), encoding);
       steps.push_back(step);
       ++calls;
     } catch (const WrongCall&) {
@@ -137,9 +138,9 @@ class RandomRecording {
 
   void CallAny() {
     const MacroFunction& function = Of(MacroFunctions());
-    const std::string name = function.name, family = function.family;
-    if (family == "Macro" || name == "open_document" || name == "save_document") return;
-    if (family == "Undo" && !undoes) return;
+    const std::string name = function.name, group = function.group;
+    if (group == "Macro" || name == "open_document" || name == "save_document") return;
+    if (group == "Undo" && !undoes) return;
     std::vector<StepArgument> arguments;
     json list = json::array();
     for (const MacroParameter& parameter : function.parameters) {
@@ -204,8 +205,8 @@ class Runner {
   }
   ExitCode Run(const std::string& macro, Editor& editor) {
     std::ofstream(options.macro, std::ios::binary) << macro;
-    RunSurroundings surroundings = {options, module, engines, reporter, profile};
-    return RunMacro(surroundings, editor);
+    RunContext context = {options, module, language, engines.Running(), reporter, profile};
+    return RunMacro(context, editor);
   }
 
  private:

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 
+#include "host/EngineWatch.h"
 #include "host/Language.h"
 #include "host/MacroRun.h"
 #include "platform/Console.h"
@@ -21,7 +22,7 @@ class Batch {
         language(ChooseLanguage(options.language, options.run.macro)),
         module(options.module, &language),
         engines(language.engine),
-        surroundings{options.run, module, engines, reporter, profile} {}
+        context{options.run, module, language, engines.Running(), reporter, profile} {}
 
   ExitCode RunOne(const fs::path& input);
   ExitCode RunEach();
@@ -40,7 +41,7 @@ class Batch {
   ScriptModule module;
   EngineWatch engines;  // goes before the module, whose engines it may hold
   CallProfile profile;
-  RunSurroundings surroundings;
+  RunContext context;
 };
 
 // In bytes, unless somebody types it.
@@ -53,7 +54,7 @@ std::string Batch::Read(const fs::path& input) {
 ExitCode Batch::RunOne(const fs::path& input) {
   if (options.inPlace) RequireReplaceable(input, true);
   Editor editor(Document(Read(input)), input == "-" ? fs::path() : input);
-  if (const ExitCode code = RunMacro(surroundings, editor); code != kSuccess) return code;
+  if (const ExitCode code = RunMacro(context, editor); code != kSuccess) return code;
   Write(input, editor.First().Bytes());
   return kSuccess;
 }
@@ -72,7 +73,7 @@ void Batch::Write(const fs::path& input, const std::string& bytes) {
 ExitCode Batch::RunGuarded(const fs::path& input) try {
   return RunOne(input);
 } catch (const UsageError& error) {
-  reporter.Error(PlainError("file", {}, error.what()));
+  reporter.Error(PlainDiagnostic("file", {}, error.what()));
   return kWrongUsage;
 }
 
@@ -106,7 +107,7 @@ void Batch::ShowUnused(ExitCode outcome) {
         "the macro began with an empty text; for the one of standard input name - behind it");
   if (outcome != kSuccess) return;  // before it could ask
   for (const auto& [name, value] : options.run.arguments)
-    if (!surroundings.argumentsRead.contains(name))
+    if (!context.argumentsRead.contains(name))
       reporter.Note("--arg " + name + ": the macro has not asked for it");
 }
 

@@ -6,6 +6,7 @@
 #include <memory>
 
 #include "cli/TestFolder.h"
+#include "host/EngineWatch.h"
 #include "host/Language.h"
 #include "host/MacroRun.h"
 #include "platform/Encoding.h"
@@ -35,9 +36,10 @@ bool Exists(const fs::path& path) {
 
 // What runs the macros of one language; one at a time.
 struct LanguageHost {
-  LanguageHost(const Options& options, const Language& language)
-      : module(options.module, &language), engines(language.engine) {}
+  LanguageHost(const Options& options, const Language& hostLanguage)
+      : language(hostLanguage), module(options.module, &language), engines(language.engine) {}
 
+  const Language language;
   ScriptModule module;
   EngineWatch engines;  // goes before the module, whose engines it may hold
 };
@@ -130,13 +132,15 @@ ExitCode MacroTests::RunGuarded(Test& test) try {
   options.run.macro = test.macro;
   const fs::path input = Exists(test.Input()) ? test.Input() : fs::path();
   Editor editor(Document(ReadInput(input)), input);
-  RunSurroundings surroundings{options.run, host->module, host->engines, reporter, profile};
-  const ExitCode code = RunMacro(surroundings, editor);
+  RequireMacro(test.macro);
+  RunContext context{options.run, host->module, host->language, host->engines.Running(),
+                     reporter,    profile};
+  const ExitCode code = RunMacro(context, editor);
   if (code != kSuccess) return code;
   test.made = editor.First().Bytes();
   return Judge(test);
 } catch (const UsageError& error) {
-  reporter.Error(PlainError("file", {}, error.what()));
+  reporter.Error(PlainDiagnostic("file", {}, error.what()));
   return kWrongUsage;
 }
 
@@ -156,7 +160,7 @@ void MacroTests::Compare(const Test& test, bool there, const std::string& text) 
   const std::string name = ToUtf8(test.Expected().filename());
   const std::string missing = "no " + name + (options.promote ? "" : "; --promote writes it");
   reporter.Error(
-      PlainError("test", test.macro, there ? "its text is not that of " + name : missing));
+      PlainDiagnostic("test", test.macro, there ? "its text is not that of " + name : missing));
   reporter.TestEnd(false, CompareTexts(name, text, ToUtf8(test.macro.filename()), test.made));
 }
 
@@ -181,7 +185,7 @@ void MacroTests::PromoteGroup(const Group& group) {
   }
   if (!agree)
     return reporter.Error(
-        PlainError("test", file, "not promoted, since its macros disagree: " + names));
+        PlainDiagnostic("test", file, "not promoted, since its macros disagree: " + names));
   const ExitCode code = Write(file, group.front()->made);
   for (Test* test : group) {
     if (test->state != State::kDiffers) continue;
@@ -196,7 +200,7 @@ ExitCode MacroTests::Write(const fs::path& file, const std::string& text) try {
   reporter.Note("promoted " + ToUtf8(file));
   return kSuccess;
 } catch (const UsageError& error) {
-  reporter.Error(PlainError("file", {}, error.what()));
+  reporter.Error(PlainDiagnostic("file", {}, error.what()));
   return kWrongUsage;
 }
 

@@ -13,8 +13,8 @@
 #include "host/EngineWatch.h"
 #include "host/Language.h"
 #include "host/ParseSite.h"
-#include "platform/Console.h"
 #include "platform/Encoding.h"
+#include "platform/ErrorCapture.h"
 #include "platform/Files.h"
 
 namespace fs = std::filesystem;
@@ -61,7 +61,7 @@ ExitCode Checker::Check(const fs::path& macro) try {
   }
   return Parse(macro, engine);
 } catch (const UsageError& error) {
-  reporter.Error(PlainError("file", {}, error.what()));
+  reporter.Error(PlainDiagnostic("file", {}, error.what()));
   return kWrongUsage;
 }
 
@@ -78,15 +78,16 @@ ExitCode Checker::Parse(const fs::path& macro, const std::string& engineName) {
     throw UsageError("cannot create the script engine " + engineName + ": " +
                      SystemMessage(static_cast<unsigned long>(result)));
   const Held<IActiveScript> engine(created);
-  ParseSite site(ToUtf8(macro), !engineName.ends_with("RubyScript"));
+  ParseSite site(ToUtf8(macro), !IsRubyEngine(engineName));
   ErrorCapture warnings;
   result = ParseWith(engine.get(), site, text);
   engine->Close();
   Tell(warnings.Take(), macro);
-  if (std::optional<ErrorReport> error = site.TakeError())
+  if (std::optional<Diagnostic> error = site.TakeError())
     reporter.Error(std::move(*error));
   else if (FAILED(result))
-    reporter.Error(PlainError("engine", macro, SystemMessage(static_cast<unsigned long>(result))));
+    reporter.Error(
+        PlainDiagnostic("engine", macro, SystemMessage(static_cast<unsigned long>(result))));
   return FAILED(result) ? kMacroFailed : kSuccess;
 }
 

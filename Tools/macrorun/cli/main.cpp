@@ -95,7 +95,7 @@ ExitCode Perform(const Options& options, Reporter& reporter) {
 }
 
 ExitCode Fail(Reporter& reporter, const char* kind, const char* text, ExitCode code) {
-  reporter.Error(PlainError(kind, {}, text));
+  reporter.Error(PlainDiagnostic(kind, {}, text));
   return code;
 }
 

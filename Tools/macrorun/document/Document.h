@@ -90,7 +90,6 @@ class Document {
   };
 
   struct NewText;
-  NewText Compose(const std::vector<Replacement>& replacements) const;
   void Apply(Edit edit);
   // Puts an edit's new lines into the place of its old ones, or the other way round.
   void Exchange(const Edit& edit, bool forward);

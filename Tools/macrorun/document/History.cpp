@@ -24,9 +24,7 @@ void History::End() {
   const OpenStep step = open.back();
   open.pop_back();
   if (step.cut) {
-    undo.clear();
-    bytes = 0;
-    for (OpenStep& outer : open) outer = {0, true};
+    Forget();
     return;
   }
   if (undo.size() < step.start + 2) return;

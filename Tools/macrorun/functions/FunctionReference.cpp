@@ -89,12 +89,12 @@ std::string_view RubyType(ResultKind kind) {
   return kind == ResultKind::kNumber ? "Integer" : "String";
 }
 
-// `begin(family)` comes before the first function of each family.
+// `begin(group)` comes before the first function of each group.
 template <class Begin, class Each>
 void ForEachFunction(const Begin& begin, const Each& each) {
-  std::string_view family;
+  std::string_view group;
   for (const MacroFunction& function : MacroFunctions()) {
-    if (family != function.family) begin(family = function.family);
+    if (group != function.group) begin(group = function.group);
     each(function);
   }
 }
@@ -155,7 +155,7 @@ std::string StubOf(const MacroFunction& function) {
 
 std::string FunctionList() {
   std::string list;
-  ForEachFunction([&](std::string_view family) { list += std::string(family) + ":\n"; },
+  ForEachFunction([&](std::string_view group) { list += std::string(group) + ":\n"; },
                   [&](const MacroFunction& function) {
                     std::string call = "  " + (function.name + ParameterList(function));
                     call.resize(std::max<std::size_t>(call.size() + 1, 32), ' ');
@@ -166,7 +166,7 @@ std::string FunctionList() {
 
 std::string FunctionMarkdown() {
   std::string page = kMarkdownHead;
-  ForEachFunction([&](std::string_view family) { page += "\n## " + std::string(family) + "\n"; },
+  ForEachFunction([&](std::string_view group) { page += "\n## " + std::string(group) + "\n"; },
                   [&](const MacroFunction& function) { page += MarkdownOf(function); });
   return page;
 }
@@ -174,7 +174,7 @@ std::string FunctionMarkdown() {
 std::string FunctionStubs() {
   std::string file = kStubsHead;
   ForEachFunction(
-      [&](std::string_view family) { file += "\n  # @!group " + std::string(family) + "\n"; },
+      [&](std::string_view group) { file += "\n  # @!group " + std::string(group) + "\n"; },
       [&](const MacroFunction& function) { file += StubOf(function); });
   return file + kStubsTail;
 }

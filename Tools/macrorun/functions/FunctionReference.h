@@ -7,7 +7,7 @@
 
 #include <string>
 
-// One line for each function, under its family.
+// One line for each function, under its group.
 std::string FunctionList();
 
 // Docs/functions.md.

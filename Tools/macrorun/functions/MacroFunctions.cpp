@@ -8,7 +8,7 @@
 #include <numeric>
 
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 #include "iLib/iComText.h"
 #include "platform/Encoding.h"
 
@@ -16,24 +16,24 @@ namespace {
 
 std::vector<MacroFunction> AllFunctions() {
   std::vector<MacroFunction> all;
-  for (const Family& family : {TextFamily(), LineFamily(), CursorFamily(), SelectionFamily(),
-                               DeletingFamily(), FindFamily(), CaseFamily(), MarkFamily(),
-                               ClipboardFamily(), UndoFamily(), DocumentFamily(), MacroFamily()})
-    for (MacroFunction function : family.functions) {
-      function.family = family.name;
+  for (const FunctionGroup& group :
+       {TextGroup(), LineGroup(), CursorGroup(), SelectionGroup(), DeletingGroup(), FindGroup(),
+        CaseGroup(), MarkGroup(), ClipboardGroup(), UndoGroup(), DocumentGroup(), MacroGroup()})
+    for (MacroFunction function : group.functions) {
+      function.group = group.name;
       all.push_back(std::move(function));
     }
   return all;
 }
 
 // Why a macro would not receive this text as it is; empty when it would.
-std::string Hindrance(const std::string& text, TextPassage passage) {
+std::string WhyRejected(const std::string& text, ResultEncoding encoding) {
   const std::size_t length = WideLength(text);
   if (length >= kWideLimit)
     return std::to_string(length) +
            " characters, and a macro receives at most 1023; get_text gives pieces of it";
   if (text.find('\0') != text.npos) return "a zero byte, which would end it";
-  if (passage == TextPassage::kBytes || LowBytesStay(text)) return {};
+  if (encoding == ResultEncoding::kBytes || LowBytesStay(text)) return {};
   return "a byte from 0x80 to 0x9F, which the system's code page would change on its way to the "
          "macro (in UTF-8, capital umlauts and dashes have one)";
 }
@@ -56,14 +56,14 @@ std::size_t EditDistance(std::string_view from, std::string_view to) {
 }
 
 void CheckResult(const MacroFunction& function, const MacroCall& call, const MacroResult& result,
-                 TextPassage passage) {
+                 ResultEncoding encoding) {
   const std::string* text = std::get_if<std::string>(&result);
-  const std::string hindrance = text ? Hindrance(*text, passage) : "";
-  if (hindrance.empty()) return;
+  const std::string reason = text ? WhyRejected(*text, encoding) : "";
+  if (reason.empty()) return;
   const bool line = call.Has(0) && function.parameters.front().kind == ParameterKind::kLine;
   const std::string what = line ? "line " + std::to_string(call.Number(0)) : "the text";
   throw WrongCall(function.name, 0, "a text that can pass to the macro",
-                  std::string(function.name) + ": " + what + " has " + hindrance);
+                  std::string(function.name) + ": " + what + " has " + reason);
 }
 
 }  // namespace
@@ -93,7 +93,7 @@ std::string NoMacroFunction(std::string_view name) {
 }
 
 MacroResult CallMacroFunction(std::uint32_t id, Editor& editor, EditorServices& services,
-                              std::span<const HostArgument> arguments, TextPassage passage) {
+                              std::span<const HostArgument> arguments, ResultEncoding encoding) {
   const std::span<const MacroFunction> functions = MacroFunctions();
   if (id < 1 || id > functions.size())
     throw WrongCall("", 0, "a macro function",
@@ -102,7 +102,7 @@ MacroResult CallMacroFunction(std::uint32_t id, Editor& editor, EditorServices& 
   MacroCall call(function, editor, services, arguments);
   const EditorStep step(editor);
   MacroResult result = function.run(call);
-  CheckResult(function, call, result, passage);
+  CheckResult(function, call, result, encoding);
   return result;
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The macro functions that a macro calls on `tarn`: one table of names, parameters, results and
 // help, from which the lookup, the argument checks and the documentation come. The functions
-// themselves stand by families in functions/.
+// themselves stand by groups in functions/.
 //
 // Lines and columns count from 1, columns in characters (Characters.h). Numbers may arrive as an
 // integer, as a real without fraction or as the text of a number (which is how a variable passed by
@@ -79,10 +79,10 @@ struct MacroFunction {
   ResultKind result;
   const char* help;  // one line that can be understood alone; what it answers comes last
   MacroResult (*run)(MacroCall& call);
-  const char* family = "";  // filled in by the table
+  const char* group = "";  // filled in by the table
 };
 
-// All functions, family by family. Function n has the number n + 1.
+// All functions, group by group. Function n has the number n + 1.
 std::span<const MacroFunction> MacroFunctions();
 
 // The number of a function, in any case (some script languages know none); kUnknownId if there is
@@ -93,14 +93,14 @@ std::string NoMacroFunction(std::string_view name);
 
 // How a script engine shows its macros a text result, which it gets in UTF-16 by the system's ANSI
 // code page.
-enum class TextPassage {
+enum class ResultEncoding {
   kCharacters,  // as that UTF-16
   kBytes,       // as the bytes that the host gave
 };
 
 // Carries out function `id` as one step of the editor. Throws WrongCall.
 MacroResult CallMacroFunction(std::uint32_t id, Editor& editor, EditorServices& services,
-                              std::span<const HostArgument> arguments, TextPassage passage);
+                              std::span<const HostArgument> arguments, ResultEncoding encoding);
 
 // "(line, column[, count])"
 std::string ParameterList(const MacroFunction& function);

@@ -3,6 +3,8 @@
 
 #include <windows.h>
 
+#include <algorithm>
+#include <cstring>
 #include <cwchar>
 #include <system_error>
 
@@ -15,8 +17,15 @@ namespace fs = std::filesystem;
 
 namespace {
 
-// What the module keeps of a ProgID.
+// The module cuts a ProgID after that many characters.
 constexpr std::size_t kLongestEngine = 18;
+
+constexpr char kRubyEngine[] = "RubyScript";
+constexpr std::string_view kRubyEngines[] = {kRubyEngine, "Tarn.RubyScript", "Tarn.RubyScript.1"};
+
+bool EqualIgnoringCase(std::string_view left, std::string_view right) {
+  return left.size() == right.size() && _strnicmp(left.data(), right.data(), left.size()) == 0;
+}
 
 std::string EngineOf(const fs::path& description) {
   wchar_t name[kLongestEngine + 1];
@@ -25,7 +34,9 @@ std::string EngineOf(const fs::path& description) {
   return WideToUtf8(name);
 }
 
-bool IsRuby(const fs::path& macro) { return _wcsicmp(macro.extension().c_str(), L".rbs") == 0; }
+bool IsRubyMacro(const fs::path& macro) {
+  return _wcsicmp(macro.extension().c_str(), L".rbs") == 0;
+}
 
 // The description of the language that has the macro's extension; there may be none.
 fs::path DescriptionFor(const fs::path& macro) {
@@ -47,7 +58,7 @@ Language ChooseLanguage(const LanguageOptions& options, const fs::path& macro) {
     RequireReadable(options.description, "language description (--description)");
     return Described(options.description);
   }
-  if (IsRuby(macro)) return {{}, "RubyScript"};
+  if (IsRubyMacro(macro)) return {{}, kRubyEngine};
   const fs::path file = DescriptionFor(macro);
   if (HasLanguage(macro)) return Described(file);
   if (_wcsicmp(macro.extension().c_str(), L".rb") == 0)
@@ -58,7 +69,12 @@ Language ChooseLanguage(const LanguageOptions& options, const fs::path& macro) {
                    "); name the engine with --engine, or a description with --description");
 }
 
+bool IsRubyEngine(std::string_view engine) {
+  return std::ranges::any_of(
+      kRubyEngines, [engine](std::string_view name) { return EqualIgnoringCase(engine, name); });
+}
+
 bool HasLanguage(const fs::path& macro) {
   std::error_code error;
-  return IsRuby(macro) || fs::is_regular_file(DescriptionFor(macro), error);
+  return IsRubyMacro(macro) || fs::is_regular_file(DescriptionFor(macro), error);
 }

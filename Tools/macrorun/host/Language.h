@@ -7,13 +7,19 @@
 
 #include <filesystem>
 #include <string>
+#include <string_view>
 
 struct LanguageOptions {
   std::string engine;                 // ProgID; empty: not given
   std::filesystem::path description;  // empty: not given
 };
 
+// Whether a ProgID names the Ruby engine.
+bool IsRubyEngine(std::string_view engine);
+
 struct Language {
+  bool IsRuby() const { return IsRubyEngine(engine); }
+
   std::filesystem::path description;  // empty: one that names the engine only
   std::string engine;                 // ProgID
 };

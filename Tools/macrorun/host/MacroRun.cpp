@@ -12,8 +12,9 @@
 
 #include "functions/MacroFunctions.h"
 #include "host/ArgumentCopies.h"
+#include "host/DiagnosticCollector.h"
 #include "host/HostLink.h"
-#include "host/ModuleReports.h"
+#include "host/RubyCallChain.h"
 #include "host/RunControl.h"
 #include "host/RunServices.h"
 #include "platform/Encoding.h"
@@ -28,7 +29,7 @@ using Clock = std::chrono::steady_clock;
 
 class MacroRun final : public NestedRunner {
  public:
-  MacroRun(RunSurroundings& runSurroundings, Editor& runEditor);
+  MacroRun(RunContext& runContext, Editor& runEditor);
   ExitCode Run();
 
  private:
@@ -39,7 +40,7 @@ class MacroRun final : public NestedRunner {
 
   // The callbacks. None may let an exception out.
   static MacroRun& From(void* context) { return *static_cast<MacroRun*>(context); }
-  static void OnReport(void* context, const char* text) { From(context).reports.Take(text); }
+  static void OnReport(void* context, const char* text) { From(context).diagnostics.Take(text); }
   static void OnTrace(void* context, const char* text) { From(context).TraceLine(text); }
   static std::uint32_t OnFunctionId(void* context, const char* name) {
     return From(context).FunctionId(name);
@@ -51,6 +52,7 @@ class MacroRun final : public NestedRunner {
   std::uint32_t FunctionId(const char* name) noexcept;
   bool Call(std::uint32_t id) noexcept;
   void Stopping() noexcept;
+  std::string CallChain();
   MacroResult Perform(std::uint32_t id, const std::string& name, const Arguments& arguments);
   bool WrongCallMade(const std::string& name, const WrongCall& wrong);
   void SetResult(const MacroResult& result);
@@ -58,52 +60,51 @@ class MacroRun final : public NestedRunner {
   bool RunNested(const fs::path& macro) override;
   ExitCode Outcome(bool succeeded);
 
-  RunSurroundings& surroundings;
+  RunContext& context;
   Editor& editor;
-  const TextPassage passage;
+  const ResultEncoding encoding;
   std::map<std::uint32_t, std::string> names;
-  ModuleReports reports;
+  DiagnosticCollector diagnostics;
   bool leftByJump = false;  // an engine that must not be touched any more
   std::unique_ptr<HostLink, DestroyLink> link;
   std::unique_ptr<RunControl> control;
   RunServices services;
 };
 
-MacroRun::MacroRun(RunSurroundings& runSurroundings, Editor& runEditor)
-    : surroundings(runSurroundings),
+MacroRun::MacroRun(RunContext& runContext, Editor& runEditor)
+    : context(runContext),
       editor(runEditor),
-      passage(runSurroundings.module.RunsRuby() ? TextPassage::kBytes : TextPassage::kCharacters),
-      reports(runSurroundings.reporter, passage == TextPassage::kCharacters),
-      services(runSurroundings.options, runSurroundings.reporter, *this,
-               runSurroundings.argumentsRead) {
+      encoding(runContext.language.IsRuby() ? ResultEncoding::kBytes : ResultEncoding::kCharacters),
+      diagnostics(runContext.reporter, encoding == ResultEncoding::kCharacters),
+      services(runContext.options, runContext.reporter, *this, runContext.argumentsRead) {
   const HostCallbacks callbacks = {this, OnReport, OnTrace, OnFunctionId, OnCall, OnStopping};
   link.reset(CreateHostLink(&callbacks));
   if (!link) throw std::bad_alloc();
 }
 
 ExitCode MacroRun::Run() {
-  control = std::make_unique<RunControl>(surroundings.module, surroundings.engines,
-                                         surroundings.reporter, surroundings.options.timeout);
+  control = std::make_unique<RunControl>(context.module, context.engines, context.reporter,
+                                         context.options.timeout);
   services.SetControl(control.get());
   const Clock::time_point begin = Clock::now();
-  const bool succeeded = Execute(surroundings.options.macro);
-  surroundings.profile.AddRun(Clock::now() - begin);
+  const bool succeeded = Execute(context.options.macro);
+  context.profile.AddRun(Clock::now() - begin);
   const ExitCode outcome = Outcome(succeeded);
-  if (leftByJump || outcome == kFault) surroundings.engines.Abandon();
+  if (leftByJump || outcome == kFault) context.engines.Abandon();
   return outcome;
 }
 
 ExitCode MacroRun::Outcome(bool succeeded) {
   const RunControl::Cause cause = control->StopCause();
   control.reset();
-  if (reports.Faulted()) return kFault;
+  if (diagnostics.Faulted()) return kFault;
   // A request that came too late for a macro that has ended does not count.
   if (cause != RunControl::Cause::kNone && !succeeded) {
-    ErrorReport report = reports.Stop();
+    Diagnostic report = diagnostics.Stop();
     report.kind = "stop";
     report.message = cause == RunControl::Cause::kUser ? "stopped" : "timed out";
-    if (report.file.empty()) report.file = ToUtf8(surroundings.options.macro);
-    surroundings.reporter.Error(std::move(report));
+    if (report.file.empty()) report.file = ToUtf8(context.options.macro);
+    context.reporter.Error(std::move(report));
     return kStopped;
   }
   return succeeded ? kSuccess : kMacroFailed;
@@ -112,16 +113,16 @@ ExitCode MacroRun::Outcome(bool succeeded) {
 // One `execute`, outermost or nested: whether the macro has succeeded.
 bool MacroRun::Execute(const fs::path& macro) {
   const std::string name = ScriptModule::NameOf(macro);
-  const ModuleReports::Scope scope(reports, {name, ToUtf8(macro)});
+  const DiagnosticCollector::Scope scope(diagnostics, {name, ToUtf8(macro)});
   const EditorStep step(editor);
   services.EnterMacro(macro);
-  const int result = surroundings.module.Execute(name, HostLinkInterface(link.get()));
+  const int result = context.module.Execute(name, HostLinkInterface(link.get()));
   services.LeaveMacro();
   leftByJump |= HostLinkStopCause(link.get()) != kNotStopped;
   const bool stopped = control->StopCause() != RunControl::Cause::kNone;
-  reports.EndRun(stopped);
+  diagnostics.EndRun(stopped);
   // An engine may count a macro as run although it has reported an error in it.
-  return result == 1 && !reports.ErrorSeen();
+  return result == 1 && !diagnostics.ErrorSeen();
 }
 
 bool MacroRun::RunNested(const fs::path& macro) {
@@ -132,8 +133,8 @@ bool MacroRun::RunNested(const fs::path& macro) {
 }
 
 void MacroRun::TraceLine(std::string_view text) noexcept {
-  if (!surroundings.options.trace) return;
-  surroundings.reporter.Trace(text.substr(0, text.find_last_not_of("\r\n") + 1));
+  if (!context.options.trace) return;
+  context.reporter.Trace(text.substr(0, text.find_last_not_of("\r\n") + 1));
 }
 
 std::uint32_t MacroRun::FunctionId(const char* name) noexcept {
@@ -147,37 +148,43 @@ bool MacroRun::Call(std::uint32_t id) noexcept try {
   const ArgumentCopies arguments(link.get());
   try {
     SetResult(Perform(id, name, arguments.List()));
-    return !reports.Faulted();
+    return !diagnostics.Faulted();
   } catch (const WrongCall& wrong) {
     return WrongCallMade(name, wrong);
   }
 } catch (const std::exception& error) {
-  reports.Add(PlainError("fault", {}, error.what()));
+  diagnostics.Add(PlainDiagnostic("fault", {}, error.what()));
   return false;
 }
 
 void MacroRun::Stopping() noexcept {
-  ErrorReport place;
-  place.file = reports.File();
-  SetCallChain(place, surroundings.engines.CallChain());
-  reports.AddStop(std::move(place));
+  Diagnostic place;
+  place.file = diagnostics.File();
+  SetCallChain(place, CallChain());
+  diagnostics.AddStop(std::move(place));
+}
+
+// Empty for an engine that cannot report it.
+std::string MacroRun::CallChain() {
+  ScriptEngineProxy* const engine = context.engines.Innermost();
+  return engine && context.language.IsRuby() ? RubyCallChain(*engine) : std::string();
 }
 
 MacroResult MacroRun::Perform(std::uint32_t id, const std::string& name,
                               const Arguments& arguments) {
-  const bool trace = surroundings.options.trace;
-  if (!trace && !surroundings.options.profile)
-    return CallMacroFunction(id, editor, services, arguments, passage);
+  const bool trace = context.options.trace;
+  if (!trace && !context.options.profile)
+    return CallMacroFunction(id, editor, services, arguments, encoding);
   const std::string call = trace ? CallText(name, arguments) : "";
   const Clock::time_point begin = Clock::now();
   try {
-    MacroResult result = CallMacroFunction(id, editor, services, arguments, passage);
-    surroundings.profile.AddCall(name, Clock::now() - begin);
-    if (trace) surroundings.reporter.Trace(call + " -> " + ResultText(result));
+    MacroResult result = CallMacroFunction(id, editor, services, arguments, encoding);
+    context.profile.AddCall(name, Clock::now() - begin);
+    if (trace) context.reporter.Trace(call + " -> " + ResultText(result));
     return result;
   } catch (const WrongCall&) {
-    surroundings.profile.AddCall(name, Clock::now() - begin);
-    if (trace) surroundings.reporter.Trace(call + " -> wrong call");
+    context.profile.AddCall(name, Clock::now() - begin);
+    if (trace) context.reporter.Trace(call + " -> wrong call");
     throw;
   }
 }
@@ -188,16 +195,16 @@ bool MacroRun::WrongCallMade(const std::string& name, const WrongCall& wrong) {
     Stopping();
     return false;
   }
-  ErrorReport report;
+  Diagnostic report;
   report.kind = "call";
   report.function = wrong.function.empty() ? name : wrong.function;
   report.argument = static_cast<int>(wrong.argument);
   report.expected = wrong.expected;
   report.message = wrong.what();
-  report.file = reports.File();
-  SetCallChain(report, surroundings.engines.CallChain());
-  reports.Add(std::move(report));
-  return surroundings.options.keepGoing;
+  report.file = diagnostics.File();
+  SetCallChain(report, CallChain());
+  diagnostics.Add(std::move(report));
+  return context.options.keepGoing;
 }
 
 void MacroRun::SetResult(const MacroResult& result) {
@@ -210,9 +217,8 @@ void MacroRun::SetResult(const MacroResult& result) {
 
 }  // namespace
 
-ExitCode RunMacro(RunSurroundings& surroundings, Editor& editor) {
-  RequireMacro(surroundings.options.macro);
-  for (unsigned i = 0; i < surroundings.options.repeat; ++i)
-    if (const ExitCode code = MacroRun(surroundings, editor).Run(); code != kSuccess) return code;
+ExitCode RunMacro(RunContext& context, Editor& editor) {
+  for (unsigned i = 0; i < context.options.repeat; ++i)
+    if (const ExitCode code = MacroRun(context, editor).Run(); code != kSuccess) return code;
   return kSuccess;
 }

@@ -11,7 +11,7 @@
 #include <optional>
 #include <string>
 
-#include "report/ErrorReport.h"
+#include "report/Diagnostic.h"
 
 class ParseSite final : public IActiveScriptSite {
  public:
@@ -19,7 +19,7 @@ class ParseSite final : public IActiveScriptSite {
   ParseSite(std::string macroName, bool countsBytes)
       : macro(std::move(macroName)), columnsInBytes(countsBytes) {}
 
-  std::optional<ErrorReport> TakeError() { return std::move(error); }
+  std::optional<Diagnostic> TakeError() { return std::move(error); }
 
   STDMETHODIMP QueryInterface(REFIID riid, void** object) override;
   STDMETHODIMP_(ULONG) AddRef() override { return 1; }
@@ -38,5 +38,5 @@ class ParseSite final : public IActiveScriptSite {
  private:
   const std::string macro;
   const bool columnsInBytes;
-  std::optional<ErrorReport> error;
+  std::optional<Diagnostic> error;
 };

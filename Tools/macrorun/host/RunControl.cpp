@@ -3,7 +3,7 @@
 
 #include <windows.h>
 
-#include "host/EngineWatch.h"
+#include "host/RunningEngines.h"
 #include "host/ScriptModule.h"
 #include "platform/ExitCode.h"
 #include "report/Reporter.h"
@@ -42,7 +42,7 @@ void SetCurrent(RunControl* control) {
 
 void RunControl::CatchInterrupts() { SetConsoleCtrlHandler(OnConsoleEvent, TRUE); }
 
-RunControl::RunControl(ScriptModule& runModule, EngineWatch& runEngines, Reporter& runReporter,
+RunControl::RunControl(ScriptModule& runModule, RunningEngines& runEngines, Reporter& runReporter,
                        double runTimeout)
     : module(runModule),
       engines(runEngines),

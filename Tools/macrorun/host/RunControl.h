@@ -14,7 +14,7 @@
 #include <mutex>
 #include <thread>
 
-class EngineWatch;
+class RunningEngines;
 class Reporter;
 class ScriptModule;
 
@@ -26,7 +26,7 @@ class RunControl {
   static void CatchInterrupts();
 
   // `timeout` 0: none.
-  RunControl(ScriptModule& module, EngineWatch& engines, Reporter& reporter, double timeout);
+  RunControl(ScriptModule& module, RunningEngines& engines, Reporter& reporter, double timeout);
   ~RunControl();
   RunControl(const RunControl&) = delete;
   RunControl& operator=(const RunControl&) = delete;
@@ -48,7 +48,7 @@ class RunControl {
   void Stop(std::unique_lock<std::mutex>& hold);
 
   ScriptModule& module;
-  EngineWatch& engines;
+  RunningEngines& engines;
   Reporter& reporter;
   const double timeout;
   std::mutex lock;

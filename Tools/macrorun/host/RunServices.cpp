@@ -58,14 +58,14 @@ std::optional<std::string> RunServices::MacroArgument(const std::string& name) {
 bool RunServices::RunMacro(const fs::path& macro) {
   const fs::path file = macros.back().parent_path() / macro;
   std::error_code error;
-  std::string hindrance;
+  std::string reason;
   if (!fs::is_regular_file(file, error))
-    hindrance = "there is no macro " + ToUtf8(file);
+    reason = "there is no macro " + ToUtf8(file);
   else if (macros.size() >= kDeepest)
-    hindrance = "macros run each other more than " + std::to_string(kDeepest) + " deep";
+    reason = "macros run each other more than " + std::to_string(kDeepest) + " deep";
   else
-    hindrance = Unreadable(file);
-  if (hindrance.empty()) return nested.RunNested(file);
-  reporter.Error(PlainError("call", macros.back(), std::move(hindrance)));
+    reason = Unreadable(file);
+  if (reason.empty()) return nested.RunNested(file);
+  reporter.Error(PlainDiagnostic("call", macros.back(), std::move(reason)));
   return false;
 }

@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "host/ScriptModule.h"
 
-#include <cstdio>
-#include <cwchar>
 #include <fstream>
 
 #include "platform/Encoding.h"
@@ -13,11 +11,6 @@
 namespace fs = std::filesystem;
 
 namespace {
-
-constexpr wchar_t kModuleName[] = L"scriptruby.dll";
-
-// Private folders are named by the process's id and a number.
-constexpr wchar_t kFolderName[] = L"macrorun-%lu-%lu";
 
 using ExecuteFunction = i32(__stdcall*)(const char* file, void* host);
 using KillFunction = bool(__stdcall*)(i32 value);
@@ -40,39 +33,6 @@ void WriteDescription(const fs::path& file, const std::string& engine) {
   std::ofstream(file, std::ios::binary) << "[Options]\r\nLanguage=" << engine << "\r\n";
 }
 
-bool ProcessExists(DWORD id) {
-  const HANDLE process = OpenProcess(SYNCHRONIZE, FALSE, id);
-  if (!process) return GetLastError() != ERROR_INVALID_PARAMETER;
-  const bool running = WaitForSingleObject(process, 0) == WAIT_TIMEOUT;
-  CloseHandle(process);
-  return running;
-}
-
-// Removes a private folder by the names of what it holds and never recursively: what else stands in
-// a folder of such a name, or behind a link, is not this program's.
-void RemoveFolder(const fs::path& folder, std::error_code& error) {
-  for (const fs::path& name : {fs::path(kModuleName), fs::path(kDescriptionFileName)})
-    if (fs::remove(folder / name, error); error) return;
-  fs::remove(folder, error);
-}
-
-// Removes the folders of processes that were killed.
-void RemoveAbandoned(const fs::path& parent) {
-  std::error_code error;
-  for (fs::directory_iterator entry(parent, error), end; !error && entry != end;
-       entry.increment(error)) {
-    const std::wstring name = entry->path().filename().wstring();
-    DWORD owner = 0, number = 0;
-    wchar_t rest = 0;
-    if (swscanf(name.c_str(), L"macrorun-%lu-%lu%lc", &owner, &number, &rest) != 2) continue;
-    const DWORD attributes = GetFileAttributesW(entry->path().c_str());
-    if (attributes == INVALID_FILE_ATTRIBUTES || attributes & FILE_ATTRIBUTE_REPARSE_POINT)
-      continue;
-    std::error_code ignored;
-    if (!ProcessExists(owner)) RemoveFolder(entry->path(), ignored);
-  }
-}
-
 fs::path RequireAnsiNamed(const fs::path& path) {
   const std::optional<fs::path> named = AnsiNamed(path);
   if (!named)
@@ -82,34 +42,6 @@ fs::path RequireAnsiNamed(const fs::path& path) {
 }
 
 }  // namespace
-
-PrivateFolder::PrivateFolder() {
-  std::error_code error;
-  const fs::path parent = fs::temp_directory_path(error);
-  RemoveAbandoned(parent);
-  for (DWORD i = 0; i < 100 && !error; ++i) {
-    wchar_t name[40];
-    std::swprintf(name, std::size(name), kFolderName, GetCurrentProcessId(), GetTickCount() + i);
-    const fs::path candidate = parent / name;
-    if (!fs::create_directory(candidate, error)) continue;
-    path = candidate;
-    return;
-  }
-  throw UsageError("cannot make a folder in the temporary folder " + ToUtf8(parent) + ": " +
-                   error.message());
-}
-
-PrivateFolder::~PrivateFolder() {
-  try {
-    std::error_code error;
-    RemoveFolder(path, error);
-    if (error)
-      std::fprintf(stderr, "macrorun: the temporary folder %s is left behind: %s\n",
-                   ToUtf8(path).c_str(), error.message().c_str());
-  } catch (...) {
-    std::fputs("macrorun: no memory to remove the temporary folder; a later run does\n", stderr);
-  }
-}
 
 ScriptModule::ScriptModule(const fs::path& file, const Language* language) {
   std::error_code error;
@@ -129,14 +61,13 @@ ScriptModule::ScriptModule(const fs::path& file, const Language* language) {
 
 fs::path ScriptModule::CopyPrivately(const fs::path& file, const Language& language) {
   folder.emplace();
-  Copy(file, folder->Path() / kModuleName);
-  const fs::path description = folder->Path() / kDescriptionFileName;
+  Copy(file, folder->Module());
   if (language.description.empty())
-    WriteDescription(description, language.engine);
+    WriteDescription(folder->Description(), language.engine);
   else
-    Copy(language.description, description);
+    Copy(language.description, folder->Description());
   // The module asks for its own folder in the ANSI code page.
-  return RequireAnsiNamed(folder->Path()) / kModuleName;
+  return RequireAnsiNamed(folder->Path()) / PrivateFolder::kModuleName;
 }
 
 // Also after a stop or a fault, which leave a script engine behind that points into the module: it
@@ -165,10 +96,4 @@ bool ScriptModule::FillRecord(ScriptInfoRecord& record) {
 std::string ScriptModule::Description() {
   ScriptInfoRecord record;
   return FillRecord(record) ? record.description : "";
-}
-
-// The module's name for a language begins with the engine's, which has two.
-bool ScriptModule::RunsRuby() {
-  const std::string description = Description();
-  return description.starts_with("RubyScript ") || description.starts_with("Tarn.RubyScript ");
 }

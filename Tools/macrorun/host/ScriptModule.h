@@ -3,8 +3,7 @@
 //
 // The module reads its language description from its own folder, or else from the user's. To give it
 // another one, its file and the description are copied into a private temporary folder and loaded
-// from there; the folder goes when the object does. A process that is killed leaves its folder to the
-// next run.
+// from there.
 //
 // Errors: UsageError. Threading: one thread, but Kill may come from any.
 #pragma once
@@ -16,22 +15,9 @@
 #include <string>
 
 #include "host/Language.h"
+#include "host/PrivateFolder.h"
 
 struct ScriptInfoRecord;
-
-// A folder under the user's temporary folder, removed with the two files that it may hold.
-class PrivateFolder {
- public:
-  PrivateFolder();  // throws UsageError
-  ~PrivateFolder();
-  PrivateFolder(const PrivateFolder&) = delete;
-  PrivateFolder& operator=(const PrivateFolder&) = delete;
-
-  const std::filesystem::path& Path() const { return path; }
-
- private:
-  std::filesystem::path path;
-};
 
 class ScriptModule {
  public:
@@ -55,7 +41,6 @@ class ScriptModule {
   bool FillRecord(ScriptInfoRecord& record);
   // The name of the module's language; empty when the module refuses to tell.
   std::string Description();
-  bool RunsRuby();
 
  private:
   std::filesystem::path CopyPrivately(const std::filesystem::path& file, const Language& language);

@@ -26,23 +26,6 @@ bool IsTerminal(std::FILE* stream);
 // Also a pipe that does not tell: Wine looks into none of Unix's.
 bool InputIsLeft();
 
-// Takes what is written to standard error's descriptor meanwhile, as by libraries in this process; nothing
-// without a temporary file to keep it in.
-class ErrorCapture {
- public:
-  ErrorCapture();
-  ~ErrorCapture() { Take(); }
-  ErrorCapture(const ErrorCapture&) = delete;
-  ErrorCapture& operator=(const ErrorCapture&) = delete;
-
-  // Ends it.
-  std::string Take();
-
- private:
-  int file;   // -1: none
-  int saved;  // standard error itself
-};
-
 // To standard output, byte for byte unless it is a terminal. UsageError when that fails.
 void WriteStandardOutput(std::string_view bytes);
 

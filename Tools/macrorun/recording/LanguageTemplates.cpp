@@ -69,7 +69,7 @@ class TemplateReader {
 LanguageTemplates TemplatesOf(ScriptModule& module, const Language& language) {
   ScriptInfoRecord record;
   if (!module.FillRecord(record)) throw UsageError("the module tells no templates");
-  if (language.description.empty() && !module.RunsRuby())
+  if (language.description.empty() && !language.IsRuby())
     throw UsageError("--engine " + language.engine +
                      " says nothing of how to write a macro; name a --description instead");
   LanguageTemplates templates;

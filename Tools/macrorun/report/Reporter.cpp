@@ -33,11 +33,11 @@ Colour ColourOf(DiffLine::Kind kind) {
 
 }  // namespace
 
-void Reporter::Error(ErrorReport error) {
+void Reporter::Error(Diagnostic error) {
   EndProgress();
   CompleteSource(error);
   if (form == Form::kJson) {
-    WriteError(ErrorAsJson(error) + "\n");
+    WriteError(DiagnosticAsJson(error) + "\n");
     return;
   }
   const std::string place = Place(error);

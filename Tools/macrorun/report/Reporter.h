@@ -11,7 +11,7 @@
 #include <string_view>
 #include <vector>
 
-#include "report/ErrorReport.h"
+#include "report/Diagnostic.h"
 #include "report/TextDiff.h"
 
 class Reporter {
@@ -27,7 +27,7 @@ class Reporter {
     macroCase = std::move(textCase);
   }
 
-  void Error(ErrorReport error);
+  void Error(Diagnostic error);
   // What a macro says.
   void Message(std::string_view text) { Line("message", "", text); }
   void Trace(std::string_view text) { Line("trace", "", text); }

@@ -5,7 +5,7 @@
 #include "document/Characters.h"
 #include "document/Motion.h"
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -85,4 +85,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family CaseFamily() { return {"Case and indent", kFunctions}; }
+FunctionGroup CaseGroup() { return {"Case and indent", kFunctions}; }

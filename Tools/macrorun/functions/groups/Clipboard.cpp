@@ -2,7 +2,7 @@
 // The editor's own clipboard, which all documents share. The system's is left alone, so that a run
 // depends on nothing but its input.
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -43,4 +43,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family ClipboardFamily() { return {"Clipboard", kFunctions}; }
+FunctionGroup ClipboardGroup() { return {"Clipboard", kFunctions}; }

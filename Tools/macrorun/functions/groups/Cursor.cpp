@@ -5,7 +5,7 @@
 #include "document/Characters.h"
 #include "document/Motion.h"
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -112,4 +112,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family CursorFamily() { return {"Cursor", kFunctions}; }
+FunctionGroup CursorGroup() { return {"Cursor", kFunctions}; }

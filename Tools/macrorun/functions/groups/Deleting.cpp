@@ -2,7 +2,7 @@
 // Deleting at the cursor. As with keys, a selection is deleted instead, whatever the count.
 #include "document/Motion.h"
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -53,4 +53,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family DeletingFamily() { return {"Deleting", kFunctions}; }
+FunctionGroup DeletingGroup() { return {"Deleting", kFunctions}; }

@@ -2,7 +2,7 @@
 // Several documents. Paths count from the process's current directory. Document 1 is the run's,
 // which alone decides where it goes: it needs a path to be saved and cannot be closed.
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 #include "platform/Encoding.h"
 #include "platform/ExitCode.h"
 #include "platform/Files.h"
@@ -109,4 +109,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family DocumentFamily() { return {"Documents", kFunctions}; }
+FunctionGroup DocumentGroup() { return {"Documents", kFunctions}; }

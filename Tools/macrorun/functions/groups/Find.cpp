@@ -9,7 +9,7 @@
 
 #include "document/Regex.h"
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -181,4 +181,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family FindFamily() { return {"Find and replace", kFunctions}; }
+FunctionGroup FindGroup() { return {"Find and replace", kFunctions}; }

@@ -6,7 +6,7 @@
 
 #include "document/Characters.h"
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -165,4 +165,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family LineFamily() { return {"Lines", kFunctions}; }
+FunctionGroup LineGroup() { return {"Lines", kFunctions}; }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The user, the command line and other macros.
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 #include "platform/Encoding.h"
 
 namespace {
@@ -58,4 +58,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family MacroFamily() { return {"Macro", kFunctions}; }
+FunctionGroup MacroGroup() { return {"Macro", kFunctions}; }

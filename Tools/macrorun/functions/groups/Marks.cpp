@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // Places with names, which move with the text. Each document has its own.
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -28,4 +28,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family MarkFamily() { return {"Marks", kFunctions}; }
+FunctionGroup MarkGroup() { return {"Marks", kFunctions}; }

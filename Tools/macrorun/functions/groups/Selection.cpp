@@ -2,7 +2,7 @@
 // The selection: from a place up to the cursor, which is at its end.
 #include "document/Motion.h"
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -101,4 +101,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family SelectionFamily() { return {"Selection", kFunctions}; }
+FunctionGroup SelectionGroup() { return {"Selection", kFunctions}; }

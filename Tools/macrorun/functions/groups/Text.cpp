@@ -5,7 +5,7 @@
 
 #include "document/Characters.h"
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -82,4 +82,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family TextFamily() { return {"Text", kFunctions}; }
+FunctionGroup TextGroup() { return {"Text", kFunctions}; }

@@ -2,7 +2,7 @@
 // Undo and redo in the current document. The steps of the running macro are its calls, those before
 // it whole macros.
 #include "functions/MacroCall.h"
-#include "functions/groups/Families.h"
+#include "functions/groups/FunctionGroups.h"
 
 namespace {
 
@@ -23,4 +23,4 @@ const std::vector<MacroFunction> kFunctions = {
 
 }  // namespace
 
-Family UndoFamily() { return {"Undo", kFunctions}; }
+FunctionGroup UndoGroup() { return {"Undo", kFunctions}; }

@@ -14,20 +14,20 @@
 inline constexpr IID kActiveScriptParse = {
     0xBB1A2AE2, 0xA4F9, 0x11CF, {0x8F, 0x20, 0x00, 0x80, 0x5F, 0x2C, 0xD0, 0x64}};
 
-class WatchedEngine final : public IActiveScript, public IActiveScriptParse {
+class ScriptEngineProxy final : public IActiveScript, public IActiveScriptParse {
  public:
   class Owner {
    public:
     virtual ~Owner() = default;
     // Returns when nobody uses the engine any more.
-    virtual void Going(WatchedEngine* engine) = 0;
+    virtual void OnReleased(ScriptEngineProxy* engine) = 0;
   };
 
   // Takes over the reference. The owner outlives the object.
-  WatchedEngine(IActiveScript* realEngine, IActiveScriptParse* realParser, Owner& engineOwner)
+  ScriptEngineProxy(IActiveScript* realEngine, IActiveScriptParse* realParser, Owner& engineOwner)
       : engine(realEngine), parser(realParser), owner(engineOwner) {}
-  WatchedEngine(const WatchedEngine&) = delete;
-  WatchedEngine& operator=(const WatchedEngine&) = delete;
+  ScriptEngineProxy(const ScriptEngineProxy&) = delete;
+  ScriptEngineProxy& operator=(const ScriptEngineProxy&) = delete;
 
   STDMETHODIMP QueryInterface(REFIID riid, void** object) override;
   STDMETHODIMP_(ULONG) AddRef() override;
@@ -59,7 +59,7 @@ class WatchedEngine final : public IActiveScript, public IActiveScriptParse {
                                VARIANT* result, EXCEPINFO* exception) override;
 
  private:
-  ~WatchedEngine() = default;
+  ~ScriptEngineProxy() = default;
 
   LONG references = 1;
   IActiveScript* const engine;

@@ -9,36 +9,36 @@
 #include <string_view>
 #include <vector>
 
-#include "report/ErrorReport.h"
+#include "report/Diagnostic.h"
 #include "report/Reporter.h"
 
-class ModuleReports {
+class DiagnosticCollector {
  public:
   // One run, outermost or nested: its errors count for it alone.
   class Scope {
    public:
-    Scope(ModuleReports& moduleReports, MacroName macro) : reports(moduleReports) {
-      reports.runs.push_back({std::move(macro), {}, {}, false});
+    Scope(DiagnosticCollector& owner, MacroName macro) : collector(owner) {
+      collector.runs.push_back({std::move(macro), {}, {}, false});
     }
-    ~Scope() { reports.runs.pop_back(); }
+    ~Scope() { collector.runs.pop_back(); }
     Scope(const Scope&) = delete;
     Scope& operator=(const Scope&) = delete;
 
    private:
-    ModuleReports& reports;
+    DiagnosticCollector& collector;
   };
 
   // `countsBytes`: whether the engine counts columns in bytes.
-  ModuleReports(Reporter& target, bool countsBytes)
+  DiagnosticCollector(Reporter& target, bool countsBytes)
       : reporter(target), columnsInBytes(countsBytes) {}
 
   // The first two inside a scope.
   void Take(std::string_view report) noexcept;
-  void Add(ErrorReport error);  // one that does not come from the module
+  void Add(Diagnostic error);  // one that does not come from the module
   // Where a macro was stopped; the first place counts.
-  void AddStop(ErrorReport place);
+  void AddStop(Diagnostic place);
   // For the outcome: with the macro's name alone where the place is not known.
-  ErrorReport Stop() const { return stop; }
+  Diagnostic Stop() const { return stop; }
   // What was held back comes out, unless the run was stopped and so had to fail.
   void EndRun(bool stopped);
   bool ErrorSeen() const { return runs.back().errorSeen; }
@@ -55,12 +55,12 @@ class ModuleReports {
     bool errorSeen;
   };
 
-  void TakeScriptError(ErrorReport error);
-  static ErrorReport Plain(const char* kind, std::string_view report);
+  void TakeScriptError(Diagnostic error);
+  static Diagnostic Plain(const char* kind, std::string_view report);
 
   Reporter& reporter;
   const bool columnsInBytes;
   std::vector<Run> runs;
-  ErrorReport stop;
+  Diagnostic stop;
   bool faulted = false;
 };

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "report/ErrorReport.h"
+#include "report/Diagnostic.h"
 
 #include <algorithm>
 #include <charconv>
@@ -29,7 +29,7 @@ std::string_view Trimmed(std::string_view text) {
 }
 
 // "LINE:COLUMN", the column from 0 and -1 for none.
-void ReadPosition(std::string_view text, ErrorReport& error) {
+void ReadPosition(std::string_view text, Diagnostic& error) {
   const std::size_t colon = text.find(':');
   if (colon == text.npos) return;
   error.line = std::max(Number(text.substr(0, colon)), 0);
@@ -65,7 +65,7 @@ bool IsUnderline(std::string_view line) {
 bool IsWarning(std::string_view line) { return BehindPlace(line).starts_with("warning: "); }
 
 // A chain that is the place of the error itself, once more.
-void ForgetOwnPlace(ErrorReport& error) {
+void ForgetOwnPlace(Diagnostic& error) {
   if (error.details.size() == 1 && error.details[0].ends_with("in `<main>'")) error.details.clear();
 }
 
@@ -81,20 +81,21 @@ bool ContinuesCharacter(char byte) { return (static_cast<unsigned char>(byte) & 
 
 }  // namespace
 
-ErrorReport PlainError(const char* kind, const std::filesystem::path& file, std::string message) {
-  ErrorReport error;
+Diagnostic PlainDiagnostic(const char* kind, const std::filesystem::path& file,
+                           std::string message) {
+  Diagnostic error;
   error.kind = kind;
   error.file = ToUtf8(file);
   error.message = std::move(message);
   return error;
 }
 
-std::optional<ErrorReport> ParseScriptError(std::string_view report, const MacroName& macro) {
+std::optional<Diagnostic> ParseScriptError(std::string_view report, const MacroName& macro) {
   const std::string_view beginning = kScriptErrorReport;
   if (!report.starts_with(beginning)) return {};
   report.remove_prefix(beginning.size());
   if (report.starts_with(kFileMark)) report.remove_prefix(kFileMark.size());
-  ErrorReport error;
+  Diagnostic error;
   error.kind = "script";
   const std::size_t reason = report.find(kReasonMark);
   const std::string_view head = report.substr(0, reason);
@@ -112,7 +113,7 @@ std::optional<ErrorReport> ParseScriptError(std::string_view report, const Macro
   return error;
 }
 
-void SetDescription(ErrorReport& error, std::string_view description) {
+void SetDescription(Diagnostic& error, std::string_view description) {
   bool first = true;
   while (!description.empty()) {
     const std::size_t end = description.find('\n');
@@ -129,7 +130,7 @@ void SetDescription(ErrorReport& error, std::string_view description) {
   ForgetOwnPlace(error);
 }
 
-void SetCallChain(ErrorReport& error, std::string_view chain) {
+void SetCallChain(Diagnostic& error, std::string_view chain) {
   while (!chain.empty()) {
     const std::size_t end = std::min(chain.find('\n'), chain.size());
     const std::string_view line = chain.substr(0, end);
@@ -156,7 +157,7 @@ std::string WithFile(std::string_view text, const std::string& file) {
   return result;
 }
 
-void CompleteSource(ErrorReport& error) {
+void CompleteSource(Diagnostic& error) {
   if (error.line < 1) return;
   if (error.source.empty()) error.source = LineOf(error.file, error.line);
   if (!error.columnInBytes || error.column < 1) return;
@@ -166,7 +167,7 @@ void CompleteSource(ErrorReport& error) {
   error.columnInBytes = false;
 }
 
-std::string ErrorAsJson(const ErrorReport& error) {
+std::string DiagnosticAsJson(const Diagnostic& error) {
   nlohmann::ordered_json json;
   json["type"] = "error";
   json["kind"] = error.kind;
@@ -182,7 +183,7 @@ std::string ErrorAsJson(const ErrorReport& error) {
   return json.dump(-1, ' ', false, nlohmann::json::error_handler_t::replace);
 }
 
-std::string Place(const ErrorReport& error) {
+std::string Place(const Diagnostic& error) {
   if (error.file.empty()) return {};
   std::string place = error.file + ":";
   if (error.line > 0) place += std::to_string(error.line) + ":";
@@ -190,7 +191,7 @@ std::string Place(const ErrorReport& error) {
   return place + " ";
 }
 
-std::string CaretLine(const ErrorReport& error) {
+std::string CaretLine(const Diagnostic& error) {
   if (error.column < 1 || error.source.empty()) return {};
   std::string line;
   std::size_t byte = 0;

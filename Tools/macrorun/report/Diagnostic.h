@@ -14,7 +14,7 @@
 #include <string_view>
 #include <vector>
 
-struct ErrorReport {
+struct Diagnostic {
   std::string kind;  // as the user's guide lists them
   std::string file;
   int line = 0;
@@ -29,7 +29,8 @@ struct ErrorReport {
 };
 
 // An error without a place. No path: of no file.
-ErrorReport PlainError(const char* kind, const std::filesystem::path& file, std::string message);
+Diagnostic PlainDiagnostic(const char* kind, const std::filesystem::path& file,
+                           std::string message);
 
 // How a macro is named: in what `execute` is given and the module's reports say, and to the user.
 struct MacroName {
@@ -38,28 +39,28 @@ struct MacroName {
 };
 
 // The module's report of a script error; nothing for another report.
-std::optional<ErrorReport> ParseScriptError(std::string_view report, const MacroName& macro);
+std::optional<Diagnostic> ParseScriptError(std::string_view report, const MacroName& macro);
 
 // An engine's description of an error becomes message and details: what repeats the place or the
 // source line is left out, and `file` stands for the name that the engine has for a macro.
-void SetDescription(ErrorReport& error, std::string_view description);
+void SetDescription(Diagnostic& error, std::string_view description);
 
 // What an engine tells of the calls that led to a place, "macro:3:in `f'" a line, innermost first, becomes
 // line and details of an error whose file is known.
-void SetCallChain(ErrorReport& error, std::string_view chain);
+void SetCallChain(Diagnostic& error, std::string_view chain);
 
 // In warnings of the Ruby engine, a line each, the macro's file in place of the engine's name for it; other
 // lines as they are.
 std::string WithFile(std::string_view text, const std::string& file);
 
 // The line's text from the macro file, where the engine has told none, and the column in characters.
-void CompleteSource(ErrorReport& error);
+void CompleteSource(Diagnostic& error);
 
 // One JSON object without a line end.
-std::string ErrorAsJson(const ErrorReport& error);
+std::string DiagnosticAsJson(const Diagnostic& error);
 
 // "file:line:column: " as far as it is known.
-std::string Place(const ErrorReport& error);
+std::string Place(const Diagnostic& error);
 
 // The blanks and the caret below the source line; empty when the column is unknown or beyond it.
-std::string CaretLine(const ErrorReport& error);
+std::string CaretLine(const Diagnostic& error);

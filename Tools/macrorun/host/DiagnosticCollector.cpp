@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: MIT
-#include "host/ModuleReports.h"
+#include "host/DiagnosticCollector.h"
 
 #include <utility>
 
 #include "functions/MacroFunctions.h"
-#include "host/EngineWatch.h"
+#include "host/RunningEngines.h"
 #include "xLib/xTexts.h"
 
 namespace {
@@ -20,11 +20,11 @@ bool IsFollowUp(std::string_view report) {
 
 }  // namespace
 
-void ModuleReports::Take(std::string_view report) noexcept {
+void DiagnosticCollector::Take(std::string_view report) noexcept {
   if (report.starts_with(kFaultReport)) {
     faulted = true;
     Add(Plain("fault", report));
-  } else if (std::optional<ErrorReport> error = ParseScriptError(report, runs.back().macro)) {
+  } else if (std::optional<Diagnostic> error = ParseScriptError(report, runs.back().macro)) {
     error->columnInBytes = columnsInBytes;
     if (error->message == kInterruption)
       AddStop(std::move(*error));
@@ -39,7 +39,7 @@ void ModuleReports::Take(std::string_view report) noexcept {
   }
 }
 
-void ModuleReports::TakeScriptError(ErrorReport error) {
+void DiagnosticCollector::TakeScriptError(Diagnostic error) {
   Run& run = runs.back();
   // A macro may have caught the error of the unknown name, and this is another one.
   const std::string& unknown = run.unknownFunction;
@@ -54,25 +54,25 @@ void ModuleReports::TakeScriptError(ErrorReport error) {
   reporter.Error(std::move(error));
 }
 
-void ModuleReports::Add(ErrorReport error) {
+void DiagnosticCollector::Add(Diagnostic error) {
   Run& run = runs.back();
   if (error.file.empty()) error.file = run.macro.shown;
   run.errorSeen = true;
   reporter.Error(std::move(error));
 }
 
-void ModuleReports::AddStop(ErrorReport place) {
+void DiagnosticCollector::AddStop(Diagnostic place) {
   if (stop.file.empty()) stop = std::move(place);
 }
 
-void ModuleReports::EndRun(bool stopped) {
+void DiagnosticCollector::EndRun(bool stopped) {
   Run& run = runs.back();
   if (!run.followUp.empty() && !run.errorSeen && !stopped) Add(Plain("engine", run.followUp));
 }
 
 // The first line is the message.
-ErrorReport ModuleReports::Plain(const char* kind, std::string_view report) {
-  ErrorReport error;
+Diagnostic DiagnosticCollector::Plain(const char* kind, std::string_view report) {
+  Diagnostic error;
   error.kind = kind;
   while (!report.empty()) {
     const std::size_t end = report.find('\n');

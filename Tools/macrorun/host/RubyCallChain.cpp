@@ -1,0 +1,23 @@
+// SPDX-License-Identifier: MIT
+#include "host/RubyCallChain.h"
+
+#include <oleauto.h>
+
+#include "platform/Encoding.h"
+
+// Active Scripting has no call for this, so the engine evaluates an expression. The frames after the
+// macro's top level belong to the macros that wait for it.
+std::string RubyCallChain(IActiveScriptParse& engine) {
+  constexpr wchar_t kExpression[] =
+      L"caller.grep(/\\Amacro:/).grep_v(/in `method_missing'\\z/).slice_after(/in `<compiled>'\\z/)"
+      L".first.to_a.first(20).join(\"\\n\").gsub(\"<compiled>'\", \"<main>'\")";
+  VARIANT chain;
+  VariantInit(&chain);
+  const HRESULT result = engine.ParseScriptText(kExpression, nullptr, nullptr, nullptr, 0, 0,
+                                                SCRIPTTEXT_ISEXPRESSION, &chain, nullptr);
+  std::string text;
+  if (SUCCEEDED(result) && chain.vt == VT_BSTR)
+    text = BytesOf(chain.bstrVal, SysStringLen(chain.bstrVal));
+  VariantClear(&chain);
+  return text;
+}
