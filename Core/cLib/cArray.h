@@ -42,6 +42,13 @@ class Array {
   // The element at `index`, null when the slot is empty or there is no such slot (not reported).
   T* At(i32 index) const { return HasSlot(index) && index < count ? items[index] : nullptr; }
 
+  // How many slots below the count hold an element.
+  u32 Occupied() const {
+    u32 occupied = 0;
+    for (i32 i = 0; i < count && HasSlot(i); ++i) occupied += items[i] != nullptr;
+    return occupied;
+  }
+
   // Adds `slots` empty slots. Reported, without effect: `slots` below 1, no memory.
   void Grow(i32 slots);
 

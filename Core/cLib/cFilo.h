@@ -2,7 +2,7 @@
 // FIFO: a history of fixed size, newest element first. Stack: an Array used last in, first out.
 //
 // Both hold pointers to heap objects of one class and own them unless told otherwise.
-// Broken preconditions are reported (source "cFilo"; a Stack without memory by its Array).
+// Broken preconditions and missing memory are reported (source "cFilo").
 // Threading: none; one thread at a time.
 #pragma once
 
@@ -120,9 +120,12 @@ class Stack {
   i32 Depth() const { return depth; }
   void SetOwnsElements(bool owns) { items.SetOwnsElements(owns); }
 
-  // False when there is no memory: the item is then still the caller's.
+  // False, and reported, when there is no memory: the item is then still the caller's.
   bool Push(T* item) {
-    if (items.SetAt(item, depth) < 0) return false;
+    if (items.SetAt(item, depth) < 0) {
+      REPORT_ASSERT("cFilo", "No memory for the slots");
+      return false;
+    }
     ++depth;
     return true;
   }

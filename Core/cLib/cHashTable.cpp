@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "cLib/cHashTable.h"
 
-#include <ctype.h>
 #include <string.h>
 
 #include "cLib/cCompat.h"
@@ -9,11 +8,6 @@
 
 static constexpr u32 kBucketCount = 211;
 static constexpr u32 kInitialHash = 42;
-
-// What RemoveWhileClearing works on: a walk's callback has no argument of its own. Deliberately one
-// pair for the process: one table is cleared at a time.
-static void (*clearingDeleter)(u32 value) = nullptr;
-static cHashTableBase* clearingTable = nullptr;
 
 // --- The hash ------------------------------------------------------------------------------------
 
@@ -48,8 +42,7 @@ static void Finish(u32& a, u32& b, u32& c) {
 static u32 Word(const char* bytes, u32 size, bool fold) {
   u32 word = 0;
   for (u32 i = 0; i < 4 && i < size; ++i) {
-    u32 byte = static_cast<u8>(bytes[i]);
-    if (fold) byte = static_cast<u32>(tolower(static_cast<int>(byte)));
+    const u32 byte = static_cast<u8>(fold ? FoldAscii(bytes[i]) : bytes[i]);
     word |= byte << (8 * i);
   }
   return word;
@@ -92,9 +85,14 @@ cHashTableBase::Entry** cHashTableBase::Bucket(const char* key) const {
   return &table.buckets[(hash & 0xFFFF) % table.bucketCount];
 }
 
+static bool IsSameKey(const char* a, const char* b) {
+  while (*a && FoldAscii(*a) == FoldAscii(*b)) ++a, ++b;
+  return FoldAscii(*a) == FoldAscii(*b);
+}
+
 cHashTableBase::Entry** cHashTableBase::Link(const char* key) const {
   Entry** link = Bucket(key);
-  while (link && *link && CompareIgnoringCase((*link)->key, key) != 0) link = &(*link)->next;
+  while (link && *link && !IsSameKey((*link)->key, key)) link = &(*link)->next;
   return link;
 }
 
@@ -158,19 +156,13 @@ void cHashTableBase::Walk(WalkCallback callback) const {
   }
 }
 
-void cHashTableBase::RemoveWhileClearing(const char* key, u32) {
-  // An element's destructor that clears another table resets both; nothing more is removed then.
-  if (!clearingTable) return;
-  const u32 value = clearingTable->Remove(key);
-  if (clearingDeleter) clearingDeleter(value);
-}
-
+// An entry leaves the table before its element is deleted.
 void cHashTableBase::ClearWith(Deleter deleter) {
-  clearingDeleter = deleter;
-  clearingTable = this;
-  Walk(RemoveWhileClearing);
-  clearingDeleter = nullptr;
-  clearingTable = nullptr;
+  for (u32 i = 0; i < table.bucketCount; ++i)
+    while (table.buckets[i]) {
+      const u32 value = Unlink(&table.buckets[i]);
+      if (deleter) deleter(value);
+    }
 }
 
 void cHashTableBase::CheckLayout() {

@@ -1,13 +1,12 @@
 // SPDX-License-Identifier: MIT
-// cHashTable: a map from text keys, compared without regard to case, to 32-bit values: pointers to
-// elements, or numbers. A value of 0 cannot be told from an absent key; a null key is the empty
-// key.
+// cHashTable: a map from text keys to 32-bit values: pointers to elements, or numbers. Keys that
+// differ only in the case of A to Z are the same key, in every locale. A value of 0 looks like an
+// absent key; a null key is the empty key.
 //
 // An owning table (the default) deletes its elements when it is cleared or destroyed, and only
 // then: a value that Insert replaces or Remove returns is the caller's. A table that found no
-// memory when it was made has no buckets and takes no entries. Threading: none. Clear passes
-// through process-wide state, so two tables must never be cleared at the same time: neither from
-// two threads nor from the destructor of an element.
+// memory when it was made has no buckets and takes no entries. Threading: none; one thread at a
+// time.
 #pragma once
 
 #include <stddef.h>
@@ -15,8 +14,7 @@
 #include "cLib/cSlots.h"
 #include "cLib/cTypes.h"
 
-// lookup3's byte-wise little-endian hash of `size` bytes; `fold` reads capitals
-// as small letters, by the C runtime's current locale as the comparison of keys does.
+// lookup3's byte-wise little-endian hash of `size` bytes; `fold` reads A to Z as small letters.
 u32 HashBytes(const char* bytes, u32 size, u32 initial, bool fold);
 
 class cHashTableBase {
@@ -66,7 +64,6 @@ class cHashTableBase {
   Entry** Link(const char* key) const;
   Entry** Bucket(const char* key) const;
   u32 Unlink(Entry** link);
-  static void RemoveWhileClearing(const char* key, u32 value);
   static void CheckLayout();
 
   Table table = {};

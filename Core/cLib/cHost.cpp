@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "cLib/cHost.h"
 
-static HostInterface* currentHost = nullptr;
+// Volatile: `kill` reads it on any thread, each time once.
+static HostInterface* volatile currentHost = nullptr;
 
 HostInterface* CurrentHost() { return currentHost; }
 

@@ -20,8 +20,7 @@ static const char* LevelName(int level) {
 
 // The local time without its line break, cut to the `size` bytes; empty when there is none.
 static void LocalTime(char* text, u32 size) {
-  const time_t now = time(nullptr);
-  const char* local = ctime(&now);
+  const char* local = LocalTimeText();
   snprintf(text, size, "%s", local ? local : "");
   text[strcspn(text, "\r\n")] = 0;
 }

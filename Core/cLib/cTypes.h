@@ -7,6 +7,7 @@
 
 using u8 = uint8_t;
 using u32 = uint32_t;
+using u64 = uint64_t;
 using i32 = int32_t;
 
 // 1 where the compiler lays out classes as the host editor does (32-bit Microsoft C++ ABI). The

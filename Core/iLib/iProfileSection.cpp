@@ -5,6 +5,7 @@
 #include <string.h>
 #include <windows.h>
 
+#include "cLib/cCompat.h"
 #include "iLib/iCodePage.h"
 #include "iLib/iProfile.h"
 
@@ -15,12 +16,10 @@ static bool IsBlank(char ch) { return ch == ' ' || ch == '\t'; }
 
 static bool IsQuote(char ch) { return ch == '"' || ch == '\''; }
 
-static char Lower(char ch) { return ch >= 'A' && ch <= 'Z' ? static_cast<char>(ch + 32) : ch; }
-
-// Of printable ASCII, in which case is nobody's locale's affair.
+// Both are printable ASCII, so the locale does not matter.
 static bool BeginsWith(const char* text, const char* beginning, u32 size) {
   u32 same = 0;
-  while (same < size && Lower(text[same]) == Lower(beginning[same])) ++same;
+  while (same < size && FoldAscii(text[same]) == FoldAscii(beginning[same])) ++same;
   return same == size;
 }
 
@@ -42,13 +41,15 @@ bool ProfileSection::Load() {
   const DWORD size = GetPrivateProfileSectionW(section, units, kEntriesSize, file);
   if (size >= kEntriesSize - 2) return false;
   for (DWORD i = 0; i < size; ++i) {
-    if (units[i] != 0 && (units[i] < ' ' || units[i] > '~')) return false;
+    // A question mark may replace bytes that are no character in a multi-byte code page.
+    if (units[i] != 0 && (units[i] < ' ' || units[i] > '~' || units[i] == '?')) return false;
     entries[i] = static_cast<char>(units[i]);
   }
   entries[size] = 0;  // the last one's terminator is counted
-  for (const char* entry = entries; *entry; entry += strlen(entry) + 1)
+  const char* entry = entries;
+  for (; *entry; entry += strlen(entry) + 1)
     if (IsBlank(*entry) || !strchr(entry, '=')) return false;
-  return true;
+  return entry == entries + size;  // an empty entry would hide those that follow it
 }
 
 // The first entry of a key counts, as it does for the functions.
@@ -67,23 +68,23 @@ ProfileSection::Answer ProfileSection::Find(const char* key, const char*& value)
   return Answer::kAbsent;
 }
 
-// A pair of quotes around the value is not part of it. False: what is there is the functions'
-// affair.
+// A pair of quotes around the value is not part of it; a lone quote is. False for unbalanced
+// quotes: the profile functions decide those.
 static bool Unquote(const char*& value, u32& size) {
-  if (!size || !IsQuote(value[0])) return true;
-  if (size < 2 || value[size - 1] != value[0]) return false;
+  if (size < 2 || !IsQuote(value[0])) return true;
+  if (value[size - 1] != value[0]) return false;
   ++value;
   size -= 2;
   return true;
 }
 
-// Whether the functions hand out this default as it is.
+// Whether the profile functions return this default unchanged.
 static bool IsPlainDefault(const char* text) {
   if (!text) return false;
   const u32 size = static_cast<u32>(strlen(text));
   for (u32 i = 0; i < size; ++i)
     if (static_cast<u8>(text[i]) >= 128) return false;
-  return size <= kLongestValue && !IsQuote(*text) && !EndsInBlank(text, size);
+  return size <= kLongestValue && (size == 1 || !IsQuote(*text)) && !EndsInBlank(text, size);
 }
 
 bool ProfileSection::ReadString(String& out, const char* key, const char* defaultText) const {

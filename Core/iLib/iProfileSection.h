@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
-// One section of a profile file, read in a single pass: each read of a key by the system's profile
-// functions opens the file anew. The values are those of Profile. What is not beyond doubt in the
-// section as a whole is left to those functions, key by key: characters that are not printable
-// ASCII, a section too long for the buffer, entries without a sign, values with blanks at their
-// ends or a quote at one end only. Threading: any thread.
+// One section of a profile file, read in a single pass: the system's profile functions open the file
+// for each key. The values are those of Profile. Whatever could differ is left to those functions,
+// key by key: question marks and characters that are not printable ASCII, a section too long for
+// the buffer, entries without a sign, values with blanks at their ends or unbalanced quotes.
+// Threading: any thread.
 #pragma once
 
 #include "cLib/cString.h"
@@ -24,7 +24,7 @@ class ProfileSection {
  private:
   static constexpr u32 kEntriesSize = 4096;
 
-  // What the section tells about a key.
+  // What the section holds for a key.
   enum class Answer { kUnknown, kAbsent, kValue };
   Answer Find(const char* key, const char*& value) const;
   bool Load();

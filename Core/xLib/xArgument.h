@@ -17,7 +17,7 @@ class xArgument {
 
   explicit xArgument(const char* value) : text(value) {}
   explicit xArgument(i32 value);
-  explicit xArgument(double value);
+  explicit xArgument(u64 bits);  // of a real, whose value is never loaded: see xArgument.cpp
 
   SLOTS_FROM(0);
   SLOT(0) ~xArgument() = default;
@@ -26,6 +26,9 @@ class xArgument {
   i32 integer = 0;  // a real's is truncated toward zero, -2147483648 when it does not fit
   double real = 0;
   String text;  // an integer's in decimal, a real's with six decimals
+
+ private:
+  xArgument(u64 bits, const struct RealParts& parts);
 };
 
 #if CORE_MICROSOFT_ABI

@@ -19,7 +19,7 @@ class xMacro {
   // The engine's own number for a function name: it has none.
   SLOT(0) u32 FunctionId(const char* /*name*/) { return kUnknownFunction; }
   // Interrupts the running script and unwinds to `execute`; does not return while one is armed.
-  // Only from within a call that the script made into the host.
+  // Only from within a call that the script made into the host; on another thread it is reported.
   SLOT(1) void Stop() = 0;
   SLOT(2) void Initialise() = 0;
   // Frees the engine.

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "xLib/xMacroWSH.h"
 
+#include "cLib/cReport.h"
 #include "cLib/cStop.h"
 #include "iLib/iGeneral.h"
 #include "xLib/xScriptExecutor.h"
@@ -54,7 +55,10 @@ i32 xMacroWSH::Run(const char* file) {
   // which must not be left with a pointer into a frame that is gone.
   xScriptExecutor* const running =
       new xScriptExecutor(info.GetLanguage(), info.IsFixCRLF(), info.IsFixDelimiter(), kSiteFlag);
-  if (!running) return -1;
+  if (!running) {
+    REPORT_ASSERT("cScript", "No memory for the script site");
+    return -1;
+  }
   site = running;
   i32 result = -1;
   if (running->IsReady()) result = running->Execute(file) ? 1 : 0;
@@ -64,9 +68,12 @@ i32 xMacroWSH::Run(const char* file) {
 }
 
 void xMacroWSH::Stop() {
-  if (site) site->Interrupt();
-  // Abandoned, not released: the frames that use it are about to be skipped.
-  site = nullptr;
+  // On another thread the run goes on, so nothing of it is touched.
+  if (!IsOtherThreadArmed()) {
+    if (site) site->Interrupt();
+    // Abandoned, not released: the frames that use it are about to be skipped.
+    site = nullptr;
+  }
   StopMacro();
 }
 

@@ -101,7 +101,7 @@ static xArgument* MakeArgument(Place place, VARIANT& value) {
     case VT_INT:
       return new (place) xArgument(i32{value.intVal});
     case VT_R8:
-      return new (place) xArgument(value.dblVal);
+      return new (place) xArgument(static_cast<u64>(value.ullVal));
     default:
       return MakeFromText(place, value);
   }

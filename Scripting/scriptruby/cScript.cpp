@@ -6,6 +6,7 @@
 #include <string.h>
 
 #include "MacroRuby.h"
+#include "cLib/cCompat.h"
 #include "cLib/cHost.h"
 #include "cLib/cReport.h"
 #include "cLib/cStop.h"
@@ -41,14 +42,6 @@ static void RunEngine(ExecuteCall& run) {
   run.result = run.engine->Run(run.file);
 }
 
-static HostContext& ContextOf(void* host) { return *static_cast<HostInterface*>(host)->Context(); }
-
-static void ForgetEngine(void* host) { ContextOf(host).engine = nullptr; }
-static void ClearArguments(void* host) { ContextOf(host).ArgumentList().Clear(); }
-static void ClearTexts(void* host) { ContextOf(host).ResultTexts().Clear(); }
-static void ForgetArguments(void* host) { ContextOf(host).ArgumentList().Forget(); }
-static void ForgetTexts(void* host) { ContextOf(host).ResultTexts().Forget(); }
-
 static void RestoreCaller(const ExecuteCall& run) {
   CurrentStopPoint() = run.previousStop;
   SetCurrentHost(run.previousHost);
@@ -57,9 +50,10 @@ static void RestoreCaller(const ExecuteCall& run) {
 static void FinishRun(ExecuteCall& run) {
   // From here on the run cannot be stopped: it is over.
   CurrentStopPoint().armed = false;
-  ClearArguments(run.host);
-  ClearTexts(run.host);
-  ForgetEngine(run.host);
+  HostContext& context = *run.host->Context();
+  context.ArgumentList().Clear();
+  context.ResultTexts().Clear();
+  context.engine = nullptr;
   if (run.engine) run.engine->Destroy();
   RestoreCaller(run);
 }
@@ -69,6 +63,7 @@ static void RunArmed(void* context) {
   ExecuteCall& run = *static_cast<ExecuteCall*>(context);
   StopPoint& stop = CurrentStopPoint();
   if (setjmp(stop.buffer) == 0) {
+    stop.thread = CurrentThread();
     stop.armed = true;
     RunEngine(run);
   } else {
@@ -105,14 +100,36 @@ static void ReportFault(void* context) {
   run.host->ReportMessage(text);
 }
 
-// Each failing try leaves one element fewer: it has left its list when its destructor faults. A
-// list that cannot be cleared is only emptied.
-static void ClearAfterFault(void (*clear)(void*), void (*forget)(void*), HostInterface* host) {
-  constexpr int kTries = 100;
-  for (int tries = 0; tries < kTries; ++tries)
-    if (RunGuarded(clear, host)) return;
-  RunGuarded(forget, host);
+static void ForgetEngine(void* host) {
+  static_cast<HostInterface*>(host)->Context()->engine = nullptr;
 }
+
+// One of the two lists of a host's record, after a fault: its elements may fault when deleted, and
+// it may be unreadable.
+template <auto list>
+struct FaultedList {
+  HostInterface* host;
+  u32 held;  // elements when last counted
+
+  static auto& ListOf(void* context) {
+    return (static_cast<FaultedList*>(context)->host->Context()->*list)();
+  }
+  static void ClearList(void* context) { ListOf(context).Clear(); }
+  static void Forget(void* context) { ListOf(context).Forget(); }
+  static void Count(void* context) {
+    static_cast<FaultedList*>(context)->held = ListOf(context).Occupied();
+  }
+
+  // An element leaves its list before its destructor runs. So a failed try is repeated as long as
+  // the tries before it have taken elements off; then the rest is abandoned.
+  void Clear() {
+    for (u32 before = kLargestSize; !RunGuarded(ClearList, this); before = held)
+      if (!RunGuarded(Count, this) || held >= before) {
+        RunGuarded(Forget, this);
+        return;
+      }
+  }
+};
 
 // After a fault nothing that the engine holds is trusted: it is leaked, on purpose. What the host
 // does on this path may fault again, so each step has its own guard; and it may not stop this run,
@@ -123,15 +140,19 @@ static void AbandonRun(ExecuteCall& run) {
   run.result = -1;
   RunGuarded(ReportFault, &run);
   RunGuarded(ForgetEngine, run.host);
-  ClearAfterFault(ClearArguments, ForgetArguments, run.host);
-  ClearAfterFault(ClearTexts, ForgetTexts, run.host);
+  FaultedList<&HostContext::ArgumentList>{run.host, 0}.Clear();
+  FaultedList<&HostContext::ResultTexts>{run.host, 0}.Clear();
   RestoreCaller(run);
+}
+
+static void ReportNoFile(void* host) {
+  static_cast<HostInterface*>(host)->ReportMessage("Unexpected internal macro execute error!");
 }
 
 i32 __stdcall execute(const char* file, HostInterface* host) {
   if (!host) return -1;
   if (!file) {
-    host->ReportMessage("Unexpected internal macro execute error!");
+    RunGuarded(ReportNoFile, host);
     return -1;
   }
   ExecuteCall run = {file, host, CurrentHost(), CurrentStopPoint(), nullptr, -1};
@@ -142,13 +163,26 @@ i32 __stdcall execute(const char* file, HostInterface* host) {
 
 // --- kill ----------------------------------------------------------------------------------------
 
-bool __stdcall kill(i32 value) {
+struct KillCall {
+  i32 value;
+  bool marked;
+};
+
+// Volatile: a host that polls the flag from another thread then finds its value.
+static void MarkRecord(void* context) {
+  KillCall& call = *static_cast<KillCall*>(context);
   HostInterface* host = CurrentHost();
-  HostContext* context = host ? host->Context() : nullptr;
-  if (!context) return false;
-  context->stopValue = value;  // first: a host that polls the flag then finds its value
-  context->stopRequested = 1;
-  return true;
+  volatile HostContext* record = host ? host->Context() : nullptr;
+  if (!record) return;
+  record->stopValue = call.value;
+  record->stopRequested = 1;
+  call.marked = true;
+}
+
+bool __stdcall kill(i32 value) {
+  KillCall call = {value, false};
+  RunGuarded(MarkRecord, &call);
+  return call.marked;
 }
 
 // --- version -------------------------------------------------------------------------------------
@@ -173,7 +207,24 @@ static bool FillRecord(ScriptInfoRecord* record, const char* hostPath) {
   return filled;
 }
 
-static bool FailVersion(const ScriptInfoRecord* record) {
+struct VersionCall {
+  ScriptInfoRecord* record;
+  const char* hostPath;
+  bool filled;
+};
+
+static void AnswerVersion(void* context) {
+  VersionCall& call = *static_cast<VersionCall*>(context);
+  ScriptInfoRecord* record = call.record;
+  if (!record || record->size != sizeof(ScriptInfoRecord)) return;
+  if (record->layoutVersion != 0 && record->layoutVersion != kScriptInfoRecordVersion)
+    ShowProblem(__LINE__, "Scripting size problems. This may cause problems!");
+  memset(record, 0, sizeof *record);
+  call.filled = FillRecord(record, call.hostPath);
+}
+
+static void FailVersion(void* context) {
+  const ScriptInfoRecord* record = static_cast<VersionCall*>(context)->record;
   char name[sizeof record->description] = "<Unknown>";
   if (record) {
     // What the caller left as its name; the record may be shorter than its layout.
@@ -184,15 +235,13 @@ static bool FailVersion(const ScriptInfoRecord* record) {
   String text;
   text.Format("Module: %s\n\nUnexpected internal macro version error!\n", name);
   ShowProblem(__LINE__, text.Text());
-  return false;
 }
 
 bool __stdcall version(ScriptInfoRecord* record, const char* hostPath) {
-  if (!record || record->size != sizeof(ScriptInfoRecord)) return FailVersion(record);
-  if (record->layoutVersion != 0 && record->layoutVersion != kScriptInfoRecordVersion)
-    ShowProblem(__LINE__, "Scripting size problems. This may cause problems!");
-  memset(record, 0, sizeof *record);
-  return FillRecord(record, hostPath) || FailVersion(record);
+  VersionCall call = {record, hostPath, false};
+  RunGuarded(AnswerVersion, &call);
+  if (!call.filled) RunGuarded(FailVersion, &call);
+  return call.filled;
 }
 
 // --- Load notification ---------------------------------------------------------------------------
@@ -215,8 +264,11 @@ extern "C" BOOL WINAPI DllMain(HINSTANCE module, DWORD reason, LPVOID) {
   }
   SetRunsInApplication(false);
   KeepModuleHandle(module);
+  // The mode is the process's: written only when a bit is missing, so that what other threads set
+  // in the meantime is kept.
   constexpr UINT kNoBoxes = SEM_FAILCRITICALERRORS | SEM_NOOPENFILEERRORBOX;
-  SetErrorMode(SetErrorMode(kNoBoxes) | kNoBoxes);
+  const UINT mode = GetErrorMode();
+  if ((mode & kNoBoxes) != kNoBoxes) SetErrorMode(mode | kNoBoxes);
   const HRESULT initialised =
       CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED | COINIT_DISABLE_OLE1DDE);
   const BOOL started = StartModule();

@@ -71,7 +71,7 @@ TEST_F(Reporter, TellsOfAStopWithoutARunAndJumpsWithItsValue) {
   EXPECT_EQ(TakeReports("Stop without a run to stop"), 1);
   const int value = setjmp(CurrentStopPoint().buffer);
   if (value == 0) {
-    CurrentStopPoint().armed = true;
+    CurrentStopPoint().thread = CurrentThread(), CurrentStopPoint().armed = true;
     StopMacro();
   }
   CurrentStopPoint().armed = false;

@@ -48,8 +48,8 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"\1a\2\1b", [](String& s) { s.RemoveControlChars(); }, "ab"},
       {"a \t b  \xE9\1", [](String& s) { s.CollapseBlanks(), s.RemoveControlChars(); }, "a b "},
       {"bbca", [](String& s) { s.XorChars('a'), s.AddToChars(0xFF); }, "\2\2\1`"},
-      {"x", [](String& s) { s.FromLatin1ToUtf8("\xE9\x7F\x80\xFF", 3); },
-       "\xC3\xA9\x7F\xC2\x80", 35, 4},
+      {"x", [](String& s) { s.FromLatin1ToUtf8("\xE9\x7F\x80\xFF", 3); }, "\xC3\xA9\x7F\xC2\x80",
+       35, 4},
       {"abcd", [](String& s) { s = s.Mid(1, UINT_MAX) + s.MidFrom(3).Text(); }, "bcdd"},
       {"abc", [](String& s) { s.Format("%s", ""); }, "", 8, 4},
       {"abc", [](String& s) { s.Format(kNull, 0); }, "...."},
@@ -71,6 +71,22 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       {"abc", [](String& s) { s.Reserve(UINT_MAX - 9), s.EmptyReserve(UINT_MAX - 9); }, "abc", 8,
        4},
       {"abc", [](String& s) { s = String("x", UINT_MAX) + String('x', UINT_MAX - 5).Text(); }, ""},
+      // A null argument is an empty text or changes nothing.
+      {"abc", [](String& s) { s.Assign(kNull); }, ""},
+      {"abc", [](String& s) { s = kNull; }, ""},
+      {"abc", [](String& s) { s.Append(kNull), s.Append(kNull, 0), s.Insert(kNull, 0); }, "abc"},
+      {"abc", [](String& s) { EXPECT_FALSE(s.Equals(kNull, true) || s.EndsWith(kNull, true)); },
+       "abc"},
+      {"abc", [](String& s) { EXPECT_EQ(s.FindReverse(kNull, 0, true), -1); }, "abc"},
+      {"abc", [](String& s) { EXPECT_FALSE(s.ReplaceFirstWithChar(kNull, 'x', 0)); }, "abc"},
+      {"abc", [](String& s) { EXPECT_FALSE(s.Substitute(kNull, "x") || s.Substitute("a", kNull)); },
+       "abc"},
+      {"abc", [](String& s) { EXPECT_EQ(s.ReplaceAll(kNull, "x") + s.ReplaceAll("a", kNull), 0u); },
+       "abc"},
+      {"abc", [](String& s) { s.FromLatin1ToUtf8(kNull), s.Append("x"); }, "x"},
+      {"abc", [](String& s) { s.FromLatin1ToUtf8(kNull, 7), s.Append("x"); }, "x"},
+      {"abc", [](String& s) { s = String(kNull, 5) + kNull; }, ""},
+      {"", [](String& s) { EXPECT_FALSE(s.Equals(kNull, true)); }, ""},
   };
   for (const auto& [start, change, text, capacity, growBy, reports] : cases) {
     String string(start.c_str());

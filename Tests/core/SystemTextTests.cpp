@@ -8,8 +8,11 @@
 #include <cstdlib>
 #include <fstream>
 
-#include "../MessageBoxes.h"
+#include "../module/Imports.h"
 #include "TestSupport.h"
+#include "cLib/cFilo.h"
+#include "cLib/cReport.h"
+#include "cLib/cStop.h"
 #include "iLib/iClipboard.h"
 #include "iLib/iCodePage.h"
 #include "iLib/iModule.h"
@@ -20,13 +23,15 @@
 
 using SystemText = CoreTest;
 
+static int breaks = 0;
+
 TEST_F(SystemText, LoadsResources) {
   const Text missing = "Unexpected error loading '77' string resource";
   String text("old");
   KeepModuleHandle(nullptr);
-  EXPECT_FALSE(IsInModule(&onBox));
+  EXPECT_FALSE(IsInModule(&breaks));
   KeepModuleHandle(GetModuleHandleA(nullptr));
-  EXPECT_TRUE(IsInModule(&onBox) && !IsInModule(&text));
+  EXPECT_TRUE(IsInModule(&breaks) && !IsInModule(&text));
   EXPECT_EQ(Bytes(String(1u, "file", 3)), "file has 3 lines");
   EXPECT_TRUE(String(2u).Length() == 1023 && String(77u).IsEmpty() && Bytes(String(3u)) == "x");
   EXPECT_EQ(String(77u).Capacity(), 5u) << "nothing to format";
@@ -86,12 +91,8 @@ TEST_F(SystemText, Converts) {
   for (const u32 n : {4095u, 4096u})
     EXPECT_EQ(String(std::wstring(n, 'x').c_str(), 1252).Length(), n == 4095 ? n : 0);
   EXPECT_EQ(ActiveCodePage(), kUtf8CodePage);
-  text.FromWide(wide.c_str());
-  EXPECT_EQ(Bytes(text), Bytes(String(wide.c_str(), CP_ACP)));
   SetActiveCodePageFromKeyboard();
   EXPECT_EQ(ActiveCodePage(), GetACP());  // Wine takes both from the user's locale
-  text.FromWide(wide.c_str(), 2);
-  EXPECT_EQ(Bytes(text), Bytes(String(L"a\u00E9", ActiveCodePage())));
   text = "hELLO wORLD-foo 3D x", text.CapitalizeWords();
   EXPECT_EQ(Bytes(text), "Hello World-Foo 3d X");
   for (const int size : {1, 2})
@@ -145,7 +146,6 @@ TEST_F(SystemText, ReadsTheClipboard) {
 
 // --- The application and the description file ----------------------------------------------------
 
-static int breaks = 0;
 static LONG CALLBACK SkipBreak(EXCEPTION_POINTERS* fault) {
   if (fault->ExceptionRecord->ExceptionCode != EXCEPTION_BREAKPOINT)
     return EXCEPTION_CONTINUE_SEARCH;
@@ -153,69 +153,95 @@ static LONG CALLBACK SkipBreak(EXCEPTION_POINTERS* fault) {
   return EXCEPTION_CONTINUE_EXECUTION;
 }
 
+static Text shown;  // boxes and written keys
+static int WINAPI Box(HWND owner, LPCSTR text, LPCSTR caption, UINT flags) {
+  shown += Text(owner ? "owned " : "") + caption + " " + std::to_string(flags) + ": " + text + "\n";
+  if (flags & MB_YESNO) EXPECT_FALSE(AskBreakIntoDebugger("again", 1));
+  return IDYES;
+}
+
 TEST_F(SystemText, AsksAboutFailedChecks) {
+  const Replacement box(GetModuleHandleA(nullptr), "MessageBoxA", Box);
   for (const bool runs : {true, false})
     EXPECT_EQ((SetRunsInApplication(runs), RunsInApplication()), runs);
-  Text boxes;
-  onBox = [&](const Text& box) {
-    boxes += box + "\n";
-    if (box[0] == 'b') EXPECT_FALSE(AskBreakIntoDebugger("again", 1));
-  };
   PostQuitMessage(42);
-  EXPECT_FALSE(AskBreakIntoDebugger("a.cpp", 7));
+  EXPECT_TRUE(AskBreakIntoDebugger("a.cpp", 7));
   MSG quit = {};
   EXPECT_TRUE(PeekMessageA(&quit, nullptr, WM_QUIT, WM_QUIT, PM_REMOVE) && quit.wParam == 42);
   VerifyMainApplication(&quit, "b.cpp", 8);
+  SetMainWindow(GetDesktopWindow());
+  void* const debugger = AddVectoredExceptionHandler(1, SkipBreak);
   VerifyMainApplication(nullptr, "b.cpp", 8);
+  RemoveVectoredExceptionHandler(debugger);
+  SetMainWindow(nullptr);
+  EXPECT_EQ(breaks, 1);
+  const Text flags = std::to_string(MB_YESNO | MB_ICONWARNING | MB_TASKMODAL | MB_SETFOREGROUND);
   const Text question = "\nDo you wish to attempt to break into the debugger?\n";
   const Text failure = "No main application object has been defined!";
-  EXPECT_EQ(boxes, "box Assertion Failed: ASSERT: File a.cpp, Line 7" + question +
-                       "box Assertion Failed: ASSERT: File b.cpp, Line 8" + question +
-                       "stop box Exception: " + failure + "\n");
+  EXPECT_EQ(std::exchange(shown, ""), "Assertion Failed " + flags + ": ASSERT: File a.cpp, Line 7" +
+                                          question + "owned Assertion Failed " + flags +
+                                          ": ASSERT: File b.cpp, Line 8" + question +
+                                          "Exception 16: " + failure + "\n");
   EXPECT_EQ(TakeReports("\"b.cpp\" (8)      " + failure), 1);
-  boxAnswer = IDYES;
-  void* const debugger = AddVectoredExceptionHandler(1, SkipBreak);
-  VerifyMainApplication(nullptr, "c.cpp", 9);
-  RemoveVectoredExceptionHandler(debugger);
-  boxAnswer = IDNO;
-  EXPECT_EQ(breaks, 1);
 }
 
-TEST_F(SystemText, WritesAndReadsTheDescription) {
+static Text failing;  // the key that cannot be written
+static BOOL WINAPI WriteKey(LPCSTR section, LPCSTR key, LPCSTR text, LPCSTR) {
+  shown += section + Text(".") + key + "=" + text + "|";
+  return key != failing;
+}
+
+TEST_F(SystemText, WritesTheDescription) {
+  const Replacement write(GetModuleHandleA(nullptr), "WritePrivateProfileStringA", WriteKey);
+  Profile profile("?:\\no\\x.ini");
+  xScriptInfo info(true);
+  info.UnescapeTemplates(), info.NoCase = info.FixDelimiter = true;
+  for (const char* key : {"", "FixCRLF", "FixDelimiter"}) {
+    shown.clear(), failing = key;
+    EXPECT_EQ(info.Write(profile), failing != "FixDelimiter") << "the last write's result";
+    EXPECT_EQ(shown, R"(Options.Language=Object Rexx|Options.Extension=rex|)"
+                     "Options.MacroBegin=function key_macro()\n{|"
+                     "Options.MacroEnd=}\n\nkey_macro()   // run the macro|"
+                     "Options.FunctionPrint=\twrite(\"%s\")|Options.FunctionPrefix=|"
+                     R"(Options.FunctionPostfix=;|Options.Enter=\n|Options.CRLF=\\n|)"
+                     R"(Options.LineFeed=\\r|Options.Tick='|Options.Quote=\"|)"
+                     "Options.FixCRLF=0|Options.FixDelimiter=1|");
+  }
+  shown.clear();
+}
+
+TEST_F(SystemText, ReadsTheDescriptionWithAnyDefaults) {
   const Text path = testing::TempDir() + "core-description.ini";
-  Profile profile(path.c_str()), impossible("?:\\no\\x.ini");
-  xScriptInfo defaults(true), info(false), again(false);
-  info.NoCase = info.FixCRLF = info.FixDelimiter = true, info.FunctionPrefix = "x";
-  info.SetDefaults();
-  EXPECT_FALSE(info.IsNoCase() || info.IsFixCRLF() || info.IsFixDelimiter());
-  EXPECT_TRUE(info.OpenBracket == '(' && info.CloseBracket == ')' && info.FunctionPrefix.IsEmpty());
-  EXPECT_STREQ(info.Description.Text(), "Object Rexx WSH Version 1.40");
-  EXPECT_FALSE(again.IsNoCase() || again.IsFixCRLF() || again.IsFixDelimiter());
-  EXPECT_TRUE(!again.OpenBracket && !again.CloseBracket);
-  profile.WriteString("1", "Options", "NoCase");
-  info.Read(profile, defaults);
-  EXPECT_TRUE(info.IsNoCase() && !defaults.IsNoCase());
-  info.FixCRLF = true;
-  EXPECT_TRUE(info.Write(profile) && !info.Write(impossible));
-  again.Read(profile, xScriptInfo(false));
-  EXPECT_TRUE(again.FixCRLF && !again.FixDelimiter);
-  Text texts;  // a real line feed ends a value in the file
-  for (const auto each :
-       {&xScriptInfo::Extension, &xScriptInfo::MacroBegin, &xScriptInfo::MacroEnd,
-        &xScriptInfo::FunctionPrint, &xScriptInfo::FunctionPostfix, &xScriptInfo::Enter,
-        &xScriptInfo::CRLF, &xScriptInfo::LineFeed, &xScriptInfo::Tick, &xScriptInfo::Quote})
-    texts += Bytes(again.*each) + "|";
-  EXPECT_EQ(texts, R"(rex|function key_macro()|}|write("%s")|;|\n|\\n|\\r|'|\"|)");
+  Profile profile(path.c_str());
+  DeleteFileA(path.c_str());
+  xScriptInfo defaults(false), info(true);
+  EXPECT_FALSE(defaults.NoCase || defaults.FixCRLF || defaults.FixDelimiter);
+  EXPECT_TRUE(!defaults.OpenBracket && !defaults.CloseBracket && defaults.Tick.IsEmpty());
+  defaults.NoCase = defaults.FixCRLF = defaults.FixDelimiter = true;
+  defaults.OpenBracket = '<', defaults.CloseBracket = '>', defaults.Description = "any";
+  for (const char* value : {"", "'", "\"q\"", "d ", " d\t", "line\n", "\\t\xE9", "?"}) {
+    defaults.MacroEnd = defaults.Tick = value;
+    info.Read(profile, defaults);
+    String expected;
+    profile.ReadString(expected, "Options", "Tick", value, false);
+    EXPECT_EQ(Bytes(info.Tick), Bytes(expected));
+    info.Unescape(expected);
+    EXPECT_EQ(Bytes(info.MacroEnd), Bytes(expected));
+    EXPECT_TRUE(info.NoCase && info.FixCRLF && info.FixDelimiter && info.Language.IsEmpty());
+    EXPECT_EQ(Bytes(info.Description) + info.OpenBracket + info.CloseBracket, "any<>");
+  }
+  info.NoCase = true, info.FunctionPrefix = "x", info.SetDefaults();
+  EXPECT_FALSE(info.NoCase || info.FixCRLF || info.FixDelimiter);
+  EXPECT_EQ(
+      Bytes(info.Description) + info.OpenBracket + info.CloseBracket + Bytes(info.FunctionPrefix),
+      "Object Rexx WSH Version 1.40()");
   String value;
-  for (const char* expected : {"function key_macro()", "none"}) {  // up to the real line feed
-    EXPECT_TRUE(profile.ReadString(value, "Options", "MacroBegin", "none", true));
-    EXPECT_EQ(Bytes(value), expected) << "the key is removed by the first";
+  profile.WriteString("old", "Options", "Key");
+  for (const char* expected : {"old", "none"}) {
+    EXPECT_TRUE(profile.ReadString(value, "Options", "Key", "none", true));
+    EXPECT_EQ(Bytes(value), expected) << "the first one removes the key";
   }
   EXPECT_FALSE(profile.ReadString(value, "Options", "Nothing", "", false));
-  profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick");
-  profile.ReadString(value, "Options", "Tick", "", false);
-  EXPECT_EQ(value.Length(), 511u);
-  DeleteFileA(path.c_str());  // the line behind a line feed sends every value to the functions
   for (const u32 n : {511u, 512u}) {
     profile.WriteString(Text(n, 'x').c_str(), "Options", "Tick");
     ProfileSection(profile, "Options").ReadString(value, "Tick", "");
@@ -228,9 +254,26 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
   std::ofstream(path) << "[Options]\na=\nT\nT=x\n";
   EXPECT_FALSE(ProfileSection(profile, "Options").ReadString(value, "T", "")) << "T has no sign";
   EXPECT_FALSE(ProfileSection(profile, "Options").ReadString(value, "None", nullptr));
-  EXPECT_TRUE(profile.WriteString(Text(600, 'x').c_str(), "Options", "Tick"));
-  EXPECT_TRUE(profile.ReadString(value, "Options", "Tick", "", false));
-  EXPECT_EQ(value.Length(), 511u);
+  DeleteFileA(path.c_str());
+}
+
+// What each unit reports: level and source; the line is the real one but for one.
+TEST_F(SystemText, ReportsWithLevelSourceAndLine) {
+  const Text path = testing::TempDir() + "core-levels-" + std::to_string(GetCurrentProcessId());
+  Array<Element> array;
+  SetLogFile(path.c_str());
+  array.Grow(0), String("a").Reserve(0), String().LoadResource(77), FIFO<Element>(0);
+  StopMacro();
+  SetLogFile(nullptr);
+  Text log, line;
+  for (std::ifstream file(path); std::getline(file, line);) {
+    const size_t number = line.find(" (") + 2;
+    EXPECT_GT(atoi(line.c_str() + number), 20) << line;
+    log += line.substr(27, number - 29) + "|";
+  }
+  EXPECT_EQ(log,
+            "ASSERT    \"cArray\"|ASSERT    \"cString\"|TRACE     \"cString\"|"
+            "ASSERT    \"cFilo\"|ASSERT    \"cScript\"|");
   DeleteFileA(path.c_str());
 }
 
@@ -239,13 +282,13 @@ TEST_F(SystemText, WritesAndReadsTheDescription) {
 TEST_F(SystemText, ReadsASectionAsTheProfileFunctionsDo) {
   const std::vector<Text> keys = {"Tick", "tICK", "Tic", "Ticks", "Fix",
                                   "T",    "AZ",   "az",  "\xC4",  "T\xC9k"};
-  const std::vector<Text> pieces = {"\"", "'",     "\"a\"",       " ",    "  ",        "\t",
-                                    "=",  ";",     "x",           "0",    "1",         "-1",
-                                    "7",  "\\n",   "00",          "\x80", "\xE9",      "]",
-                                    "[",  "Tick=", "12345678901", "yes",  "4294967296"};
+  const std::vector<Text> pieces = {"\"", "'",     "\"a\"",       " ",    "  ",         "\t",
+                                    "=",  ";",     "x",           "0",    "1",          "-1",
+                                    "7",  "\\n",   "00",          "\x80", "\xE9",       "]",
+                                    "[",  "Tick=", "12345678901", "yes",  "4294967296", "?"};
   const std::vector<Text> tame = {"x", "'", "\"", "0", "12", " ", "=", ";", "a b"};
   const std::vector<Text> ends = {"\r\n", "\n", "\r\n\r\n", " \r\n"};
-  const std::vector<Text> defaults = {"",       "d",    "d ",    " d\t",
+  const std::vector<Text> defaults = {"",       "d",    "d ",    " d\t",        "'",
                                       "line\n", "\xE9", "\"q\"", Text(600, 'x')};
   const auto any = [&](const std::vector<Text>& list) { return list[Below(list.size())]; };
   bool wild = false;

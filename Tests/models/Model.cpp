@@ -40,11 +40,6 @@ std::string AnyText(Input& input, u32 longest) {
   return text;
 }
 
-std::string AnyBytes(Input& input, size_t longest) {
-  const std::string bytes = input.ConsumeRandomLengthString(longest);
-  return bytes.substr(0, bytes.find('\0'));
-}
-
 int AnyPlace(Input& input, size_t size) {
   static constexpr int kExtremes[] = {-1, INT32_MIN, INT32_MAX};
   const u32 choice = Below(input, 65536);

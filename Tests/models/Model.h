@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: MIT
-// Plain models of what the portable base does, and a program of random steps for each: the class under
-// test goes through the same steps as its model, and the two are compared after each one. The steps
-// are read from any bytes: the fuzz targets choose those by coverage, and core_tests at random for all
-// models but those of log lines and escapes.
+// A plain model of Array and one of String, each with a program of random steps: the class under test
+// takes the same steps as its model, and the two are compared after each one. The steps are read from
+// any bytes: the fuzz targets choose those by coverage, core_tests at random.
 //
 // Each returns the number of steps. Threading: one thread at a time.
 #pragma once
@@ -17,17 +16,12 @@
 using Input = FuzzedDataProvider;
 
 size_t ArrayModel(Input& input);
-size_t FiloModel(Input& input);
-size_t HashTableModel(Input& input);
-size_t LogLineModel(Input& input);
 size_t StringModel(Input& input);
-size_t TokenizerModel(Input& input);
-size_t UnescapeModel(Input& input);
 
 // Each program has its own way to fail.
 [[noreturn]] void ModelFailed(const char* file, int line, const char* condition);
-#define CHECK(condition)                                          \
-  do {                                                            \
+#define CHECK(condition)                                           \
+  do {                                                             \
     if (!(condition)) ModelFailed(__FILE__, __LINE__, #condition); \
   } while (false)
 
@@ -52,6 +46,5 @@ inline u32 Below(Input& input, u32 limit) { return input.ConsumeIntegralInRange(
 // Without zero bytes; mostly characters that mean something to somebody, or whatever comes.
 char AnyCharacter(Input& input);
 std::string AnyText(Input& input, u32 longest = 16);
-std::string AnyBytes(Input& input, size_t longest);
 // One of `size` places, one near them, or an extreme one.
 int AnyPlace(Input& input, size_t size);

@@ -67,8 +67,9 @@ HRESULT __stdcall ParseScriptText(void*, LPCOLESTR code, int item, int context, 
     if (FAILED(outcome)) *text = SysAllocString(L"text");
   return outcome;
 }
+}  // namespace
 
-HRESULT __stdcall CreateInstance(void*, IUnknown*, REFIID riid, void** object) {
+HRESULT __stdcall CreateFakeEngine(void*, IUnknown*, REFIID riid, void** object) {
   static auto script =
       Table(QueryInterface, AddRef, Release, SetScriptSite, Unused, SetScriptState, Unused, Unused,
             AddNamedItem, Unused, Unused, Unused, Unused, Unused, InterruptScriptThread, Unused);
@@ -78,10 +79,8 @@ HRESULT __stdcall CreateInstance(void*, IUnknown*, REFIID riid, void** object) {
   engines.push_back({script.data(), parser.data(), nullptr});
   return QueryInterface(&engines.back(), riid, object);
 }
-}  // namespace
-
 void RegisterFakeEngine() {
-  static auto table = Table(QueryInterface, AddRef, Release, CreateInstance, Unused);
+  static auto table = Table(QueryInterface, AddRef, Release, CreateFakeEngine, Unused);
   static void** factory = table.data();
   CLSID classId;
   DWORD cookie;

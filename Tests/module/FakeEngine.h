@@ -20,6 +20,7 @@ inline IActiveScriptSite* site = nullptr;       // of the engine whose script is
 inline int engineReferences = 0;                // to all engines
 
 void RegisterFakeEngine();  // needs an initialised apartment
+HRESULT __stdcall CreateFakeEngine(void*, IUnknown*, REFIID riid, void** object);
 
 // The `tarn` object as an engine gets it from the site.
 IDispatch* Item();

@@ -42,6 +42,7 @@ inline void WriteBytes(const std::string& path, const std::string& bytes) {
 }
 
 inline std::string transcript;  // of the running test
+std::string ModuleLog();        // what the module has written to its log since the test began
 
 class ModuleTest : public testing::Test {
  protected:

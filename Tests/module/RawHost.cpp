@@ -8,19 +8,25 @@
 using namespace std::string_literals;
 
 namespace {
-constexpr unsigned char kGuard = 0xA5;  // what stands behind the record's 71 bytes
-constexpr int kSize = 71, kTexts = 31, kArguments = 51;
+constexpr unsigned char kGuard = 0xA5;  // fills what follows the record's 71 bytes
+constexpr int kSize = 71, kSlots = 600;
+constexpr int kArguments = RawHost::kArguments;
 // Of a list, and of a string.
 constexpr int kCapacity = 4, kCount = 8, kOwns = 12, kItems = 16, kText = 8;
 
 void* THISCALL Context(RawHost* host) { return host->noContext ? nullptr : host->context; }
-void THISCALL Report(RawHost*, const char* text) { Log("report: "s + text); }
-void Trace(RawHost*, const char* format, const char* text) {
-  Log("trace: "s + (format == "Debug: %s\n"s ? text : format));
+void THISCALL Report(RawHost* host, const char* text) { Log("report: "s + text + host->name); }
+void Trace(RawHost* host, const char* format, const char* text) {
+  Log("trace: "s + (format == "Debug: %s\n"s ? text : format) + host->name);
 }
-void THISCALL SetFixCRLF(RawHost*, char on) { Log("fix CRLF " + std::to_string(on)); }
-void THISCALL SetFixDelimiter(RawHost*, char on) { Log("fix delimiter " + std::to_string(on)); }
-unsigned THISCALL FunctionId(RawHost*, const char* name) {
+void THISCALL SetFixCRLF(RawHost* host, char on) {
+  Log("fix CRLF " + std::to_string(on) + host->name);
+}
+void THISCALL SetFixDelimiter(RawHost* host, char on) {
+  Log("fix delimiter " + std::to_string(on) + host->name);
+}
+unsigned THISCALL FunctionId(RawHost* host, const char* name) {
+  if (!host->name.empty()) Log("function id of "s + name + host->name);
   return name == "f"s ? 7 : name == "g"s ? 0 : name == "write"s ? 9 : 2000;
 }
 void* THISCALL WindowHandle(RawHost*) { return reinterpret_cast<void*>(0x1234); }
@@ -33,7 +39,7 @@ void THISCALL CallFunction(RawHost* host, unsigned id) {
                   At<int>(argument, 12), At<double>(argument, 16));
     line += numbers + ("\""s + At<char*>(argument, 24 + kText) + "\"");
   }
-  Log(line);
+  Log(line + host->name);
 }
 
 void* THISCALL DeleteText(char* text, unsigned flags) {
@@ -49,13 +55,13 @@ std::vector<void*> hostTable =
           WindowHandle, Unused, Unused, CallFunction);
 }  // namespace
 
-RawHost::RawHost() : table(hostTable.data()) {
+RawHost::RawHost(const std::string& hostName) : table(hostTable.data()), name(hostName) {
   std::memset(context + kSize, kGuard, sizeof context - kSize);
   context[8] = 0xEE;
   for (int list : {kTexts, kArguments}) {
     // The module sees one slot, so that it has to make the list of arguments grow.
     At<unsigned>(context, list + kCapacity) = At<unsigned>(context, list + kOwns) = 1;
-    At<void*>(context, list + kItems) = std::calloc(8, sizeof(void*));
+    At<void*>(context, list + kItems) = std::calloc(kSlots, sizeof(void*));
   }
 }
 
@@ -76,8 +82,19 @@ void RawHost::AnswerTexts(const std::vector<std::string>& texts, unsigned result
     void* element = std::calloc(1, 24);
     At<void**>(element, 0) = textTable.data();
     At<char*>(element, kText) = strdup(text.c_str());
-    At<void**>(context, kTexts + kItems)[At<int>(context, kTexts + kCount)++] = element;
-    At<int>(context, kTexts + kCapacity) = At<int>(context, kTexts + kCount);
+    Append(kTexts, element);
     ++liveTexts;
   }
+}
+
+void RawHost::Append(int list, void* element) {
+  const int place = At<int>(context, list + kCount)++;
+  At<void**>(context, list + kItems)[place] = element;
+  if (At<int>(context, list + kCapacity) <= place) At<int>(context, list + kCapacity) = place + 1;
+}
+
+std::string RawHost::State() {
+  return (Engine() ? "engine, " : "no engine, ") +
+         std::to_string(At<int>(context, kArguments + kCount)) + " arguments, " +
+         std::to_string(At<int>(context, kTexts + kCount)) + " texts" + name;
 }

@@ -32,17 +32,23 @@ std::vector<void*> Table(Functions*... functions) {
 inline void THISCALL Unused() { Log("an unused slot was called"); }
 
 // Its address is the host interface's: the table comes first. It knows two macro functions, f and
-// g, by the numbers 7 and 0, and the write of keyboard macros, 9.
+// g, by the numbers 7 and 0, and the write of keyboard macros, 9. What it logs ends in its name.
 struct RawHost {
-  RawHost();
+  explicit RawHost(const std::string& name = "");
   ~RawHost();
   void*& Engine() { return At<void*>(context, 18); }
-  // Leaves text results as the host does: at most eight, whose deletion is counted.
+  // Leaves text results as the host does, whose deletion is counted.
   void AnswerTexts(const std::vector<std::string>& texts, unsigned resultKind = 1);
-  // Whether the record is as `execute` must leave it, and nothing behind it was written.
+  // Appends an element of one of the two lists, at these offsets of the record.
+  static constexpr int kTexts = 31, kArguments = 51;
+  void Append(int list, void* element);
+  // Whether the record is as `execute` must leave it, and nothing after it was written.
   bool IsClean();
+  // What is left of a run: the engine and how many elements.
+  std::string State();
 
   void** table;
+  std::string name;
   bool noContext = false;
   unsigned char context[128] = {};
 };

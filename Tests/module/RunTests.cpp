@@ -40,6 +40,8 @@ TEST_F(RunTest, StepsThatFailAndDescriptions) {
       Log("--- "s + step + " answers " + Hex(result));
       results = {{step, result}}, Run();
     }
+  results = {{"SetScriptState 2", HRESULT_FROM_WIN32(ERROR_BAD_EXE_FORMAT)}};
+  Log("--- a reason that wants a name"), Run();
   results.clear();
   const std::string js = "Language=JScript\r\n";
   for (const std::string& lines :
@@ -73,16 +75,53 @@ TEST_F(RunTest, StopsUnwindToTheInnermostRun) {
   }
 }
 
-TEST_F(RunTest, NestedRunsRestoreTheirCaller) {
-  RawHost inner;
-  bool nested = false;
-  on["call 7"] = [&] {
-    if (std::exchange(nested, true)) return;
+// While the site is made, while it runs and while it goes; the next run is right.
+TEST_F(RunTest, StopsAroundTheScript) {
+  for (const char* step : {"engine: SetScriptSite", "engine: ParseScriptText",
+                           "engine: SetScriptState 4", "trace: Script object"}) {
+    Log("--- at "s + step);
+    on[step] = [&] { Stop(host.Engine()); };
+    Run();
+    on.erase(step);
+    muted = true;
+    EXPECT_EQ(1, Run());
+    muted = false;
+  }
+}
+
+// The `tarn` of one host's run, used there, inside of another host's run and after a stop: it traces
+// and reports to the host that it was made for, and asks and calls the current one.
+TEST_F(RunTest, NestedRunsAndTheirHosts) {
+  RawHost inner(" [inner]");
+  host.name = " [outer]";
+  IDispatch* tarn = nullptr;
+  const auto use = [&](const char* when) {
+    Log("--- the outer tarn "s + when);
+    std::wstring known = L"g", unknown = L"unknown";
+    LPOLESTR names[] = {known.data(), unknown.data()};
+    DISPID ids[2];
+    DISPPARAMS none = {};
+    tarn->GetTypeInfo(0, 0, nullptr);
+    const HRESULT found = tarn->GetIDsOfNames(IID_NULL, names, 2, 0, ids);
+    const HRESULT called = tarn->Invoke(0, IID_NULL, 0, 1, &none, nullptr, nullptr, nullptr);
+    Log("answers " + Hex(found) + ", " + Hex(called));
+  };
+  const auto nest = [&](const char* when) {
+    on["call 7"] = [&] { use(when); };
     EXPECT_EQ(1, ExecuteFor(&inner, macroPath.c_str()));
-    EXPECT_TRUE(inner.IsClean() && host.Engine()) << "another host's record is its own";
-    Call(L"g");
+    EXPECT_TRUE(inner.IsClean());
+  };
+  on["call 7"] = [&] {
+    tarn = Item();
+    nest("inside of an inner run");
+    EXPECT_TRUE(host.Engine()) << "another host's record is separate";
+    use("after the inner run");
   };
   Run();
+  on["call 7"] = [&] { tarn = Item(), Stop(host.Engine()); };
+  Run();
+  use("after a stop");
+  nest("in a run after a stop");
 }
 
 TEST_F(RunTest, MacroFiles) {

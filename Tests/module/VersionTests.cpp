@@ -15,12 +15,14 @@ static bool Fill(unsigned size = 392, unsigned layout = 77, unsigned bytes = 392
                  const std::string& path = "", HMODULE module = dll) {
   static void* const pages = VirtualAlloc(nullptr, 8192, MEM_RESERVE, PAGE_NOACCESS);
   VirtualAlloc(pages, 4096, MEM_COMMIT, PAGE_READWRITE);
-  char* const record = static_cast<char*>(pages) + 4096 - bytes;
-  memset(record, 'x', bytes);
+  char* const page = static_cast<char*>(pages);
+  char* const record = page + 4096 - bytes;
+  memset(page, 'x', 4096);
   memcpy(record, &size, 4);
   if (bytes >= 8) memcpy(record + 4, &layout, 4);
   const bool filled = CallExport<bool>(module, "version", record, path.c_str());
   Log(filled ? "version filled the record" : "version failed");
+  EXPECT_EQ(std::string(4096 - bytes, 'x'), std::string(page, record)) << "written before it";
   for (unsigned i = 0; filled && i < bytes; ++i)
     if (record[i] && (i == 0 || !record[i - 1]))
       Log("  " + std::to_string(i) + ": " +
@@ -45,6 +47,7 @@ TEST_F(VersionTest, HeadersAndHostFolders) {
   muted = false;
   Fill(393);
   Fill(0, 77, 4);
+  Fill(392, 77, 100);  // ends early
   EXPECT_FALSE(CallExport<bool>(dll, "version", nullptr, nullptr));
   Fill(392, 0);
   Fill(392, 5);
@@ -114,13 +117,23 @@ TEST_F(VersionTest, AFolderThatMayNotBeWritten) {
   EXPECT_TRUE(fs::is_directory(product)) << "made for the description file";
   WriteBytes((product / "xMacroWSH.qwsh").string(), "[Options]\r\nLanguage=PerUser\r\n");
   Fill(392, 77, 392, "", other);
+  // Reading and writing are both needed.
+  for (const char* rights : {"FR", "FW", "FRFW"}) {
+    Permit(folder, "FA");
+    const HMODULE another = LoadModule(folder + "\\" + rights);
+    WriteBytes(folder + "\\" + rights + "\\xMacroWSH.qwsh", "[Options]\r\nLanguage=Own\r\n");
+    Permit(folder + "\\" + rights, rights);
+    Fill(392, 77, 392, "", another);
+    FreeLibrary(another);
+    Permit(folder + "\\" + rights, "FA");
+  }
   // A folder that may be written is replaced by the user's own, which is made.
   std::error_code ignored;
   fs::remove_all(product), fs::remove(product.parent_path(), ignored);
   Fill(392, 77, 392, testFolder);
   EXPECT_TRUE(fs::is_directory(product.parent_path()));
-  EXPECT_TRUE(CallExport<bool>(dll, "version", std::string(392, '\0').replace(0, 2, "\x88\1").data(),
-                               nullptr))
+  EXPECT_TRUE(CallExport<bool>(dll, "version",
+                               std::string(392, '\0').replace(0, 2, "\x88\1").data(), nullptr))
       << "no folder at all";
   Permit(folder, "FA");
   FreeLibrary(other);
