@@ -2,8 +2,7 @@
 # SPDX-License-Identifier: MIT
 # The whole length of what ctest does for seconds, and prints its figures:
 #
-#   scripts/torture.sh [memory | values | files | profile | hosts | faults | soak | recordings |
-#                       fuzz | undefined | tidy]...
+#   scripts/torture.sh [memory | values | profile | hosts | recordings | fuzz | undefined | tidy]...
 #
 # Without arguments all of them, which takes one to two hours on an idle machine. The figures go to
 # Docs/reliability.md as well, each under the command that made it. SCRIPTRUBY_TORTURE_SEED, or in
@@ -15,7 +14,7 @@ set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 REPORT=$ROOT/Docs/reliability.md
-ALL=(memory values files profile hosts faults soak recordings fuzz undefined tidy)
+ALL=(memory values profile hosts recordings fuzz undefined tidy)
 failed=0
 
 # Puts the standard input in place of the section's block of figures.
@@ -73,7 +72,7 @@ undefined() {
   local program out=$LOGS/undefined.out
   for program in module_tests torture_tests; do
     SCRIPTRUBY_TEST_DLL=build/release/bin/trapping/scriptruby.dll timeout 3600 \
-      wine build/release/bin/$program.exe --gtest_color=no '--gtest_filter=-RandomHost*:FaultMix*' \
+      wine build/release/bin/$program.exe --gtest_color=no '--gtest_filter=-RandomHost*' \
       >"$out" || { cat "$out" && return 1; }
     # The last: some tests start the program once more.
     sed -n "s/^\[==========\] \(.*\) ran\..*/figure: $program: \1, no trap/p" "$out" | tail -n 1
@@ -92,11 +91,8 @@ run() {
   case $1 in
   memory) long_test memory '*Allocation*' ;;
   values) long_test values 'RandomCall*' ;;
-  files) long_test files 'RandomFile*' ;;
   profile) long_test profile '*ProfileFunctionsDo' core_tests ;;
   hosts) long_test hosts 'RandomHost*' ;;
-  faults) long_test faults 'FaultMix*' ;;
-  soak) long_test soak '*Soak*' ;;
   recordings)
     record recordings "SCRIPTRUBY_TEST_RECORDINGS=10000 wine build/release/bin/recording_tests.exe" \
       env SCRIPTRUBY_TEST_RECORDINGS=10000 timeout 3600 wine build/release/bin/recording_tests.exe
