@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// A module whose every run ends as a fault does. It calls the host by slot number, and writes a line
-// into its log.
+// A module whose every run ends as a fault does. It calls the host by slot number, and writes a
+// line into its log.
 #include <windows.h>
 
 static void Log(const char* line) {

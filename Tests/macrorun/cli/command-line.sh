@@ -16,9 +16,9 @@ expect 2 'MACRO is required'
 expect 2 '--bogus' --bogus macro.js
 expect 2 'usage: macrorun' --bogus macro.js
 expect 2 'expected NAME=VALUE' --arg name macro.js
-expect 2 '--repeat: expected a whole number from 1 on, got "0"' --repeat 0 macro.js
+expect 2 '--repeat: expected a whole number of at least 1, got "0"' --repeat 0 macro.js
 for time in 2s -1 0 nan; do
-  expect 2 "--timeout: expected a number of seconds above 0, as in 2 or 0.5, got \"$time\"" \
+  expect 2 "--timeout: expected a number of seconds above 0, such as 2 or 0.5, got \"$time\"" \
     --timeout "$time" macro.js
 done
 expect 2 '--errors' --errors xml macro.js
@@ -26,13 +26,13 @@ expect 2 'needs a FILE' --in-place macro.js
 expect 2 'standard input' --in-place macro.js -
 expect 2 '--output' -o out.txt --in-place macro.js input.txt
 expect 2 '--output' -o out.txt macro.js --each input.txt
-expect 2 'no place for third (several files stand behind --each)' macro.js input.txt third
-expect 2 'there is no option --timout' --timout 1 macro.js input.txt
-expect 2 'FILE: expected a name, got an empty one' macro.js ''
-expect 2 '--output: expected a name, got an empty one' macro.js input.txt -o ''
-expect 2 '--stubs and --check are two things to do' --check macro.js --stubs
-expect 2 '--check: reports only' --check macro.js -o out.txt
-expect 2 'name all macros behind it' macro.js --check macro.js
+expect 2 'unexpected arguments: third (use --each for several files)' macro.js input.txt third
+expect 2 'unknown option --timout' --timout 1 macro.js input.txt
+expect 2 'FILE: expected a file name, got an empty text' macro.js ''
+expect 2 '--output: expected a file name, got an empty text' macro.js input.txt -o ''
+expect 2 '--stubs and --check cannot be combined' --check macro.js --stubs
+expect 2 '--check: takes no text and no -o' --check macro.js -o out.txt
+expect 2 'name all macros after --check' macro.js --check macro.js
 expect 2 '18 characters' --engine A.Name.Of.Nineteen. macro.js
 expect 2 'macro missing.js' missing.js
 expect 2 'missing.txt' macro.js missing.txt
@@ -40,22 +40,22 @@ expect 2 'missing.dll' --module missing.dll macro.js
 expect 2 'input.txt' --module input.txt macro.js
 expect 2 'missing.qwsh' --description missing.qwsh macro.js
 expect 2 'xyz.qwsh' macro.xyz
-expect 2 'macro.rb: the names of Ruby macros end in .rbs' macro.rb
+expect 2 'macro.rb: the name of a Ruby macro ends in .rbs' macro.rb
 
-# How a macro ends
+# Exit codes and errors
 expect_js 0 'text' 'tarn.message("done");'
 expect 0 'Debug: GetIDsOfNames call succeeded.' --trace macro.js
 expect_js 1 'Syntax error' 'x = = 1;'
 expect_js 1 'macro.js:2:' "$(printf 'tarn.write("x");\nnothing.here();')"
-expect_js 1 'nothing is no macro function (see' 'tarn.nothing();'
-expect_js 1 'lineCount is no macro function; did you mean line_count? (see' 'tarn.lineCount();'
+expect_js 1 'unknown macro function nothing (see' 'tarn.nothing();'
+expect_js 1 'unknown macro function lineCount; did you mean line_count? (see' 'tarn.lineCount();'
 expect_js 0 '' 'try { tarn.nothing(); } catch (error) {}'
 expect 1 "Error creating 'No.Engine'" --engine No.Engine macro.js
 echo 'tarn.message("as JScript");' > macro.xyz
 expect 0 'as JScript' --engine JScript macro.xyz
 expect 4 'Tarn has detected' --module "$fake" macro.js
 
-# Wrong calls, which no script can catch
+# Wrong calls, which scripts cannot catch
 while IFS='|' read -r call text; do
   expect_js 1 "$text" "tarn.write('x'); try { tarn.$call; } catch (error) {}"
 done << 'CALLS'
@@ -75,9 +75,9 @@ for line in "$(printf '%01024d' 0)" "$(printf '\200')"; do
   expect_js 1 'get_line: line 1 has ' 'tarn.get_line(1);'
 done
 : > input.txt
-expect_js 1 'the document has none' 'tarn.get_line(1);'
+expect_js 1 'the document is empty' 'tarn.get_line(1);'
 
-# Text that no macro touches is not touched, and text at the limits passes
+# Unchanged text keeps every byte, and text at the limits passes
 expect_same() {
   expect_js 0 '' "$1"
   cmp input.txt out || fail "$1: the text has changed"
@@ -93,7 +93,7 @@ cmp input.txt out || fail 'a flag of the description changes the text'
 printf '%01023d\n%0511d' 1 2 > input.txt
 expect_same 'tarn.get_line(1); tarn.set_line(2, tarn.get_line(2));'
 
-# Standard input that is named, and that was forgotten
+# Standard input with and without -
 echo 'tarn.line_count();' > macro.js
 echo '$stdin.read' > reads.rbs
 for case in 'macro.js - < input.txt' 'reads.rbs < input.txt' 'macro.js < /dev/null' 'macro.js input.txt < input.txt'; do
@@ -101,11 +101,11 @@ for case in 'macro.js - < input.txt' 'reads.rbs < input.txt' 'macro.js < /dev/nu
   eval "expect 0 '' $case"
   [ ! -s err ] || fail "$case: $(cat err)"
 done
-forgotten='macrorun: the macro began with an empty text; for the one of standard input name - behind it'
+forgotten='macrorun: the macro started with an empty text (use - as FILE to read standard input)'
 expect 0 "$forgotten" macro.js < input.txt
 cat input.txt | { sleep 0.1; expect 0 "$forgotten" macro.js; finish; } || fail 'a pipe'
 
-# To Ruby a text is bytes: every line passes there and back, unless it is too long or has a zero byte
+# Ruby gets texts as bytes: every line is unchanged, unless it is too long or has a zero byte
 copy_lines='1.upto(@tarn.line_count) { |line| @tarn.set_line(line, @tarn.get_line(line)) }'
 i=1
 while [ $i -lt 256 ]; do printf "\\$(printf %03o $i)"; i=$((i + 1)); done > input.txt
@@ -122,7 +122,7 @@ mkdir 'Ordner ä 日本'
 echo 'tarn.message("found");' > 'Ordner ä 日本/ä 日本.js'
 expect 0 'found' 'Ordner ä 日本/ä 日本.js' input.txt
 
-# The Ruby engine is the one beside macrorun, wherever that is
+# The Ruby engine is the one in the folder of macrorun
 echo 'require "date"; @tarn.message("found " + Date::MONTHNAMES[5])' > macro.rbs
 cp "$macrorun" "$(dirname "$macrorun")/scriptruby.dll" 'Ordner ä 日本/'
 in_build_folder=$macrorun
@@ -142,7 +142,7 @@ macrorun='Ordner ä 日本/other.exe'
 expect 0 'found May' macro.rbs
 macrorun=$in_build_folder
 
-# Nothing is left in the temporary folder
+# The temporary folder is empty afterwards
 mkdir temporary
 temporary() {
   wine cmd /c "set TMP=Z:$(pwd | tr / '\\')\\temporary&& Z:$(echo "$macrorun" | tr / '\\') $1"

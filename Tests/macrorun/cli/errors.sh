@@ -1,10 +1,10 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# errors.sh MACRORUN FAKE_MODULE: how errors are shown, and what else is told about a run.
+# errors.sh MACRORUN FAKE_MODULE: errors, messages, traces, profiles and syntax checks.
 . "$(dirname "$0")/runner.sh"
 printf 'text\n' > input.txt
 
-# Place, message, the source line and a caret below the character, once each
+# Place, message, source line and caret
 expect_rbs 1 '' "$(printf 'def f\n\t"\303\244" + nil\nend\nf')"
 expect_lines err "macro.rbs:2:2: no implicit conversion of nil into String (TypeError)" \
   "$(printf '  \t"\303\244" + nil')" "$(printf '  \t^')" "$(printf "\tfrom macro.rbs:2:in \`+'")" \
@@ -19,10 +19,10 @@ expect_lines err "macro.rbs:1:5: syntax error, unexpected '='" '  x = = 1' '    
 expect_js 1 '' '/* ä */ x = = 1;'
 expect_lines err 'macro.js:1:13: Syntax error' '  /* ä */ x = = 1;' '              ^'
 expect_js 1 '' "$(printf 'var ok;\n  tarn.nothing();')"
-expect_lines err 'macro.js:2:3: nothing is no macro function (see --functions)' \
+expect_lines err 'macro.js:2:3: unknown macro function nothing (see --functions)' \
   '    tarn.nothing();' '    ^'
 expect_rbs 1 '' '@tarn.nothing'
-expect_lines err 'macro.rbs:1:6: nothing is no macro function (see --functions)' '  @tarn.nothing' '       ^'
+expect_lines err 'macro.rbs:1:6: unknown macro function nothing (see --functions)' '  @tarn.nothing' '       ^'
 expect_rbs 1 '' "$(printf '@tarn.nothing rescue nil\nnil.foo')"
 expect_lines err "macro.rbs:2:4: undefined method \`foo' for nil:NilClass (NoMethodError)" \
   '  nil.foo' '     ^'
@@ -34,7 +34,7 @@ expect_rbs 1 '' "$(printf 'def f\n  @tarn.goto_line(7)\nend\n\nf')"
 expect_lines err 'macro.rbs:2: goto_line: argument 1 of (line): expected a line number from 1 to 2, got "7"' \
   '    @tarn.goto_line(7)' "$(printf "\tfrom macro.rbs:2:in \`f'")" "$(printf "\tfrom macro.rbs:5:in \`<main>'")"
 
-# --keep-going: the call does nothing, the macro goes on, and has failed
+# --keep-going: the call does nothing and the macro continues, but has failed
 expect_js 1 'after' 'tarn.goto_line(7); tarn.message("after");' --keep-going
 
 # JSON: every line is an object
@@ -66,7 +66,7 @@ else
   echo 'no python3: JSON is not checked'
 fi
 
-# Colour on a terminal, unless the user does not want it
+# Colour on a terminal, unless NO_COLOR is set
 if command -v script > /dev/null; then
   colour=$(printf '\033\\[[0-9;]*3[1-6][0-9;]*m\|\033\\[[0-9;]*9[1-6][0-9;]*m')
   echo 'x = = 1;' > macro.js
@@ -92,17 +92,17 @@ grep -qx 'a line of the module' module.log || fail '--log: the module has not fo
 long=$(printf '%0120d' 0)
 mkdir -p "$long/$long"
 expect 2 '--log nowhere/x: its folder does not exist' --log nowhere/x macro.rbs
-expect 2 "/x: the module takes 255 characters at most" --log "$long/$long/x" macro.rbs
+expect 2 "/x: the full path has more than 255 characters" --log "$long/$long/x" macro.rbs
 expect 2 '--log 日本.log: the system' --log 日本.log macro.rbs
 
-# Messages, arguments, answers and macros in macros
+# Messages, arguments, answers and nested macros
 echo '@tarn.write(@tarn.argument("name") + @tarn.argument("other", "-") + @tarn.prompt("?") + @tarn.prompt("?"))' > ask.rbs
 expect 0 'a=b-12' ask.rbs --arg name=a=b --answer 1 --answer 2
 ! grep -q asked err || fail "an argument was read: $(cat err)"
-expect 1 'prompt: expected an answer, but there is none (--answer' ask.rbs --arg name=x --answer 1 < /dev/null
+expect 1 'prompt: expected an answer, got none (use --answer' ask.rbs --arg name=x --answer 1 < /dev/null
 expect 1 'argument: argument 1' ask.rbs --arg nmae=x
 ! grep -q asked err || fail "a macro that failed may have been about to ask: $(cat err)"
-expect 0 'macrorun: --arg nmae: the macro has not asked for it' ask.rbs --arg name=x --arg nmae=x --answer 1 --answer 2
+expect 0 'macrorun: --arg nmae: the macro did not read it' ask.rbs --arg name=x --arg nmae=x --answer 1 --answer 2
 expect 0 'a12a12' ask.rbs --arg name=a --arg other= --answer 1 --answer 2 --repeat 2
 echo '@tarn.write(@tarn.prompt("?", "d") + @tarn.prompt("?", ""))' > ask.rbs
 expect 0 'd' ask.rbs < /dev/null
@@ -120,10 +120,10 @@ grep -q '^inner.two.rbs:1: goto_line' err && grep -q '^inner/one.rbs:1:.*inside'
 [ "$(grep -c "from inner.two.rbs:.:in" err)" -eq 2 ] && ! grep -q 'from.*outer' err ||
   fail "the chain of a nested wrong call: $(cat err)"
 echo '@tarn.run_macro("inner/none.rbs"); @tarn.run_macro("self.rbs")' > self.rbs
-expect 0 'there is no macro' self.rbs
+expect 0 'no such macro: ' self.rbs
 grep -q 'more than 16 deep' err || fail "endless macros: $(cat err)"
 
-# A macro that the module would read as nonsense
+# A macro in UTF-16, which the module cannot read
 printf '\377\376x' > wide.rbs
 echo '@tarn.run_macro("wide.rbs")' > outer.rbs
 for source in wide.rbs '--check wide.rbs' '--test .'; do

@@ -1,11 +1,11 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# guide.sh MACRORUN FAKE_MODULE: what the guide for authors of macros shows does what it says; so do the
-# recordings in the manual.
+# guide.sh MACRORUN FAKE_MODULE: the macros in the guide for macro authors and the recordings in the
+# manual do what the text says.
 . "$(dirname "$0")/runner.sh"
 guide=$root/Docs/writing-macros.md
 
-# Macros, and the texts before and after that follow some of them
+# The macros, and the texts before and after some of them
 awk '/^```ruby$/ { n++; file = n ".rbs"; next }
      /^```text before$/ { file = n ".in"; next }
      /^```text after$/ { file = n ".out"; next }
@@ -22,7 +22,7 @@ for macro in *.rbs; do
 done
 [ $ran -ge 3 ] || fail "only $ran macros with texts found in $guide"
 
-# run CODE TEXT WORD [OPTION...]: the macro with that word in it, over the file text
+# run CODE TEXT WORD [OPTION...]: runs the macro that contains the word on the file text
 run() {
   code=$1 text=$2 macro=$(grep -l -- "$3" ./*.rbs)
   shift 3
@@ -36,7 +36,7 @@ run 0 '' prefix --arg 'prefix=| '
 expect_lines out '| one' '| two'
 printf '{"a": [1' > text
 run 1 'rbs:6:3: This is no JSON' JSON.parse
-# Longer than one call takes
+# Longer than an argument
 { echo '['; seq 300 | sed 's/^/  /; $!s/$/,/'; echo ']'; } > long
 sed 's/^ *//' long > text
 run 0 '' JSON.parse

@@ -1,11 +1,10 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# record.sh MACRORUN FAKE_MODULE: macros made of recorded steps, and recordings and templates that are
-# refused.
+# record.sh MACRORUN FAKE_MODULE: macros made from recordings; wrong recordings and templates.
 . "$(dirname "$0")/runner.sh"
 languages=$(dirname "$macrorun")/languages
 
-# expect_steps CODE TEXT STEPS [OPTION...]: what the steps become, as expect has it.
+# expect_steps CODE TEXT STEPS [OPTION...]: as expect, for --record of the steps.
 expect_steps() {
   code=$1 text=$2 source=$3
   shift 3
@@ -13,7 +12,7 @@ expect_steps() {
   expect "$code" "$text" --record steps.json "$@"
 }
 
-# The macro as a whole: templates, joined text, keys, calls
+# A complete macro: templates, joined text, keys, calls
 steps='[{"text": "say \"#{x}\" \\ ä"}, {"key": "Enter"}, {"text": "\r\n\n"}, {"bytes": [255]},
   {"text": "\u0001#"}, {"key": "Tab"}, {"call": "GOTO_LINE", "arguments": [2]}, {"key": "Home"},
   {"text": "#"}, {"text": "{"}, {"call": "message", "arguments": ["a", 1.0, -0.5, {"bytes": [200]}]}]'
@@ -31,7 +30,7 @@ expect_steps 0 '' '[{"text": "\"'"'"'\r\n"}, {"key": "Enter"}]' --description "$
 expect_lines out 'Sub key_macro()' "	Call tarn.write(\"\"\"'\"&vbCrLf&\"\"&vbLf&\"\")" 'End Sub' '' \
   "key_macro ' run the macro"
 
-# What each key does
+# The effect of each key
 keys='"Ctrl+End", "Up", "Up", "End", "Tab", "Enter", "Left", "Left", "Right", "Backspace", "Down", "Down",
   "Right", "Home", "Delete", "Ctrl+Right", "Ctrl+Left", "Ctrl+Delete", "Ctrl+Home", "Delete"'
 printf 'one\ntwo\nthree four\n' > input.txt
@@ -46,7 +45,7 @@ expect_steps 0 '' "[{\"text\": \"$long\"}]" -o long.rbs
 expect 0 '' long.rbs
 printf %s "$long" | cmp - out || fail 'long text has changed'
 
-# Recordings that are wrong, each with the place in it; what the macro would replace stays
+# Wrong recordings, with the place of each error; an existing macro is kept
 echo old > kept.rbs
 while IFS='|' read -r steps text; do
   expect_steps 2 "steps.json: $text" "$steps" -o kept.rbs
@@ -56,10 +55,10 @@ done << CASES
 [1e999]|number overflow
 [{"text": "a"}, 5]|step 2: expected an object with "text", "bytes", "key" or "call", got 5
 [{}]|step 1: expected an object
-[{"txt": "a"}]|step 1: "txt": no key of a step
-[{"call": "find", "args": ["a"]}]|step 1: "args": no key of a call, beside which "arguments" may stand
-[{"text": "a", "key": "Enter"}]|step 1: "text": cannot stand beside "key"
-[{"text": "a", "arguments": []}]|step 1: "arguments": stands beside "call" only
+[{"txt": "a"}]|step 1: "txt": unknown key; expected
+[{"call": "find", "args": ["a"]}]|step 1: "args": unknown key; a call has "call" and "arguments"
+[{"text": "a", "key": "Enter"}]|step 1: "text": cannot be combined with "key"
+[{"text": "a", "arguments": []}]|step 1: "arguments": needs "call"
 [{"text": 5}]|step 1: "text": expected a text, got 5
 [{"text": "a\u0000b"}]|step 1: "text": a zero byte
 [{"bytes": "a"}]|step 1: "bytes": expected a list of bytes
@@ -67,7 +66,7 @@ done << CASES
 [{"bytes": [-1]}]|step 1: "bytes": byte 1
 [{"bytes": [0]}]|step 1: "bytes": a zero byte
 [{"key": "Esc"}]|step 1: "key": expected one of Enter, Tab
-[{"call": "nothing"}]|step 1: "call": nothing is no macro function
+[{"call": "nothing"}]|step 1: "call": unknown macro function nothing
 [{"call": "undo", "arguments": 5}]|step 1: "arguments": expected a list, got 5
 [{"call": "write", "arguments": [null]}]|step 1: "arguments": argument 1: expected a number, a text
 [{"call": "goto_line"}]|step 1: "arguments": goto_line: expected 1 argument (line), got 0
@@ -83,7 +82,7 @@ printf '["\377"]' > steps.json
 expect 2 'steps.json: parse error at line 1' --record steps.json
 expect_lines kept.rbs old
 
-# Templates: a text that fills its field is taken, a longer one is not
+# Templates: a text that fills its field is accepted, a longer one is refused
 describe() { printf '%s\n' '[Options]' 'Language=RubyScript' "$@" > own.qwsh; }
 for field in '\nMacroBegin 75' '\nMacroEnd 50' '\nFunctionPrint 40' '\nFunctionPrefix 40' \
   '\nFunctionPostfix 40' 'Enter 10' 'CRLF 10' 'LineFeed 10' 'Tick 10' 'Quote 10'; do
@@ -107,7 +106,7 @@ expect_steps 2 'step 1: "arguments": a text needs quotes' \
   '[{"call": "find", "arguments": ["a"]}]' --description own.qwsh
 describe 'Quote=""' 'Tick='
 expect_steps 2 'step 2: own.qwsh has no Tick' '[{"text": "a"}, {"text": "it'"'"'s"}]' --description own.qwsh
-expect_steps 2 'step 1: a carriage return' '[{"text": "a\rb"}]' -o new.vbs
+expect_steps 2 'step 1: no template for a carriage return' '[{"text": "a\rb"}]' -o new.vbs
 describe 'Enter=\r\n'
 expect_steps 0 '"\r\n\n"' '[{"key": "Enter"}, {"text": "\n"}]' --description own.qwsh
 

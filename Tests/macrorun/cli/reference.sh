@@ -1,7 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# reference.sh MACRORUN FAKE_MODULE: the list of the macro functions, Docs/functions.md and the stubs for
-# completion say the same; so do --help and the table of options.
+# reference.sh MACRORUN FAKE_MODULE: the list of macro functions, Docs/functions.md and the stubs
+# agree; --help and the table of options agree.
 . "$(dirname "$0")/runner.sh"
 page=$root/Docs/functions.md
 
@@ -11,7 +11,7 @@ expect 0 '' --functions=markdown
 cp out page
 diff "$page" page || fail "Docs/functions.md is out of date: scripts/run.sh --functions=markdown -o Docs/functions.md"
 
-# The stubs are Ruby with the list's names and parameters, each with its tag, and leave @tarn alone
+# The stubs are valid Ruby with the names and parameters of the list, and do not replace @tarn
 expect 0 '' --functions -o list
 expect 0 '' --stubs -o tarn.rb
 cat > macro.rbs << 'RUBY'
@@ -41,7 +41,7 @@ expect 0 '' macro.rbs
 sed -n 's/^  \([a-z_]*([^)]*)\).*/\1/p' list | LC_ALL=C sort > calls
 [ "$(wc -l < calls)" -ge 70 ] && LC_ALL=C sort out | diff calls - || fail 'the stubs are not those of the list'
 grep -q '^  sort_lines.* (options: descending, ignore_case, unique)$' list || fail 'the list has no options'
-grep -qx '  # @param count \[Integer, nil\] 0 or more; left out: all that follow' tarn.rb || fail 'a stub does not tell what holds without an argument'
+grep -qx '  # @param count \[Integer, nil\] 0 or more; default: all that follow' tarn.rb || fail 'a stub does not name the default'
 grep -qx '@tarn ||= Tarn.new' tarn.rb || fail 'the stubs have no @tarn'
 
 # Each option is in the guide's table, and a test uses it
@@ -51,6 +51,6 @@ for option in $(sed -n 's/^  \(-.,\)\?\(--[a-z-]*\).*/\2/p' out); do
   grep -q -- "^| \(\`-.\`, \)\?\`$option[\` ]" "$guide" || fail "$option is not in the table"
   cat "$root"/Tests/macrorun/cli/*.sh | grep -q -- "$option\b" || fail "no test uses $option"
 done
-[ "$(grep -c '^| `-' "$guide")" -eq "$(grep -c '^  -' out)" ] || fail 'the table has options that there are not'
+[ "$(grep -c '^| `-' "$guide")" -eq "$(grep -c '^  -' out)" ] || fail 'the table has options that do not exist'
 
 finish

@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: MIT
-# Sourced by the tests of macrorun, which are called with MACRORUN and FAKE_MODULE: a folder of their
-# own, and what they expect. The last line of each is `finish`.
+# Sourced by the tests of macrorun, which are called with MACRORUN and FAKE_MODULE: a temporary
+# folder and functions that check results. The last line of each test is `finish`.
 . "$(dirname "$0")/../../wine.sh"
 exec < /dev/null
 macrorun=$1
@@ -18,8 +18,8 @@ fail() {
 
 finish() { [ $failures -eq 0 ]; }
 
-# expect CODE TEXT [ARGUMENT...]: the exit code, and a text on either stream. A run that fails leaves
-# standard output empty.
+# expect CODE TEXT [ARGUMENT...]: checks the exit code, and a text on either stream. A run
+# that fails must leave standard output empty.
 expect() {
   code=$1 text=$2
   shift 2
@@ -30,7 +30,7 @@ expect() {
   [ "$code" -eq 0 ] || [ ! -s out ] || fail "$* ($source): printed although it failed"
 }
 
-# expect_js CODE TEXT SOURCE [OPTION...], expect_rbs likewise: as above, for a macro over input.txt.
+# expect_js CODE TEXT SOURCE [OPTION...], expect_rbs: as expect, for a macro on input.txt.
 expect_source() {
   extension=$1 code=$2 text=$3 source=$4
   shift 4
@@ -40,7 +40,7 @@ expect_source() {
 expect_js() { expect_source js "$@"; }
 expect_rbs() { expect_source rbs "$@"; }
 
-# expect_lines FILE LINE...: the whole file.
+# expect_lines FILE LINE...: checks the complete file.
 expect_lines() {
   file=$1
   shift

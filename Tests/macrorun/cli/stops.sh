@@ -9,7 +9,7 @@ echo 'loop {}' > endless.rbs
 now() { date +%s%3N; }
 
 # interrupt SIGNALS: runs macro.rbs or macro.js ($1), sends Ctrl+C that often once the macro has
-# started, and leaves exit code and time since the last signal.
+# started, and checks the exit code and the time since the last signal.
 interrupt() {
   : > err # not the one of the run before, which has started
   wine "$macrorun" "$1" input.txt > out 2> err &
@@ -44,12 +44,12 @@ rbs|1|@tarn.message("started"); @tarn.run_macro("endless.rbs"); loop {}
 js|2|tarn.message("started"); while (true);
 MACROS
 
-# What has been stopped by force says so; its ensure blocks have run
+# An interrupted macro has run its ensure blocks
 expect_rbs 3 'timed out' 'begin; sleep; ensure; File.write("ensured", "x"); end' --timeout 2
 [ -e ensured ] || fail 'an interrupted macro has not run its ensure block'
 expect_js 3 'the program ends' 'while (true);' --timeout 0.3
 
-# It says where the macro was, as far as that can be known
+# The error names the place, if the engine knows it
 expect_js 3 'macro.js: timed out' 'while (true) tarn.line_count();' --timeout 0.3
 expect_rbs 3 '' "$(printf 'def f\n  sleep\nend\nf')" --timeout 2
 expect_lines err 'macro.rbs:2:3: timed out' '    sleep' '    ^' "$(printf "\tfrom macro.rbs:2:in \`sleep'")" \
@@ -59,15 +59,15 @@ expect_lines err 'macro.rbs:3: timed out' '    @tarn.line_count while true'
 expect 3 '{"type":"error","kind":"stop","file":"macro.rbs","line":3,' --timeout 2 --errors=json macro.rbs
 echo 'begin; sleep; ensure; sleep 0.2; File.write("ensured", "inner"); end' > inner.rbs
 expect_rbs 3 'inner.rbs:1:8: timed out' '@tarn.run_macro("inner.rbs"); @tarn.message("after")' --timeout 2
-grep -q inner ensured || fail 'the ensure block of an inner macro has not come to its end'
-! grep -q after err || fail 'a macro goes on after the one that it ran was stopped'
+grep -q inner ensured || fail 'the ensure block of a nested macro did not finish'
+! grep -q after err || fail 'the outer macro continued after the stop'
 expect_rbs 0 '' '@tarn.line_count' --timeout 30
 
-# Of several files none is begun after a stop
-expect 3 '0 of 2 files done, 1 failed, 1 not begun' --timeout 0.3 endless.rbs --each input.txt input.txt
+# With several files, a stop ends the batch
+expect 3 '0 of 2 files done, 1 failed, 1 not started' --timeout 0.3 endless.rbs --each input.txt input.txt
 
-# answer KEYS [OPTION...]: types KEYS two seconds after the prompt has appeared, and leaves the exit
-# code. The shell of `script` may not stand between: it would end by the Ctrl+C itself.
+# answer KEYS [OPTION...]: types KEYS two seconds after the prompt, and sets `result` to the exit
+# code. `exec` replaces the shell of `script`, which Ctrl+C would end.
 answer() {
   keys=$1
   shift
@@ -79,7 +79,7 @@ answer() {
   result=$?
 }
 
-# Time that a prompt waits does not count
+# The time of a prompt does not count
 if command -v script > /dev/null; then
   echo 'tarn.message("answer: " + tarn.prompt("who?"));' > macro.js
   answer 'Bob\r' --timeout 1

@@ -1,15 +1,14 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# testing.sh MACRORUN FAKE_MODULE: macros as tests: what passes and what fails, how a difference is shown,
-# and what --promote writes.
+# testing.sh MACRORUN FAKE_MODULE: --test and --promote: results, differences, files.
 . "$(dirname "$0")/runner.sh"
 
-# What is no folder of tests
+# Folders without tests
 mkdir empty folder folder/inner.rbs
-expect 2 'no macros in empty' --test empty
-expect 2 'no folder and no macro missing' --test missing
+expect 2 '--test empty: no macros in this folder' --test empty
+expect 2 '--test missing: no such folder or macro' --test missing
 echo '@tarn.write("x")' | tee macro.rbs > macro.txt
-expect 2 'no macro missing.rbs' --test missing.rbs
+expect 2 'missing.rbs: no such folder or macro' --test missing.rbs
 expect 2 'macro.txt' --test macro.txt
 expect 2 '--test' --test folder macro.rbs
 expect 2 '--test' --test folder -o out.txt
@@ -17,7 +16,7 @@ expect 2 '--test' --test folder --each macro.rbs
 expect 2 '--test' --test folder --in-place
 expect 2 '--test' --promote macro.rbs
 
-# Three languages over one text, a macro without one; nothing but macros runs, and nothing is written
+# Three languages on one text, a macro without a text; other files are ignored, nothing is written
 echo 'tarn.document_end(); tarn.write(tarn.argument("what")); tarn.message("JScript")' > folder/same.js
 echo 'tarn.document_end : tarn.write tarn.argument("what")' > folder/same.vbs
 echo '@tarn.document_end; @tarn.write(@tarn.argument("what"))' > folder/same.rbs
@@ -36,18 +35,18 @@ expect 0 '4 passed' --test folder --arg what=b --answer yes --trace --profile
 grep -q '^folder/same.rbs: argument("what") -> "b"' err && grep -q '^argument  *3 ' err || fail "reports: $(cat err)"
 find folder -type f | sort | xargs cksum | diff before - || fail '--test has written'
 
-# The whole of a difference: an empty macro leaves NAME.in as it is
+# A complete difference; the empty macro does not change NAME.in
 mkdir diff
 : > diff/d.rbs
 printf '1\r\n2\r\n3\r\n4\r\n5\t \r\n6\r\n7\r\n8\r\n9\r\n10\r\n11\r\n12\r\n13\r\n\033\377\r\n\303\244\302\240' > diff/d.out
 printf '1\r\n2\r\n3\r\n4\r\n5 \t\r\n6\r\n7\r\n8\r\n9\r\n10\r\n11\r\n12\r\nnew\r\n13\n\033\377\r\n\303\244 \n' > diff/d.in
 expect 1 '' --test diff
-expect_lines err 'diff/d.rbs: its text is not that of d.out' '--- d.out' '+++ d.rbs' \
+expect_lines err 'diff/d.rbs: the text differs from d.out' '--- d.out' '+++ d.rbs' \
   '@@ -2,7 +2,7 @@' ' 2' ' 3' ' 4' '-5<TAB><SPACE><CR>' '+5 <TAB><CR>' ' 6' ' 7' ' 8' \
   '@@ -10,6 +10,7 @@' ' 10' ' 11' ' 12' '-13<CR>' '+new<CR>' '+13' ' <U+001B><0xFF>' \
   '-ä<U+00A0>' '\ the text ends without a line end' '+ä<SPACE>' 'macrorun: 0 passed, 1 failed'
 
-# No two lines that differ look alike
+# Lines that differ look different
 mkdir alike
 i=10
 while read -r pair; do
@@ -77,7 +76,7 @@ awk '/^(---|\+\+\+|[^-+\\])/ { next } /^\\/ { lines[n] = lines[n] $0; next } { l
              if (lines[i] ~ /^-/ && substr(lines[i], 2) == substr(lines[i + 1], 2)) bad = 1
            exit bad || n < 27 }' err ||
   fail "a difference that cannot be seen: $(cat err)"
-grep -qx -- '-e<U+0301>' err || fail 'a mark on the letter before is not shown'
+grep -qx -- '-e<U+0301>' err || fail 'a combining mark is not shown'
 LC_ALL=C tr -d '\n\040-\176\303\251' < err | LC_ALL=C od -c | grep -q '033\|377\|\\r' && fail 'raw bytes in a difference'
 
 # Errors, wrong calls, stops and faults
@@ -92,17 +91,17 @@ expect 1 'macrorun: 1 passed, 2 failed' --test bad --keep-going
 echo 'loop {}' > bad/b.rbs
 echo 'tarn.write("x");' > bad/d.js
 : > bad/d.out
-expect 3 'macrorun: 0 passed, 4 failed, 0 promoted, 1 not begun' --test bad --timeout 2 --promote
+expect 3 'macrorun: 0 passed, 4 failed, 0 promoted, 1 not started' --test bad --timeout 2 --promote
 grep -q '^bad/b.rbs:1:1: timed out' err || fail "who timed out: $(cat err)"
 [ ! -s bad/d.out ] || fail 'promoted after a stop'
-expect 4 'macrorun: 0 passed, 1 failed, 4 not begun' --test bad --module "$fake"
+expect 4 'macrorun: 0 passed, 1 failed, 4 not started' --test bad --module "$fake"
 rm bad/b.rbs bad/d.*
 chmod a-r bad/c.out
 [ -r bad/c.out ] || expect 2 'cannot read the file bad/c.out' --test bad
 chmod a+r bad/c.out
 expect 2 'missing.dll' --test bad --module missing.dll
 
-# Several texts for a macro, in each of its languages; a macro that has no other; texts of none
+# Several cases of a macro in two languages; texts without a macro
 mkdir cases
 echo 'tarn.document_end(); tarn.write("!");' > cases/a.js
 echo '@tarn.message("Ruby"); raise "oops" if @tarn.get_text == "c"; @tarn.document_end; @tarn.write("!")' | tee cases/a.rbs > cases/b.rbs
@@ -123,18 +122,18 @@ cd cases || exit 1
 expect 0 '{"type":"test","macro":"A.js","case":"long","passed":true}' --test A.js --errors json
 cd .. || exit 1
 
-# --promote: what ran without an error and is another text or has none; whole, or as it was
+# --promote writes the text of each macro that ran without an error, completely or not at all
 mkdir new
 for name in a b c d; do echo '@tarn.write("new\n")' > new/$name.rbs; done
 echo 'tarn.write("newer\n");' > new/b.js
 echo '@tarn.write("new\n"); raise "oops"' > new/c.rbs
 echo 'tarn.write("new\n");' > new/d.js
 for name in b c; do echo old > new/$name.out; done
-expect 1 'new/a.rbs: no a.out; --promote writes it' --test new
+expect 1 'new/a.rbs: no a.out (create it with --promote)' --test new
 grep -qx '+new' err || fail "what --promote would write: $(cat err)"
 [ ! -e new/a.out ] || fail 'written without --promote'
 expect 1 'macrorun: 0 passed, 3 failed, 3 promoted' --test new --promote
-grep -q '^new/b.out: not promoted, since its macros disagree: b.js, b.rbs' err || fail "disagreeing: $(cat err)"
+grep -q '^new/b.out: not promoted: its macros make different texts: b.js, b.rbs' err || fail "disagreeing: $(cat err)"
 cat new/a.out new/b.out new/c.out new/d.out > all
 expect_lines all new old old new
 expect 1 'macrorun: 3 passed, 3 failed, 0 promoted' --test new --promote
@@ -152,7 +151,7 @@ rmdir new/a.out.macrorun~
 expect 0 'macrorun: 2 passed, 0 failed, 1 promoted' --test new --promote
 grep -qx -- '-old' err && grep -qx '+new' err && grep -qx 'macrorun: promoted new/a.out' err || fail "promoted unseen: $(cat err)"
 
-# For programs; on a terminal
+# JSON; colour on a terminal
 expect 1 '' --test bad --errors json
 if command -v python3 > /dev/null; then
   python3 - << 'PYTHON' || fail "JSON: $(cat err)"

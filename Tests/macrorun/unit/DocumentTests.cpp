@@ -49,7 +49,7 @@ TEST(DocumentTest, NewLinesEndAsTheFirstDoesAndOldOnesKeepTheirs) {
   }
 }
 
-// A step is taken back as a whole or not at all.
+// A step is undone completely or not at all.
 TEST(DocumentTest, AStepThatIsTooLargeIsForgotten) {
   Document document("a\n");
   document.ReplaceLines(1, 1, {"b"});

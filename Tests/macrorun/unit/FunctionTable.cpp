@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "FunctionTable.h"
 
-// "nest" writes twice as a macro would, each macro being a step.
+// The macro "nest" writes twice, as one step.
 bool FakeServices::RunMacro(const std::filesystem::path& macro) {
   if (macro != "nest") return false;
   const EditorStep step(*editor);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// What each macro function makes of a document, what it answers and what it refuses.
+// The effect, the result and the refused arguments of each macro function.
 #include <gtest/gtest.h>
 
 #include <cstdio>
@@ -75,7 +75,7 @@ TEST(FunctionTest, Selection) {
 
 TEST(FunctionTest, LinesAndText) {
   Check({
-      {"ab|c", {{"set_line", {"1", "xü"}}}, "x|ü"},  // not into a character
+      {"ab|c", {{"set_line", {"1", "xü"}}}, "x|ü"},  // not inside a character
       {"a\nb|\nc\n", {{"delete_lines", {"1", "2"}}}, "|c\n"},
       {"a\nb\nc|", {{"replace_lines", {"1", "2", "x\ny\nz\n"}}}, "x\ny\nz\nc|"},
       {"a\nb\nc|", {{"replace_lines", {"2", "3", ""}}}, "a|"},
@@ -135,7 +135,7 @@ TEST(FunctionTest, FindAndReplace) {
        "über über_ [über|",
        "1"},
       {"|a\nb\n", {{"find", {"a\nb\n"}}}, "[a\nb\n|", "1"},
-      {"|ü\xbc\xbc", {{"find", {"\xbc"}}}, "ü[\xbc|\xbc", "1"},  // not the half of a character
+      {"|ü\xbc\xbc", {{"find", {"\xbc"}}}, "ü[\xbc|\xbc", "1"},  // not a part of a character
       {"|a\xffx1", {{"find_regex", {"\\w\\d"}}}, "a\xff[x1|", "1"},
       {"|ab\ncd", {{"find_regex", {"^\\wx+d"}}}, "|ab\ncd", "0"},
       {"|ab\ncd", {{"find_regex", {"^(c)(x)?d$"}}, {"match_group", {"1"}}}, "ab\n[cd|", "c"},
@@ -199,7 +199,7 @@ TEST(FunctionTest, MarksClipboardAndUndo) {
   });
 }
 
-// A macro is one step, its calls are steps while it runs, and so are nested macros in it.
+// A macro is one undo step. While it runs, each call and each nested macro is a step.
 TEST(FunctionTest, StepsOfMacros) {
   FakeServices services;
   Editor editor(FromPicture("|"));
@@ -304,21 +304,23 @@ TEST(FunctionTest, WrongCallsChangeNothingAndSayWhatIsRight) {
       {{"goto", {"1", "4"}}, 2, "expected a column of line 1 from 1 to 3, got \"4\""},
       {{"goto", {"3", "2"}}, 2, "a column of line 3 from 1 to 1"},
       {{"cursor_left", {"-1"}}, 1, "expected a number from 0 to 2147483647, got \"-1\""},
-      {{"select", {"2", "1", "1", "1"}}, 3, "a place that is not before the first"},
+      {{"select", {"2", "1", "1", "1"}}, 3, "a position that is not before the first"},
       {{"delete_lines", {"2", "1"}}, 2, "a line number from 2 to 2"},
-      {{"sort_lines", {"1", "2", "unique up"}}, 3, "words among descending, ignore_case, unique"},
+      {{"sort_lines", {"1", "2", "unique up"}},
+       3,
+       "only words of this list: descending, ignore_case, unique"},
       {{"find", {""}}, 1, "a text that is not empty"},
       {{"find", {"x", "selection"}}, 2, "backward, wrap, got \"selection\""},
       {{"replace_all_regex", {"a(b", ""}}, 1, "missing closing parenthesis at character 4"},
       {{"find_regex", {"\xff"}}, 1, "UTF-8"},
-      {{"match_group", {"0"}}, 1, "something found before"},
-      {{"indent", {"1001"}}, 1, "at most 1000 blanks"},
+      {{"match_group", {"0"}}, 1, "an earlier match"},
+      {{"indent", {"1001"}}, 1, "at most 1000 spaces"},
       {{"insert_line", {"1", "a\nb"}}, 2, "one line without a line end"},
       {{"set_mark", {""}}, 1, "a text that is not empty"},
       {{"write", {std::string(512, 'x')}}, 1, "may have been cut"},
       {{"write", {std::string(511, 'x') + "yä"}}, 1, "cut"},
-      {{"prompt", {"nobody?"}}, 0, "prompt: expected an answer, but there is none (--answer"},
-      {{"argument", {"none"}}, 1, "an argument that the macro was given"},
+      {{"prompt", {"nobody?"}}, 0, "prompt: expected an answer, got none (use --answer"},
+      {{"argument", {"none"}}, 1, "the name of an argument of the macro"},
   };
   for (const Row& row : rows) {
     SCOPED_TRACE(row.call.function + " " + row.text);
@@ -338,14 +340,14 @@ TEST(FunctionTest, WrongCallsChangeNothingAndSayWhatIsRight) {
   }
 }
 
-// A search that would take for ever ends as a wrong call.
+// A search that takes too long is a wrong call.
 TEST(FunctionTest, ARegularExpressionThatTakesTooLong) {
   FakeServices services;
   Editor editor(Document(std::string(200, 'a') + "b"));
   EXPECT_THROW(Do(editor, services, {"find_regex", {"(a|aa)+$"}}), WrongCall);
 }
 
-// Texts that would not arrive as they are do not leave.
+// A text that would reach the macro changed is refused.
 TEST(FunctionTest, ResultsThatCannotPass) {
   const std::string longest(1023, 'x');
   FakeServices services;

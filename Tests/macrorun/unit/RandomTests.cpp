@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Random calls of everything that changes documents.
+// Random calls of all functions that change documents.
 #include <gtest/gtest.h>
 
 #include <random>
@@ -24,7 +24,7 @@ class Random {
     for (std::size_t i = Below(6); i > 0; --i) text += Of(pieces);
     return text;
   }
-  // Mostly what such a parameter takes.
+  // Mostly a valid argument.
   std::string Argument(ParameterKind kind, const Document& document) {
     static const char* const words[] = {"",          "ignore_case", "wrap",
                                         "selection", "unique",      "backward"};
@@ -90,7 +90,7 @@ Call RandomCall(Random& random, const Document& document) {
   }
 }
 
-// Undo and redo go through the very states that were there, and a refused call leaves its own.
+// Undo and redo restore each earlier state. A refused call changes nothing.
 TEST(RandomTest, UndoRedoAndRefusals) {
   std::size_t refused = 0, changed = 0;
   for (std::uint32_t seed = 0; seed < 1500 && !HasFailure(); ++seed) {
@@ -137,7 +137,7 @@ TEST(RandomTest, UndoRedoAndRefusals) {
   EXPECT_GT(changed, 3000u);
 }
 
-// Against a text without lines: what comes out, and where a mark goes.
+// Compares the text and a mark with a model without lines.
 TEST(RandomTest, ReplaceAgainstAPlainText) {
   for (std::uint32_t seed = 0; seed < 3000 && !HasFailure(); ++seed) {
     SCOPED_TRACE(seed);

@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: MIT
-// Recordings as macros: whatever the steps are, the macro made of them, run by the module and the
-// language's engine, leaves what the steps leave when they are applied one by one.
+// Macros made from random recordings have the effect of the steps.
 //
-// SCRIPTRUBY_TEST_RECORDINGS is how many are made for each language (1000; of VBScript, whose engine is
-// slow to come, 250), SCRIPTRUBY_TEST_SEED the first one's seed.
+// SCRIPTRUBY_TEST_RECORDINGS is the number for each language (1000; for VBScript, whose engine
+// starts slowly, 250). SCRIPTRUBY_TEST_SEED is the seed of the first one.
 #include <windows.h>
 
 #include <gtest/gtest.h>
@@ -38,8 +37,8 @@ json Bytes(const std::string& text) {
   return {{"bytes", bytes}};
 }
 
-// Makes steps and applies each to a document of its own. A call that turns out to be wrong becomes one
-// that changes nothing.
+// Generates steps and applies each to a document. A wrong call is replaced by one that changes
+// nothing.
 class RandomRecording {
  public:
   RandomRecording(std::uint32_t seed, const std::string& language)
@@ -56,11 +55,11 @@ class RandomRecording {
   }
 
  private:
-  // Those that the others are made with stand first.
+  // Initialised first: the others use them.
   std::mt19937 engine;
   const ResultEncoding encoding;
   const bool loneReturns;
-  const bool undoes;  // what undo takes back is certain only where all adjacent text is one call
+  const bool undoes;  // undo is comparable only when all adjacent text is one call
   FakeServices services;
   bool typing = false;
 
@@ -84,7 +83,7 @@ class RandomRecording {
         "__END__", "\"&", "\x7f", "\\x41", "*/",  "</a>", "\x1a", "\u2028", "\ufeff", "\v"};
     return loneReturns && !undoes && Below(15) == 0 ? "\r" : Of(pieces);
   }
-  // Of characters and, unless they would split a call, of bytes from `lowest` on.
+  // Characters and, unless they would split a call, bytes from `lowest` on.
   std::string Text(std::size_t pieces, std::size_t lowest = 1, std::size_t highest = 255) {
     std::string text;
     for (; pieces > 0; --pieces) {
@@ -107,7 +106,7 @@ class RandomRecording {
       const auto& [key, function] = Of(keys);
       return Call({{"key", key}}, function, {});
     }
-    // A long text has no first byte of a character, which the document could complete between calls.
+    // No incomplete character in a long text: the document could complete it between calls.
     const bool isLong = !undoes && Below(12) == 0;
     const std::string text = isLong ? Text(400 + Below(1200), 0x80, 0xBF) : Text(Below(8));
     Type(IsValidUtf8(text) ? json{{"text", text}} : Bytes(text), text);
@@ -154,7 +153,7 @@ class RandomRecording {
     Call({{"call", name}, {"arguments", list}}, function.name, arguments);
   }
 
-  // Mostly what such a parameter takes.
+  // Mostly a valid argument.
   StepArgument Argument(ParameterKind kind) {
     static const char* const words[] = {"", "ignore_case", "wrap", "selection", "unique"};
     static const char* const names[] = {"a", "ä", "\\s*", "^", "[^a]+", "\"", "\\\\"};
@@ -185,7 +184,7 @@ std::string StateOf(Editor& editor) {
   return state;
 }
 
-// The module and the engine of one language, and files to go through.
+// The module, the engine and the files of one language.
 class Runner {
  public:
   explicit Runner(const std::string& extension)

@@ -27,7 +27,7 @@ class Batch {
   ExitCode RunOne(const fs::path& input);
   ExitCode RunEach();
   void ShowProfile();
-  // What the user may have meant otherwise.
+  // Notes about unused input and arguments.
   void ShowUnused(ExitCode outcome);
 
  private:
@@ -39,15 +39,17 @@ class Batch {
   Reporter& reporter;
   const Language language;
   ScriptModule module;
-  EngineWatch engines;  // goes before the module, whose engines it may hold
+  EngineWatch engines;  // destroyed before the module, which its engines point to
   CallProfile profile;
   RunContext context;
 };
 
-// In bytes, unless somebody types it.
+// Typed text is read from the console, other text as bytes.
 std::string Batch::Read(const fs::path& input) {
   if (input != "-" || !IsTerminal(stdin)) return ReadInput(input);
-  reporter.Note("type the text; Ctrl+Z (under Wine Ctrl+D) and Enter in a line of its own end it");
+  reporter.Note(
+      "type the text; to end it, press Ctrl+Z (under Wine Ctrl+D) on an empty line, then "
+      "Enter");
   return ReadTerminalText();
 }
 
@@ -69,7 +71,7 @@ void Batch::Write(const fs::path& input, const std::string& bytes) {
     WriteStandardOutput(bytes);
 }
 
-// A file that cannot be read or written keeps no other from its turn.
+// If one file fails, the others are still processed.
 ExitCode Batch::RunGuarded(const fs::path& input) try {
   return RunOne(input);
 } catch (const UsageError& error) {
@@ -91,7 +93,7 @@ ExitCode Batch::RunEach() {
   std::string summary = std::to_string(succeeded) + " of " + std::to_string(options.inputs.size()) +
                         " files done, " + std::to_string(done - succeeded) + " failed";
   if (done < options.inputs.size())
-    summary += ", " + std::to_string(options.inputs.size() - done) + " not begun";
+    summary += ", " + std::to_string(options.inputs.size() - done) + " not started";
   reporter.Note(summary);
   return worst;
 }
@@ -103,12 +105,11 @@ void Batch::ShowProfile() {
 
 void Batch::ShowUnused(ExitCode outcome) {
   if (options.inputs.empty() && InputIsLeft())
-    reporter.Note(
-        "the macro began with an empty text; for the one of standard input name - behind it");
-  if (outcome != kSuccess) return;  // before it could ask
+    reporter.Note("the macro started with an empty text (use - as FILE to read standard input)");
+  if (outcome != kSuccess) return;  // it may have ended before it read them
   for (const auto& [name, value] : options.run.arguments)
     if (!context.argumentsRead.contains(name))
-      reporter.Note("--arg " + name + ": the macro has not asked for it");
+      reporter.Note("--arg " + name + ": the macro did not read it");
 }
 
 }  // namespace

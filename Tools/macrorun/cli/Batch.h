@@ -1,14 +1,13 @@
 // SPDX-License-Identifier: MIT
-// All runs of one call of the program: each text through the macro, as often as asked for, and to
-// where it belongs.
+// Runs a macro on the texts of the command line and writes the results.
 //
-// Errors: those of one text of several go to the reporter and into the exit code; UsageError for what
-// keeps all from running. Threading: the main thread.
+// Errors: with several texts, the errors of one go to the reporter and into the exit code;
+// UsageError for errors that prevent all runs. Threading: the main thread.
 #pragma once
 
 #include "cli/Options.h"
 #include "platform/ExitCode.h"
 #include "report/Reporter.h"
 
-// The worst of the exit codes. A stop and a fault end the whole.
+// Returns the highest exit code. A stop or a fault ends the batch.
 ExitCode RunBatch(const Options& options, Reporter& reporter);

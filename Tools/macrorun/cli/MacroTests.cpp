@@ -21,7 +21,7 @@ struct Test : MacroTest {
   enum class State { kNotBegun, kFailed, kDiffers, kPassed, kPromoted };
 
   explicit Test(const MacroTest& found) : MacroTest(found) {}
-  // Whether `made` is the macro's whole work.
+  // Whether the macro ended without an error, so that `made` is complete.
   bool Ran() const { return state == State::kDiffers || state == State::kPassed; }
 
   State state = State::kNotBegun;
@@ -34,14 +34,14 @@ bool Exists(const fs::path& path) {
   return fs::exists(path, error);
 }
 
-// What runs the macros of one language; one at a time.
+// Runs the macros of one language. One object at a time.
 struct LanguageHost {
   LanguageHost(const Options& options, const Language& hostLanguage)
       : language(hostLanguage), module(options.module, &language), engines(language.engine) {}
 
   const Language language;
   ScriptModule module;
-  EngineWatch engines;  // goes before the module, whose engines it may hold
+  EngineWatch engines;  // destroyed before the module, which its engines point to
 };
 
 class MacroTests {
@@ -66,11 +66,11 @@ class MacroTests {
   void Summarize();
   std::string Count(State state, const char* what) const;
 
-  Options options;  // with the macro of the present test
+  Options options;  // with the macro of the current test
   Reporter& reporter;
   std::vector<Test> tests;
   CallProfile profile;
-  std::wstring extension;  // the host's
+  std::wstring extension;  // of the host's language
   std::unique_ptr<LanguageHost> host;
 };
 
@@ -84,7 +84,7 @@ MacroTests::MacroTests(const Options& given, Reporter& runReporter)
 
 ExitCode MacroTests::Run() {
   const bool whole = RunAll();
-  // The other half of a test in two languages may be among those not begun.
+  // Only after all tests: several languages can share one NAME.out.
   if (options.promote && whole) Promote();
   Summarize();
   if (options.run.profile) reporter.Profile(profile.Table());
@@ -93,7 +93,7 @@ ExitCode MacroTests::Run() {
   return worst;
 }
 
-// Whether it came to the end.
+// False when a stop or a fault ended the tests.
 bool MacroTests::RunAll() {
   std::size_t number = 0;
   for (Test& test : tests) {
@@ -122,12 +122,12 @@ void MacroTests::RunOne(Test& test) {
   test.state = State::kFailed;
   test.code = RunGuarded(test);
   if (test.Ran()) return;
-  // The error itself says which macro.
+  // The error names the macro, but not the case.
   if (!test.textCase.empty()) reporter.Note("failed");
   reporter.TestEnd(false, {});
 }
 
-// A file that cannot be read keeps no other test from its turn.
+// If one test fails, the others still run.
 ExitCode MacroTests::RunGuarded(Test& test) try {
   options.run.macro = test.macro;
   const fs::path input = Exists(test.Input()) ? test.Input() : fs::path();
@@ -158,9 +158,9 @@ ExitCode MacroTests::Judge(Test& test) {
 
 void MacroTests::Compare(const Test& test, bool there, const std::string& text) {
   const std::string name = ToUtf8(test.Expected().filename());
-  const std::string missing = "no " + name + (options.promote ? "" : "; --promote writes it");
+  const std::string missing = "no " + name + (options.promote ? "" : " (create it with --promote)");
   reporter.Error(
-      PlainDiagnostic("test", test.macro, there ? "its text is not that of " + name : missing));
+      PlainDiagnostic("test", test.macro, there ? "the text differs from " + name : missing));
   reporter.TestEnd(false, CompareTexts(name, text, ToUtf8(test.macro.filename()), test.made));
 }
 
@@ -174,7 +174,7 @@ void MacroTests::Promote() {
       PromoteGroup(group);
 }
 
-// Tests with the same NAME.out, which some of them do not make.
+// Tests with the same NAME.out, which at least one of them does not match.
 void MacroTests::PromoteGroup(const Group& group) {
   const fs::path file = group.front()->Expected();
   std::string names;
@@ -185,7 +185,7 @@ void MacroTests::PromoteGroup(const Group& group) {
   }
   if (!agree)
     return reporter.Error(
-        PlainDiagnostic("test", file, "not promoted, since its macros disagree: " + names));
+        PlainDiagnostic("test", file, "not promoted: its macros make different texts: " + names));
   const ExitCode code = Write(file, group.front()->made);
   for (Test* test : group) {
     if (test->state != State::kDiffers) continue;
@@ -209,7 +209,7 @@ void MacroTests::Summarize() {
     if (test.state == State::kDiffers) test.state = State::kFailed;
   std::string summary = Count(State::kPassed, " passed, ") + Count(State::kFailed, " failed");
   if (options.promote) summary += ", " + Count(State::kPromoted, " promoted");
-  const std::string rest = Count(State::kNotBegun, " not begun");
+  const std::string rest = Count(State::kNotBegun, " not started");
   reporter.Note(summary + (rest.starts_with("0 ") ? "" : ", " + rest));
 }
 

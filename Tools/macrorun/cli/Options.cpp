@@ -28,13 +28,13 @@ constexpr char kFooter[] =
     "be read or written, 3 stopped or timed out, 4 fault. The text is written only\n"
     "after success. More in Docs/macrorun.md.";
 
-// Positionals stand in the usage.
+// Omits the positionals, which are in the usage.
 class HelpFormatter : public CLI::Formatter {
  public:
   std::string make_usage(const CLI::App*, std::string) const override {
     return kUsage + std::string("\n");
   }
-  // Without the value that a flag stands for.
+  // Without the default value of a flag.
   std::string make_option_name(const CLI::Option* option, bool positional) const override {
     const std::string name = CLI::Formatter::make_option_name(option, positional);
     return name.substr(0, name.find('{'));
@@ -50,13 +50,14 @@ class HelpFormatter : public CLI::Formatter {
   }
 };
 
-// What the library hands out as text, before it is what the program wants.
+// Option values as text, before Convert.
 struct Texts {
   std::string macro, input, output, description, module, log, test, record, errors = "text";
   std::vector<std::string> each, check, arguments;
 };
 
-// The library's own check tells the range of a text that is no number at all, and lets NaN pass.
+// Replaces the library's range check, which accepts NaN and reports the range for text that is no
+// number.
 template <class Number>
 CLI::Validator Between(Number least, Number most, const std::string& expected) {
   const auto check = [=](const std::string& text) -> std::string {
@@ -67,14 +68,14 @@ CLI::Validator Between(Number least, Number most, const std::string& expected) {
   return CLI::Validator(check, "");
 }
 
-// As an unset variable of a shell makes it; elsewhere an empty path stands for none.
+// Refuses an empty path, for example from an unset shell variable.
 const CLI::Validator kNotEmpty(
     [](const std::string& text) {
-      return std::string(text.empty() ? "expected a name, got an empty one" : "");
+      return std::string(text.empty() ? "expected a file name, got an empty text" : "");
     },
     "");
 
-// In the order that CLI::App::parse wants: the last argument first, without the program.
+// In the order of CLI::App::parse: the last argument first, without the program.
 std::vector<std::string> ReversedArguments() {
   std::vector<std::string> arguments;
   int count = 0;
@@ -89,7 +90,7 @@ std::vector<std::filesystem::path> Paths(const std::vector<std::string>& texts) 
   std::vector<std::filesystem::path> paths;
   for (const std::string& text : texts) {
     const std::vector<std::filesystem::path> files = FilesMatching(PathFromUtf8(text));
-    if (files.empty()) throw CLI::ValidationError(text, "there is no such file");
+    if (files.empty()) throw CLI::ValidationError(text, "no such file");
     paths.insert(paths.end(), files.begin(), files.end());
   }
   return paths;
@@ -98,18 +99,19 @@ std::vector<std::filesystem::path> Paths(const std::vector<std::string>& texts) 
 void AddTextOptions(CLI::App& app, Options& options, Texts& texts) {
   app.add_option("MACRO", texts.macro);
   CLI::Option* const file = app.add_option("FILE", texts.input)->check(kNotEmpty);
-  CLI::Option* const each = app.add_option("--each", texts.each, "Work on each of these files")
-                                ->type_name("FILE...")
-                                ->expected(1, 1 << 20)
-                                ->check(kNotEmpty)
-                                ->excludes(file)
-                                ->group("Text");
+  CLI::Option* const each =
+      app.add_option("--each", texts.each, "Run the macro on each of these files")
+          ->type_name("FILE...")
+          ->expected(1, 1 << 20)
+          ->check(kNotEmpty)
+          ->excludes(file)
+          ->group("Text");
   CLI::Option* const output = app.add_option("-o,--output", texts.output, "Write the text to FILE")
                                   ->type_name("FILE")
                                   ->check(kNotEmpty)
                                   ->excludes(each)
                                   ->group("Text");
-  app.add_flag("-i,--in-place", options.inPlace, "Replace the file, in one step at the end")
+  app.add_flag("-i,--in-place", options.inPlace, "Replace the file after success, in one step")
       ->excludes(output)
       ->group("Text");
 }
@@ -118,18 +120,18 @@ void AddMacroOptions(CLI::App& app, Options& options, Texts& texts) {
   const auto add = [&app](const char* name, auto& value, const char* type, const char* help) {
     return app.add_option(name, value, help)->type_name(type)->group("Macro");
   };
-  add("--arg", texts.arguments, "NAME=VALUE", "Argument for the macro; may be repeated")
+  add("--arg", texts.arguments, "NAME=VALUE", "Argument of the macro; may be repeated")
       ->allow_extra_args(false);
-  add("--answer", options.run.answers, "TEXT", "Answer to its next prompt; may be repeated")
+  add("--answer", options.run.answers, "TEXT", "Answer to a prompt; may be repeated")
       ->allow_extra_args(false);
-  add("--repeat", options.run.repeat, "N", "Run it N times over the same text")
-      ->check(Between(1u, 1000000000u, "a whole number from 1 on"));
-  add("--timeout", options.run.timeout, "SECONDS", "Stop it; prompts do not count")
-      ->check(Between(0.001, 1e9, "a number of seconds above 0, as in 2 or 0.5"));
-  app.add_flag("--keep-going", options.run.keepGoing, "Do not stop it for a wrong call")
+  add("--repeat", options.run.repeat, "N", "Run the macro N times on the same text")
+      ->check(Between(1u, 1000000000u, "a whole number of at least 1"));
+  add("--timeout", options.run.timeout, "SECONDS", "Stop a run after that time, prompts excluded")
+      ->check(Between(0.001, 1e9, "a number of seconds above 0, such as 2 or 0.5"));
+  app.add_flag("--keep-going", options.run.keepGoing, "Continue the macro after a wrong call")
       ->group("Macro");
   add("--engine", options.language.engine, "PROGID", "Script engine (default: by the extension)");
-  add("--description", texts.description, "FILE", "Language description with its engine")
+  add("--description", texts.description, "FILE", "Language description file")
       ->excludes("--engine");
   add("--module", texts.module, "FILE", "Module (default: scriptruby.dll beside macrorun)");
 }
@@ -138,42 +140,42 @@ void AddReportOptions(CLI::App& app, Options& options, Texts& texts) {
   const auto flag = [&app](const char* name, bool& value, const char* help) {
     app.add_flag(name, value, help)->group("Reports, on standard error");
   };
-  app.add_option("--errors", texts.errors, "As text, or as JSON objects, one a line")
+  app.add_option("--errors", texts.errors, "Text, or one JSON object per line")
       ->type_name("text|json")
       ->check(CLI::IsMember({"text", "json"}).description(""))
       ->group("Reports, on standard error");
   flag("--trace", options.run.trace, "Show every call, and the module's debug lines");
   flag("--profile", options.run.profile, "Show calls and time of each macro function");
-  app.add_option("--log", texts.log, "File for the module's failed assertions")
+  app.add_option("--log", texts.log, "Log file for the module's failed assertions")
       ->type_name("FILE")
       ->group("Reports, on standard error");
 }
 
 void AddTestOptions(CLI::App& app, Options& options, Texts& texts) {
   CLI::Option* const test =
-      app.add_option("--test", texts.test, "Run all macros in DIR, or one, over NAME.in");
+      app.add_option("--test", texts.test, "Test the macros in DIR, or one, with NAME.in");
   test->type_name("DIR|MACRO")->group("Tests");
   for (const char* name : {"MACRO", "FILE", "--each", "--output", "--in-place"})
     test->excludes(app.get_option(name));
-  app.add_flag("--promote", options.promote, "Then make each NAME.out the text of its macro")
+  app.add_flag("--promote", options.promote, "Replace each NAME.out by its macro's text")
       ->needs(test)
       ->group("Tests");
 }
 
 void AddOtherModes(CLI::App& app, Options& options, Texts& texts) {
   app.set_help_flag("-h,--help", "Show this help")->group("Instead of running");
-  app.add_option("--check", texts.check, "Report syntax errors of these macros")
+  app.add_option("--check", texts.check, "Report the syntax errors of these macros")
       ->type_name("MACRO...")
       ->expected(1, 1 << 20)
       ->group("Instead of running");
-  app.add_option("--record", texts.record, "Print a macro of these recorded steps (JSON)")
+  app.add_option("--record", texts.record, "Print a macro made from recorded steps (JSON)")
       ->type_name("STEPS")
       ->group("Instead of running");
   app.add_flag("--functions{text}", options.functions,
                "List the macro functions (=markdown: as a page)")
       ->check(CLI::IsMember({"text", "markdown"}).description(""))
       ->group("Instead of running");
-  app.add_flag("--stubs", options.stubs, "Write them as Ruby methods, for completion")
+  app.add_flag("--stubs", options.stubs, "Print them as Ruby methods, for completion")
       ->group("Instead of running");
   app.add_flag("--version", options.version, "Show the versions of macrorun and of the module")
       ->group("Instead of running");
@@ -205,7 +207,7 @@ void Convert(const Texts& texts, Options& options) {
   ReadArguments(texts.arguments, options);
 }
 
-// What there is to do instead of running a macro; nothing for running.
+// The option that replaces running a macro; empty for running.
 std::string Mode(const Options& options) {
   const std::pair<const char*, bool> modes[] = {{"--test", !options.test.empty()},
                                                 {"--record", !options.record.empty()},
@@ -216,36 +218,37 @@ std::string Mode(const Options& options) {
   std::string mode;
   for (const auto& [name, given] : modes) {
     if (given && !mode.empty())
-      throw CLI::ParseError(mode + " and " + name + " are two things to do", kWrongUsage);
+      throw CLI::ParseError(mode + " and " + name + " cannot be combined", kWrongUsage);
     if (given) mode = name;
   }
   return mode;
 }
 
-// What the library's own rules do not say.
+// Rules that the library cannot express.
 void CheckCombination(const Options& options) {
   const std::string mode = Mode(options);
   const bool records = mode == "--record";
   if (mode.empty() && options.run.macro.empty()) throw CLI::RequiredError("MACRO");
   if (records && !(options.run.macro.empty() && options.inputs.empty()))
-    throw CLI::ValidationError(mode, "takes no macro and no text; -o names the new macro");
+    throw CLI::ValidationError(mode, "takes no macro and no text (use -o to name the new macro)");
   if (mode == "--check" && !options.run.macro.empty())
-    throw CLI::ValidationError(mode, "name all macros behind it");
+    throw CLI::ValidationError(mode, "unexpected macro before it (name all macros after --check)");
   if (mode == "--check" && !(options.inputs.empty() && options.output.empty()))
-    throw CLI::ValidationError(mode, "reports only: it takes no text and no -o");
+    throw CLI::ValidationError(mode, "takes no text and no -o");
   if (!options.inPlace) return;
   if (options.inputs.empty()) throw CLI::ValidationError("--in-place", "needs a FILE to replace");
   for (const std::filesystem::path& input : options.inputs)
     if (input == "-") throw CLI::ValidationError("--in-place", "cannot replace standard input");
 }
 
-// Why the arguments `rest` have no place. Behind an unknown option right ones may have none, either.
+// The message for unexpected arguments. An unknown option is named first: it can make others
+// unexpected.
 std::string ExtrasText(const std::vector<std::string>& rest) {
   for (const std::string& argument : rest)
-    if (argument.starts_with('-')) return "there is no option " + argument;
-  std::string text = "there is no place for";
+    if (argument.starts_with('-')) return "unknown option " + argument;
+  std::string text = "unexpected arguments:";
   for (const std::string& argument : rest) text += " " + argument;
-  return text + " (several files stand behind --each)";
+  return text + " (use --each for several files)";
 }
 
 int Refuse(const std::string& text) {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The command line.
 //
-// Errors: ParseOptions tells the user what was wrong and answers an exit code.
+// Errors: ParseOptions prints the error and returns an exit code.
 // Units: seconds. Threading: the main thread.
 #pragma once
 
@@ -17,7 +17,7 @@ struct Options {
   RunOptions run;
   LanguageOptions language;
   std::vector<std::filesystem::path> inputs;  // none: an empty text; "-": standard input
-  bool each = false;                          // the inputs come from --each
+  bool each = false;                          // given by --each
 
   std::filesystem::path output;  // empty: standard output
   bool inPlace = false;
@@ -27,16 +27,16 @@ struct Options {
   bool jsonErrors = false;
   std::filesystem::path log;  // empty: none
 
-  std::filesystem::path test;  // the folder whose macros to test; empty: not given
+  std::filesystem::path test;  // a folder of macros, or one macro; empty: not given
   bool promote = false;
 
-  std::vector<std::filesystem::path> check;  // the macros to check; nothing is run
-  std::filesystem::path record;              // the steps to make a macro of; likewise
-  std::string functions;  // the form in which to list them, "text" or "markdown"; empty: not at all
+  std::vector<std::filesystem::path> check;  // the macros to check instead of running
+  std::filesystem::path record;              // the recording to convert instead of running
+  std::string functions;                     // "text" or "markdown"; empty: not given
   bool stubs = false;
   bool version = false;
 };
 
-// Reads the process's command line. An exit code when there is nothing to run: help was asked for,
-// or the command line is wrong (and the user has been told).
+// Parses the process's command line. Returns an exit code after --help and for a wrong command
+// line.
 std::optional<int> ParseOptions(Options& options);

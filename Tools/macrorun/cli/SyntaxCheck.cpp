@@ -27,7 +27,7 @@ struct Release {
 template <class Interface>
 using Held = std::unique_ptr<Interface, Release>;
 
-// As the module does it: each byte is a character.
+// One unit for each byte, as in the module.
 std::wstring Widened(const std::string& bytes) {
   std::wstring text;
   for (const char byte : bytes) text += static_cast<unsigned char>(byte);
@@ -43,19 +43,19 @@ class Checker {
 
  private:
   ExitCode Parse(const fs::path& macro, const std::string& engineName);
-  void Tell(const std::string& warnings, const fs::path& macro);
+  void ReportWarnings(const std::string& warnings, const fs::path& macro);
   HRESULT ParseWith(IActiveScript* engine, ParseSite& site, const std::wstring& text);
 
   const Options& options;
   Reporter& reporter;
-  std::unique_ptr<EngineWatch> watch;  // of the last macro's engine
+  std::unique_ptr<EngineWatch> watch;  // for the engine of the last macro
   std::string watched;
 };
 
 ExitCode Checker::Check(const fs::path& macro) try {
   const std::string engine = ChooseLanguage(options.language, macro).engine;
   if (!watch || watched != engine) {
-    watch.reset();  // one at a time
+    watch.reset();  // only one may exist
     watch = std::make_unique<EngineWatch>(engine);
     watched = engine;
   }
@@ -82,7 +82,7 @@ ExitCode Checker::Parse(const fs::path& macro, const std::string& engineName) {
   ErrorCapture warnings;
   result = ParseWith(engine.get(), site, text);
   engine->Close();
-  Tell(warnings.Take(), macro);
+  ReportWarnings(warnings.Take(), macro);
   if (std::optional<Diagnostic> error = site.TakeError())
     reporter.Error(std::move(*error));
   else if (FAILED(result))
@@ -91,8 +91,8 @@ ExitCode Checker::Parse(const fs::path& macro, const std::string& engineName) {
   return FAILED(result) ? kMacroFailed : kSuccess;
 }
 
-// An engine that parses only has nobody but the process to tell.
-void Checker::Tell(const std::string& warnings, const fs::path& macro) {
+// An engine that only parses writes its warnings to standard error.
+void Checker::ReportWarnings(const std::string& warnings, const fs::path& macro) {
   std::istringstream lines(warnings);
   for (std::string line; std::getline(lines, line);)
     reporter.Message(WithFile(line.substr(0, line.find('\r')), ToUtf8(macro)));
@@ -105,7 +105,7 @@ HRESULT Checker::ParseWith(IActiveScript* engine, ParseSite& site, const std::ws
   const Held<IActiveScriptParse> parser(created);
   result = engine->SetScriptSite(&site);
   if (SUCCEEDED(result)) result = parser->InitNew();
-  // By this name engines that know the module's way with text recognise it.
+  // Engines that handle the module's text as bytes recognise it by this name.
   if (SUCCEEDED(result)) result = engine->AddNamedItem(L"tarn", SCRIPTITEM_ISVISIBLE);
   EXCEPINFO exception = {};
   if (SUCCEEDED(result))

@@ -1,14 +1,15 @@
 // SPDX-License-Identifier: MIT
-// Checks macros for syntax errors: each is parsed by its script engine, which is never started. A small
-// Active Scripting host of its own, without the module.
+// Checks macros for syntax errors. Each is parsed by its script engine, which is never started.
+// This is a small Active Scripting host without the module.
 //
-// Errors: those of a macro go to the reporter and into the exit code, and so does a macro that cannot
-// be read. Threading: the main thread.
+// Errors: those of a macro, and a macro that cannot be read, go to the reporter and into the exit
+// code.
+// Threading: the main thread.
 #pragma once
 
 #include "cli/Options.h"
 #include "platform/ExitCode.h"
 #include "report/Reporter.h"
 
-// The worst of the exit codes of the options' macros.
+// Returns the highest exit code of the options' macros.
 ExitCode CheckMacros(const Options& options, Reporter& reporter);

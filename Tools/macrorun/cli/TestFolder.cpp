@@ -22,10 +22,10 @@ struct IgnoringCase {
   }
 };
 
-// The cases of each NAME that a macro has.
+// The cases of each NAME of a macro.
 using Cases = std::map<std::wstring, std::set<std::wstring, IgnoringCase>, IgnoringCase>;
 
-// By their names in the folder.
+// Returns names without the folder.
 std::vector<fs::path> FilesIn(const fs::path& folder) {
   std::vector<fs::path> files;
   std::error_code error;
@@ -43,7 +43,8 @@ bool IsInput(const fs::path& file) { return Folded(file.extension()) == L".in"; 
 
 bool IsText(const fs::path& file) { return IsInput(file) || Folded(file.extension()) == L".out"; }
 
-// Whether the text belongs to a macro. One for a misspelt case does not: it must not be promoted.
+// Whether the text belongs to a macro. NAME.CASE.out without NAME.CASE.in does not, because the
+// case may be misspelt and must not be promoted.
 bool AddCase(Cases& cases, const fs::path& folder, const fs::path& text) {
   const fs::path name = text.stem();
   if (const auto macro = cases.find(name); macro != cases.end()) {
@@ -81,7 +82,7 @@ TestFolder::TestFolder(const fs::path& given) {
   std::error_code error;
   const bool one = fs::is_regular_file(given, error);
   if (!fs::exists(given, error))
-    throw UsageError("there is no folder and no macro " + ToUtf8(given) + " (--test)");
+    throw UsageError("--test " + ToUtf8(given) + ": no such folder or macro");
   const fs::path folder = one ? given.parent_path() : given;
   const std::vector<fs::path> files = FilesIn(folder);
   std::vector<fs::path> macros;
@@ -91,7 +92,7 @@ TestFolder::TestFolder(const fs::path& given) {
   for (const fs::path& macro : macros) cases[macro.stem()];
   for (const fs::path& file : files)
     if (IsText(file) && !AddCase(cases, folder, file) && !one) orphans.push_back(folder / file);
-  if (macros.empty()) throw UsageError("no macros in " + ToUtf8(folder) + " (--test)");
+  if (macros.empty()) throw UsageError("--test " + ToUtf8(folder) + ": no macros in this folder");
   if (one) macros = {given.filename()};
   for (const fs::path& macro : macros) {
     auto& ofMacro = cases[macro.stem()];

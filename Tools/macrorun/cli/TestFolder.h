@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
-// Which tests a folder of macros holds, by the names of its files.
+// Finds the tests in a folder of macros by the names of its files.
 //
-// NAME.in and NAME.out belong to every macro NAME, in whatever language. So do NAME.CASE.in and
-// NAME.CASE.out, each CASE with an .in a test of its own, unless there is a macro NAME.CASE. A macro
-// without any file has one test all the same.
+// NAME.in and NAME.out belong to the macros NAME of all languages. NAME.CASE.in and NAME.CASE.out
+// are a further test of them, unless there is a macro NAME.CASE. A macro without such files has one
+// test.
 //
 // Errors: UsageError. Threading: any thread.
 #pragma once
@@ -17,20 +17,21 @@ struct MacroTest {
   std::filesystem::path Expected() const { return Beside(L".out"); }
 
   std::filesystem::path macro;
-  std::wstring textCase;  // empty: that of NAME.in
+  std::wstring textCase;  // empty: NAME.in
 
  private:
   std::filesystem::path Beside(const wchar_t* extension) const;
 };
 
 struct TestFolder {
-  // Of the macros in the folder whose extension tells their language; or of one macro, if `given` is one.
+  // `given` is a folder or a macro. In a folder, macros are the files with an extension of a known
+  // language.
   explicit TestFolder(const std::filesystem::path& given);
 
   std::vector<MacroTest> tests;  // by language, by name, by case
   std::vector<std::filesystem::path>
-      orphans;  // the texts of no macro; not looked for with one macro
+      orphans;  // texts without a macro; empty when `given` is a macro
 };
 
-// The same for all spellings of a file's name.
+// The name in lower case, to compare file names.
 std::wstring Folded(const std::filesystem::path& path);

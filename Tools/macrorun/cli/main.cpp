@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// macrorun: runs macros over texts outside the editor. It hosts the scripting module as the editor
-// does and offers the macro documents.
+// macrorun: runs macros on texts without the editor. It hosts the scripting module as the editor
+// does.
 //
 // Reader's path: main -> Batch (the texts) -> MacroRun (the host) -> HostLink (its Microsoft-ABI
 // side) -> ScriptModule (the exports) -> MacroFunctions (what a macro can call) -> Document.
@@ -32,7 +32,7 @@
 
 namespace {
 
-// Without a macro, an engine or a description there is only what the module finds by itself.
+// Without a macro, an engine or a description, the module uses the description that it finds.
 ExitCode PrintVersions(const Options& options) {
   std::optional<Language> language;
   if (!options.run.macro.empty() || !options.language.engine.empty() ||
@@ -43,7 +43,7 @@ ExitCode PrintVersions(const Options& options) {
   return kSuccess;
 }
 
-// To --output, or else to standard output.
+// Writes to --output, or to standard output.
 ExitCode Write(const Options& options, const std::string& text) {
   if (options.output.empty()) {
     WriteStandardOutput(text);
@@ -54,7 +54,7 @@ ExitCode Write(const Options& options, const std::string& text) {
   return kSuccess;
 }
 
-// A macro that does what was recorded; for Ruby unless something else is asked for.
+// Converts a recording to a macro; in Ruby unless the options choose another language.
 ExitCode WriteRecorded(const Options& options) {
   const std::vector<RecordedStep> steps = ReadRecording(options.record);
   const Language language =
@@ -63,7 +63,8 @@ ExitCode WriteRecorded(const Options& options) {
   return Write(options, MacroComposer(TemplatesOf(module, language)).Compose(steps));
 }
 
-// The module reads it when it is loaded, in the system's code page, and passes over what it cannot use.
+// The module reads the variable when it is loaded, in the ANSI code page, and ignores an invalid
+// path.
 void SetLog(const std::filesystem::path& file) {
   constexpr std::size_t kLongest = 255;
   if (file.empty()) return;
@@ -74,10 +75,10 @@ void SetLog(const std::filesystem::path& file) {
     throw UsageError(refused + "its folder does not exist");
   RequireReplaceable(path, false);
   const std::optional<std::filesystem::path> named = AnsiNamed(path);
-  if (!named) throw UsageError(refused + "the system's code page cannot name it");
+  if (!named) throw UsageError(refused + "the system's code page cannot represent it");
   if (ToAnsi(*named).size() > kLongest)
-    throw UsageError(refused + "the module takes " + std::to_string(kLongest) +
-                     " characters at most, with all folders");
+    throw UsageError(refused + "the full path has more than " + std::to_string(kLongest) +
+                     " characters");
   _wputenv_s(L"SCRIPTRUBY_LOG", named->c_str());
 }
 
@@ -103,9 +104,9 @@ ExitCode Fail(Reporter& reporter, const char* kind, const char* text, ExitCode c
 
 int main() {
   PrepareStandardError();
-  // A file that is no library is an error message, not a system dialog.
+  // Report a file that is not a library as an error, without a system dialog.
   SetErrorMode(SEM_FAILCRITICALERRORS | SEM_NOOPENFILEERRORBOX);
-  SetDllDirectoryW(L"");  // no library comes from the folder of the text
+  SetDllDirectoryW(L"");  // do not load libraries from the current directory
   Options options;
   if (const std::optional<int> finished = ParseOptions(options)) return *finished;
   Reporter reporter(options.jsonErrors ? Reporter::Form::kJson : Reporter::Form::kText);

@@ -8,7 +8,7 @@
 namespace {
 
 struct Character {
-  char32_t code;       // of an invalid byte 0
+  char32_t code;       // 0 for an invalid byte
   std::size_t length;  // in bytes
   bool valid;
 };
@@ -38,7 +38,7 @@ Character Decode(std::string_view text, std::size_t offset) {
 
 bool IsWordCharacter(char32_t code) {
   if (code < 0x80) return code == '_' || IsCharAlphaNumericW(static_cast<wchar_t>(code));
-  // The system classifies units of 16 bits; above them letters are those of ideographic planes.
+  // The system classifies 16-bit units. Above them, only the ideographic planes count as letters.
   if (code > 0xFFFF) return code >= 0x20000 && code < 0x40000;
   const wchar_t unit = static_cast<wchar_t>(code);
   WORD type = 0, marks = 0;

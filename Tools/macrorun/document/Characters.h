@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 // Characters in texts of bytes that are UTF-8 by convention.
 //
-// A character is a Unicode code point; each byte that belongs to no valid UTF-8 sequence (overlong
-// forms, surrogates and what lies above U+10FFFF are not valid) counts as one character of its own.
-// Offsets are in bytes from 0.
+// A character is a Unicode code point. A byte outside of a valid UTF-8 sequence counts as one
+// character; overlong forms, surrogates and values above U+10FFFF are not valid. Offsets are in
+// bytes from 0.
 #pragma once
 
 #include <cstddef>
@@ -18,13 +18,13 @@ std::size_t PreviousCharacter(std::string_view text, std::size_t offset);
 bool IsCharacterStart(std::string_view text, std::size_t offset);
 
 std::size_t CharacterCount(std::string_view text);
-// The offset behind the first `count` characters; the text's length when it has fewer.
+// The offset after the first `count` characters; the text's length when it has fewer.
 std::size_t OffsetOfCharacter(std::string_view text, std::size_t count);
 bool IsValidUtf8(std::string_view text);
 
-// Letters, digits, marks on them and the underscore make words.
+// Words consist of letters, digits, combining marks and underscores.
 bool IsWordAt(std::string_view text, std::size_t offset);
 
 enum class LetterCase { kUpper, kLower, kTitle };  // title: words begin with a capital
-// One character becomes one character, so "ß" has no capital. Invalid bytes stay.
+// Maps one character to one character, so "ß" has no capital. Invalid bytes stay.
 std::string WithCase(std::string_view text, LetterCase letterCase);

@@ -8,7 +8,7 @@
 
 namespace {
 
-// The text's lines: what stands between its line ends, so one at least.
+// The parts between the line ends; at least one.
 std::vector<std::string_view> Pieces(std::string_view text) {
   std::vector<std::string_view> pieces;
   for (;;) {
@@ -21,7 +21,7 @@ std::vector<std::string_view> Pieces(std::string_view text) {
   }
 }
 
-// Where a place goes when the text from `from` to `to` becomes one that ends at `end`.
+// The new position of `place` after the text from `from` to `to` became one that ends at `end`.
 Position Moved(Position place, const Edit::Change& change, bool forward) {
   const Position to = forward ? change.to : change.end;
   const Position end = forward ? change.end : change.to;
@@ -126,11 +126,11 @@ void Document::ReorderLines(std::size_t first, std::vector<std::size_t> order) {
   Apply(std::move(edit));
 }
 
-// Collects the lines that come of old text and replacements.
+// Builds new lines from old text and replacements.
 struct Document::NewText {
   const Document& document;
   std::vector<TextLine> done;
-  std::string open;  // the line in the making
+  std::string open;  // the unfinished line
 
   void AddOld(Position from, Position to) {
     for (; from.line < to.line; from = {from.line + 1, 0}) {
@@ -139,7 +139,7 @@ struct Document::NewText {
     }
     if (from < to) open.append(document.Line(from.line), from.offset, to.offset - from.offset);
   }
-  // The change that it makes.
+  // Returns the change that the replacement makes.
   Edit::Change Add(const Replacement& replacement) {
     const std::vector<std::string_view> pieces = Pieces(replacement.text);
     for (const std::string_view& piece : pieces) {
@@ -170,7 +170,7 @@ void Document::Replace(const std::vector<Replacement>& replacements) {
   text.AddOld(at, EndOfLine(at.line));
   const std::size_t last = std::min(at.line, lines.size());
   const bool ended = at.line <= lines.size() && (at.line < lines.size() || lastLineEnds);
-  // A line end written last has ended the last line, not begun another.
+  // A line end at the end of the text ends the last line and does not start another.
   edit.after.lastLineEnds = at.line < lines.size() ? lastLineEnds : ended || text.open.empty();
   const bool crlf = at.line <= lines.size() ? lines[last - 1].crlf : newLinesCrlf;
   if (ended || !text.open.empty()) text.done.push_back({std::move(text.open), crlf});
@@ -216,7 +216,7 @@ void Document::Apply(Edit edit) {
   if (!same) history.Add(std::move(edit));
 }
 
-// Puts lines into the place of `count` others that have lines behind them.
+// Replaces `count` lines, which are not the last ones.
 static void UpdateFlat(FlatText& flatText, std::size_t first, std::size_t count,
                        const std::vector<TextLine>& now) {
   auto& [text, starts, utf8] = flatText;
@@ -257,13 +257,13 @@ void Document::Exchange(const Edit& edit, bool forward) {
 }
 
 void Document::MovePlaces(const Edit& edit, bool forward) {
-  std::vector<std::size_t> moved(edit.order.size());  // to where each line goes
+  std::vector<std::size_t> moved(edit.order.size());  // the new index of each line
   for (std::size_t i = 0; i < moved.size(); ++i)
     moved[forward ? edit.order[i] : i] = forward ? i : edit.order[i];
   const auto move = [&](Position& place) {
     if (place.line >= edit.first && place.line - edit.first < moved.size())
       place.line = edit.first + moved[place.line - edit.first];
-    // In each of the two orders a change finds its coordinates in force.
+    // Each change is in coordinates that hold when the changes are applied in this order.
     if (forward)
       for (auto change = edit.changes.rbegin(); change != edit.changes.rend(); ++change)
         place = Moved(place, *change, true);
@@ -273,7 +273,7 @@ void Document::MovePlaces(const Edit& edit, bool forward) {
   };
   move(places.cursor);
   if (places.anchor) move(*places.anchor);
-  // Two ends that have changed places do not enclose what they did.
+  // A selection whose ends were exchanged by a reordering is dropped.
   if (places.anchor > places.cursor) places.anchor.reset();
   for (auto& [name, place] : places.marks) move(place);
 }

@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: MIT
 // The documents that macros work on, and what they share: the clipboard and the last match.
 //
-// Documents count from 1 in the order in which they were opened. The first one is the run's, never
-// closes and has the name that it was given; the others are the macros' own and go with the editor.
+// Documents count from 1 in the order in which they were opened. Document 1 belongs to the run and
+// cannot be closed. Macros open the others, which are closed with the editor.
 //
-// Steps: everything between BeginStep and EndStep, in every document, is one step of its undo
-// history. A run of a macro is one, a nested run one inside it, and so is each call of a function.
+// In every document, the changes between BeginStep and EndStep are one undo step. A macro run is a
+// step; in it each nested run and each function call is one.
 #pragma once
 
 #include <cstddef>
@@ -27,23 +27,24 @@ class Editor {
   std::size_t DocumentCount() const { return documents.size(); }
   std::size_t CurrentNumber() const { return current + 1; }
 
-  // `number` is from 1 to DocumentCount(). The name is empty for a document without a file.
+  // `number` is from 1 to DocumentCount(). The name of a document without a file is empty.
   const std::filesystem::path& Name(std::size_t number) const {
     return documents[number - 1]->name;
   }
   void SetName(std::size_t number, std::filesystem::path name);
   Document& At(std::size_t number) { return documents[number - 1]->document; }
   void Switch(std::size_t number) { current = number - 1; }
-  // Adds a document behind the others and makes it the current one.
+  // Appends a document and makes it the current one.
   void Open(Document document, std::filesystem::path name);
-  // `number` is not 1. The one before the closed one becomes the current one if that was it.
+  // `number` is not 1. If the current document is closed, the one before it becomes the current
+  // one.
   void Close(std::size_t number);
 
   void BeginStep();
   void EndStep();
 
   std::string clipboard;
-  // The texts of the last match, the whole and its groups; of a group without a part nothing.
+  // The texts of the last match: the match and its groups. A group that did not take part has none.
   std::vector<std::optional<std::string>> lastMatch;
 
  private:
@@ -56,7 +57,7 @@ class Editor {
   std::size_t steps = 0;  // open
 };
 
-// One step, from here to the end of the block.
+// One step until the end of the scope.
 class EditorStep {
  public:
   explicit EditorStep(Editor& owner) : editor(owner) { editor.BeginStep(); }

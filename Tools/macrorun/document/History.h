@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: MIT
-// What a document's changes need to be taken back.
+// The undo history of a document.
 //
-// Steps nest, and an inner step that has ended can be taken back on its own until the outer one
-// ends. A step that makes no change leaves nothing. The history forgets when it holds more than
-// kHistoryLimit bytes: everything before, and at their end the steps that were open then, since a
-// part of a step is not to be taken back as if it were the whole.
+// Steps nest. An inner step that has ended can be undone until the outer one ends. A step without a
+// change is not recorded. Above kHistoryLimit bytes the history drops all earlier steps. It also
+// drops the steps that are open then when they end, because undoing a part of a step would leave a
+// mixed text.
 #pragma once
 
 #include <cstddef>
@@ -20,7 +20,7 @@ struct TextLine {
   bool operator==(const TextLine&) const = default;
 };
 
-// One change of a document: old lines for new ones, and which places in them moved where.
+// One change of a document: the old and the new lines, and how positions in them moved.
 struct Edit {
   struct Change {
     Position from, to, end;  // the old text was from `from` to `to`, the new one ends at `end`
@@ -34,8 +34,8 @@ struct Edit {
   };
 
   std::size_t first;               // line
-  std::vector<Change> changes;     // in order, each as if those behind it were made and no other
-  std::vector<std::size_t> order;  // of lines that changed places: where each was, from `first`
+  std::vector<Change> changes;     // sorted; positions assume only the later ones
+  std::vector<std::size_t> order;  // of reordered lines: the old index of each, from `first`
   State before, after;
 };
 
@@ -47,21 +47,21 @@ class History {
  public:
   void Begin() { open.push_back({undo.size(), false}); }
   void End();
-  // A change outside of any step is a step of its own. Forgets what Undo took back.
+  // A change outside of any step is one step. Clears the redo list.
   void Add(Edit edit);
 
-  // The step to take back or to do again; null: none. The history counts it as done.
+  // Moves a step to the other list and returns it; null when there is none.
   const Step* Undo();
   const Step* Redo();
 
  private:
   struct OpenStep {
-    std::size_t start;  // its part of `undo`
-    bool cut;           // some of it is forgotten
+    std::size_t start;  // index in `undo`
+    bool cut;           // a part was dropped
   };
   void Forget();
 
   std::vector<Step> undo, redo;
   std::vector<OpenStep> open;
-  std::size_t bytes = 0;  // of `undo`, about
+  std::size_t bytes = 0;  // estimate for `undo`
 };

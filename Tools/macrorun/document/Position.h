@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Places in a document, and what passes in and out of it.
+// Positions in a document, and the data that it exchanges.
 #pragma once
 
 #include <compare>

@@ -21,7 +21,7 @@ PCRE2_SPTR Units(std::string_view text) { return reinterpret_cast<PCRE2_SPTR>(te
 
 bool IsDigit(char character) { return character >= '0' && character <= '9'; }
 
-// A pattern that matches the text itself.
+// A pattern that matches the text literally.
 std::string Quoted(const std::string& text) {
   std::string pattern;
   for (const char character : text) {
@@ -55,7 +55,7 @@ Regex::Regex(const std::string& given, Options options) : code(std::make_unique<
   bytes = options.plain && !IsValidUtf8(given);
   std::uint32_t flags = PCRE2_MULTILINE | PCRE2_NEVER_BACKSLASH_C;
   if (!bytes) flags |= PCRE2_UTF | PCRE2_UCP;
-  // It makes every match check the text up to the end.
+  // The flag makes every match check the rest of the text.
   if (!bytes && !unchecked) flags |= PCRE2_MATCH_INVALID_UTF;
   if (options.ignoreCase) flags |= PCRE2_CASELESS;
   std::unique_ptr<pcre2_compile_context, void (*)(pcre2_compile_context*)> context(
@@ -89,7 +89,7 @@ std::optional<Regex::Match> Regex::Find(std::string_view text, std::size_t from,
     if (count < 0) throw RegexError(ErrorText(count));
     const PCRE2_SIZE* ends = pcre2_get_ovector_pointer(code->match);
     const bool whole = IsCharacterStart(text, ends[0]) && IsCharacterStart(text, ends[1]);
-    if (bytes && !whole) {  // a part of a character
+    if (bytes && !whole) {  // inside a character
       from = ends[0] + 1;
       continue;
     }

@@ -9,7 +9,7 @@
 #include <optional>
 
 #include "document/Characters.h"
-#include "iLib/iComText.h"
+#include "functions/Limits.h"
 
 namespace {
 
@@ -69,7 +69,7 @@ ArgumentCheck::Value ArgumentCheck::Check(std::size_t index, ParameterKind kind)
   switch (kind) {
     case ParameterKind::kLine:
     case ParameterKind::kLastLine: {
-      if (lines == 0) Fail(index, "a line, but the document has none");
+      if (lines == 0) Fail(index, "an existing line (the document is empty)");
       const std::size_t first = kind == ParameterKind::kLine ? 1 : values.back().number;
       return {CheckNumber(index, first, lines, "a line number"), {}};
     }
@@ -109,8 +109,9 @@ std::size_t ArgumentCheck::CheckNumber(std::size_t index, std::size_t first, std
 
 std::string ArgumentCheck::CheckText(std::size_t index, ParameterKind kind) const {
   std::string text(arguments[index].text);
-  if (text.size() >= kNarrowLimit)
-    Fail(index, "at most 511 bytes (this may have been cut; pass it in pieces)");
+  if (text.size() > kLongestArgument)
+    Fail(index, "at most " + std::to_string(kLongestArgument) +
+                    " bytes (the text may have been cut; pass it in pieces)");
   if (kind == ParameterKind::kLineText && text.find('\n') != text.npos)
     Fail(index, "one line without a line end");
   if (kind == ParameterKind::kName && text.empty()) Fail(index, "a text that is not empty");
@@ -145,7 +146,7 @@ std::set<std::string_view> ArgumentCheck::Words(std::size_t index) const {
     rest.remove_prefix(word.size());
     const MacroParameter& parameter = function.parameters[index];
     if (std::find(parameter.words.begin(), parameter.words.end(), word) == parameter.words.end())
-      Fail(index, "words among " + WordList(parameter));
+      Fail(index, "only words of this list: " + WordList(parameter));
     words.insert(word);
   }
   return words;

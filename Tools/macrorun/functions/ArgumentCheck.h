@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: MIT
-// The arguments of one call of a macro function, checked against its parameters.
+// The arguments of one call of a macro function, checked against its parameters before it runs.
 //
-// Arguments are by index from 0, in the order of the function's parameters. Those that the caller
-// may ask for are given or optional; the checks are made before the function runs.
+// Arguments are indexed from 0 in the order of the parameters.
 #pragma once
 
 #include <cstddef>
@@ -16,8 +15,8 @@
 
 class ArgumentCheck {
  public:
-  // Throws WrongCall for what is wrong in the editor's current document; without an editor, for what
-  // would be wrong in any.
+  // Throws WrongCall for arguments that the editor's current document does not allow; without an
+  // editor, for those that no document allows.
   ArgumentCheck(const MacroFunction& function, std::span<const HostArgument> arguments,
                 const Editor* editor);
 
@@ -26,7 +25,7 @@ class ArgumentCheck {
   std::size_t Number(std::size_t index, std::size_t otherwise) const {
     return Has(index) ? values[index].number : otherwise;
   }
-  // Empty without one.
+  // Empty when the argument is missing.
   const std::string& Text(std::size_t index) const {
     static const std::string none;
     return Has(index) ? values[index].text : none;
@@ -34,7 +33,7 @@ class ArgumentCheck {
   // The words of an optional argument.
   std::set<std::string_view> Words(std::size_t index) const;
 
-  // Throws WrongCall, with the argument as it was given. Only before a change.
+  // Throws WrongCall with the given argument. Call it only before a change.
   [[noreturn]] void Fail(std::size_t index, const std::string& expected) const;
   [[noreturn]] void Fail(const std::string& expected) const;
 

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What the macro functions need beyond the documents: the user, the command line and the runner.
-// Implemented by the run (MacroRun), used by the functions (MacroFunctions).
+// What macro functions need besides the documents: the user, the command line and other macros.
+// RunServices implements it.
 //
 // Texts are bytes, UTF-8 by convention. Threading: the macro run's thread.
 #pragma once
@@ -15,13 +15,13 @@ class EditorServices {
 
   // Shows a line to the user.
   virtual void Message(const std::string& text) = 0;
-  // Asks the user; the proposal, if there is one, when there is nobody to ask. Nothing when there is no
-  // answer.
+  // Asks the user. Returns the proposal, if there is one, when no user can be asked, and nothing
+  // when there is no answer.
   virtual std::optional<std::string> Prompt(const std::string& question,
                                             const std::optional<std::string>& proposal) = 0;
-  // The value that the command line gives to a name; nothing without one.
+  // The value of --arg for a name; nothing without one.
   virtual std::optional<std::string> MacroArgument(const std::string& name) = 0;
-  // Runs another macro over the same documents, inside the present one; whether it succeeded. The
-  // path counts from the folder of the running macro.
+  // Runs another macro on the same documents, inside the current call; whether it succeeded. The
+  // path is relative to the folder of the calling macro.
   virtual bool RunMacro(const std::filesystem::path& macro) = 0;
 };

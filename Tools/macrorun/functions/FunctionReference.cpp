@@ -2,29 +2,37 @@
 #include "functions/FunctionReference.h"
 
 #include <algorithm>
+#include <cstdio>
 #include <string_view>
 
+#include "functions/Limits.h"
 #include "functions/MacroFunctions.h"
 
 namespace {
 
 constexpr char kMarkdownHead[] = R"(# Macro functions
 
-A macro calls them on `tarn`, in Ruby `@tarn`. `macrorun --functions=markdown` prints this page,
-`macrorun --functions` a line for each function.
+Call these functions on `tarn`, in Ruby on `@tarn`:
 
-Lines and columns count from 1, columns in characters; a line end is one character. The last place of
-a text is the start of the line after its last one. A number may be given as a text, a text as a number.
-A call with other arguments than these is a wrong call, which changes nothing and ends the macro. No text
-result may have more than 1,023 characters, no text argument more than 511 bytes: the module passes 512 and cuts
-what follows, so that a text of 512 may not be the whole one.
+```ruby
+@tarn.set_line(1, @tarn.get_line(1).upcase)
+```
+
+- Lines and columns count from 1. Columns count characters; a line end is one character.
+- The last position of a text is the start of the line after its last one.
+- A number may be given as a text, and a text as a number.
+- A call with other arguments than these is a wrong call. It changes nothing and ends the macro.
+- A text result holds at most %zu characters, a text argument at most %zu bytes. A longer argument
+  is refused, because the module may have cut it.
+
+`macrorun --functions=markdown` prints this page, `macrorun --functions` one line for each function.
 )";
 
 constexpr char kStubsHead[] =
-    R"(# The functions of Tarn for language servers, written by macrorun --stubs. A macro does not load this
-# file: its @tarn comes from the editor.
+    R"(# The functions of Tarn for language servers, written by macrorun --stubs. Macros do not load
+# this file: they get @tarn from the editor.
 
-# What a macro finds in @tarn.
+# The class of @tarn.
 class Tarn
 )";
 
@@ -34,7 +42,7 @@ constexpr char kStubsTail[] = R"(end
 @tarn ||= Tarn.new
 )";
 
-// A kind of parameter, for the two forms.
+// A kind of parameter in the page and in the stubs.
 struct KindText {
   const char* kind;
   const char* ruby;  // type
@@ -50,7 +58,7 @@ KindText TextOf(ParameterKind kind) {
     case ParameterKind::kLastLine:
       return {"number", "Integer", "an existing line, not before the first"};
     case ParameterKind::kColumn:
-      return {"number", "Integer", "a column of that line, or the one behind its last"};
+      return {"number", "Integer", "a column of that line, or the one after its last"};
     case ParameterKind::kCount:
       return {"number", "Integer", "0 or more"};
     case ParameterKind::kDocument:
@@ -62,7 +70,7 @@ KindText TextOf(ParameterKind kind) {
     case ParameterKind::kName:
       return {"text", "String", "a text that is not empty"};
     case ParameterKind::kWords:
-      return {"text", "String", "words with blanks between"};
+      return {"text", "String", "words with spaces between"};
     case ParameterKind::kTexts:
       break;
   }
@@ -71,7 +79,7 @@ KindText TextOf(ParameterKind kind) {
 
 std::string Accepted(const MacroParameter& parameter) {
   const std::string words = WordList(parameter);
-  return TextOf(parameter.kind).accepted + (words.empty() ? "" : ", of " + words);
+  return TextOf(parameter.kind).accepted + (words.empty() ? "" : ", from: " + words);
 }
 
 std::string Sentence(std::string text) {
@@ -108,10 +116,10 @@ std::string Options(const MacroFunction& function) {
 
 std::string ParameterTable(const MacroFunction& function) {
   if (function.parameters.empty()) return {};
-  std::string table = "\n| Parameter | Kind | Accepted | Left out |\n|---|---|---|---|\n";
+  std::string table = "\n| Parameter | Type | Accepted | Default |\n|---|---|---|---|\n";
   for (const MacroParameter& parameter : function.parameters) {
     table += std::string("| `") + parameter.name + "` | " + TextOf(parameter.kind).kind + " | " +
-             Accepted(parameter) + " | " + (parameter.Optional() ? parameter.otherwise : "") +
+             Accepted(parameter) + " | " + (parameter.Optional() ? parameter.defaultValue : "") +
              " |\n";
   }
   return table;
@@ -123,7 +131,7 @@ std::string MarkdownOf(const MacroFunction& function) {
          "\nResult: " + std::string(ResultName(function.result)) + ".\n";
 }
 
-// "(line, count = nil)": what is nil does not reach the editor, so it counts as left out.
+// "(line, count = nil)": the engine does not pass nil to the editor, so nil stands for the default.
 std::string RubyParameters(const MacroFunction& function) {
   std::string list;
   for (const MacroParameter& parameter : function.parameters) {
@@ -140,7 +148,7 @@ std::string ParameterTag(const MacroParameter& parameter) {
   if (parameter.Optional()) type += ", nil";
   std::string tag =
       std::string("  # @param ") + parameter.name + " [" + type + "] " + Accepted(parameter);
-  if (parameter.Optional()) tag += std::string("; left out: ") + parameter.otherwise;
+  if (parameter.Optional()) tag += std::string("; default: ") + parameter.defaultValue;
   return tag + "\n";
 }
 
@@ -165,7 +173,9 @@ std::string FunctionList() {
 }
 
 std::string FunctionMarkdown() {
-  std::string page = kMarkdownHead;
+  char head[sizeof kMarkdownHead + 16];
+  std::snprintf(head, sizeof head, kMarkdownHead, kLongestResult, kLongestArgument);
+  std::string page = head;
   ForEachFunction([&](std::string_view group) { page += "\n## " + std::string(group) + "\n"; },
                   [&](const MacroFunction& function) { page += MarkdownOf(function); });
   return page;

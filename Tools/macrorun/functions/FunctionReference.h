@@ -1,18 +1,17 @@
 // SPDX-License-Identifier: MIT
-// The table of macro functions (MacroFunctions.h) for people and their tools. Everything that is told
-// here comes from that table.
+// Documentation generated from the table of macro functions (MacroFunctions.h).
 //
 // Texts are UTF-8 with LF. Errors: none. Threading: any thread.
 #pragma once
 
 #include <string>
 
-// One line for each function, under its group.
+// One line for each function, by group.
 std::string FunctionList();
 
 // Docs/functions.md.
 std::string FunctionMarkdown();
 
-// A Ruby file with an empty method for each function, documented by YARD's tags, and the variable
-// @tarn. Language servers read it; macros never do.
+// A Ruby file for language servers: an empty method with YARD tags for each function, and the
+// variable @tarn. Macros do not load it.
 std::string FunctionStubs();

@@ -16,6 +16,6 @@ Position MacroCall::At(std::size_t lineIndex) const {
 std::size_t MacroCall::LineOrCursor(std::size_t index) {
   if (Has(index)) return Number(index);
   const std::size_t line = document().Cursor().line;
-  if (line > document().LineCount()) Fail("the cursor in a line, but it stands behind the last");
+  if (line > document().LineCount()) Fail("the cursor in a line, but it is after the last one");
   return line;
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// One call of a macro function: its checked arguments, and what the function works on.
+// One call of a macro function: its checked arguments, the editor and the services.
 #pragma once
 
 #include <cstddef>
@@ -7,7 +7,7 @@
 
 #include "functions/ArgumentCheck.h"
 
-// A number that fits: no document is as long as a script's integers go.
+// Documents are shorter than the largest integer of a script.
 inline MacroResult Answer(std::size_t number) { return static_cast<std::int32_t>(number); }
 
 class MacroCall : public ArgumentCheck {
@@ -20,8 +20,9 @@ class MacroCall : public ArgumentCheck {
   EditorServices& services;
   Document& document() { return editor.Current(); }
 
-  // Of the arguments line and column.
+  // The position given by the arguments line and column.
   Position At(std::size_t lineIndex) const;
-  // The line of an optional argument, by default the cursor's, which must be an existing one.
+  // The line of an optional argument, by default the cursor's. Throws WrongCall when that does not
+  // exist.
   std::size_t LineOrCursor(std::size_t index);
 };

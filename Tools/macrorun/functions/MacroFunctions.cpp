@@ -7,9 +7,9 @@
 #include <iterator>
 #include <numeric>
 
+#include "functions/Limits.h"
 #include "functions/MacroCall.h"
 #include "functions/groups/FunctionGroups.h"
-#include "iLib/iComText.h"
 #include "platform/Encoding.h"
 
 namespace {
@@ -26,22 +26,21 @@ std::vector<MacroFunction> AllFunctions() {
   return all;
 }
 
-// Why a macro would not receive this text as it is; empty when it would.
+// Why a macro would not receive this text unchanged; empty when it would.
 std::string WhyRejected(const std::string& text, ResultEncoding encoding) {
   const std::size_t length = WideLength(text);
-  if (length >= kWideLimit)
-    return std::to_string(length) +
-           " characters, and a macro receives at most 1023; get_text gives pieces of it";
-  if (text.find('\0') != text.npos) return "a zero byte, which would end it";
+  if (length > kLongestResult)
+    return std::to_string(length) + " characters, but a result holds at most " +
+           std::to_string(kLongestResult) + "; read it in pieces with get_text";
+  if (text.find('\0') != text.npos) return "a zero byte, which ends a text result";
   if (encoding == ResultEncoding::kBytes || LowBytesStay(text)) return {};
-  return "a byte from 0x80 to 0x9F, which the system's code page would change on its way to the "
-         "macro (in UTF-8, capital umlauts and dashes have one)";
+  return "a byte from 0x80 to 0x9F, which the system's code page changes on its way to the macro "
+         "(capital umlauts and dashes in UTF-8 have such a byte); use Ruby";
 }
 
-// How many characters have to be changed, added or left out to make one text the other, which is in
-// small letters; case does not count.
+// The Levenshtein distance, ignoring case. `to` is in lower case.
 std::size_t EditDistance(std::string_view from, std::string_view to) {
-  std::vector<std::size_t> row(to.size() + 1);  // from the text so far to each beginning of `to`
+  std::vector<std::size_t> row(to.size() + 1);  // distances to each prefix of `to`
   std::iota(row.begin(), row.end(), std::size_t{0});
   for (const char ch : from) {
     const int small = std::tolower(static_cast<unsigned char>(ch));
@@ -62,7 +61,7 @@ void CheckResult(const MacroFunction& function, const MacroCall& call, const Mac
   if (reason.empty()) return;
   const bool line = call.Has(0) && function.parameters.front().kind == ParameterKind::kLine;
   const std::string what = line ? "line " + std::to_string(call.Number(0)) : "the text";
-  throw WrongCall(function.name, 0, "a text that can pass to the macro",
+  throw WrongCall(function.name, 0, "a text that a result can hold",
                   std::string(function.name) + ": " + what + " has " + reason);
 }
 
@@ -88,7 +87,7 @@ std::string NoMacroFunction(std::string_view name) {
   const auto distance = [name](const MacroFunction& each) { return EditDistance(name, each.name); };
   const MacroFunction& nearest = *std::ranges::min_element(MacroFunctions(), {}, distance);
   const bool alike = distance(nearest) <= std::max<std::size_t>(1, name.size() / 4);
-  return std::string(name) + " is no macro function" +
+  return "unknown macro function " + std::string(name) +
          (alike ? "; did you mean " + std::string(nearest.name) + "?" : "") + " (see --functions)";
 }
 
@@ -97,7 +96,7 @@ MacroResult CallMacroFunction(std::uint32_t id, Editor& editor, EditorServices& 
   const std::span<const MacroFunction> functions = MacroFunctions();
   if (id < 1 || id > functions.size())
     throw WrongCall("", 0, "a macro function",
-                    "call of macro function " + std::to_string(id) + ", which does not exist");
+                    "unknown macro function number " + std::to_string(id));
   const MacroFunction& function = functions[id - 1];
   MacroCall call(function, editor, services, arguments);
   const EditorStep step(editor);

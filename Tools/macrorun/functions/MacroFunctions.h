@@ -1,18 +1,16 @@
 // SPDX-License-Identifier: MIT
 // The macro functions that a macro calls on `tarn`: one table of names, parameters, results and
-// help, from which the lookup, the argument checks and the documentation come. The functions
-// themselves stand by groups in functions/.
+// help. Lookup, argument checks and documentation use it. functions/groups has the functions.
 //
-// Lines and columns count from 1, columns in characters (Characters.h). Numbers may arrive as an
-// integer, as a real without fraction or as the text of a number (which is how a variable passed by
-// reference comes); texts may come from any kind of argument.
+// Lines and columns count from 1, columns in characters (Characters.h). A number is an integer, a
+// real without fraction, or the text of a number (the form of a variable passed by reference). Any
+// argument can be a text.
 //
-// A text that cannot pass between macro and host unchanged makes the call fail instead of changing
-// the document: the module cuts a text argument at 512 characters and a text result at 1023, and
-// widens results by the system's ANSI code page but narrows arguments by dropping high bytes, so
-// some bytes (0x80 to 0x9F in Western code pages) would come back as others unless the engine undoes
-// the widening. What cannot be seen from here is a character above U+00FF in an argument: the module
-// has already narrowed it. These limits are for what passes; inside the editor texts have none.
+// A call fails when the module would change a text on its way, so that no document is damaged. The
+// module cuts long texts (Limits.h). It widens results by the
+// system's ANSI code page but narrows arguments by dropping high bytes, so some bytes (0x80 to 0x9F
+// in Western code pages) come back changed unless the engine undoes the widening. A character above
+// U+00FF in an argument cannot be detected here, because the module has already narrowed it.
 #pragma once
 
 #include <cstddef>
@@ -28,7 +26,7 @@
 #include "functions/EditorServices.h"
 #include "functions/HostArgument.h"
 
-// A call that breaks a function's rules; the documents are unchanged. The text names the function.
+// A call that breaks a function's rules. The documents are unchanged. The text names the function.
 struct WrongCall : std::runtime_error {
   WrongCall(std::string functionName, std::size_t argumentIndex, std::string expectation,
             const std::string& text)
@@ -42,31 +40,32 @@ struct WrongCall : std::runtime_error {
   std::string expected;
 };
 
-// An integer, or a text for functions that answer one.
+// A text for functions that return one; otherwise an integer.
 using MacroResult = std::variant<std::int32_t, std::string>;
 
 enum class ParameterKind {
   kLine,       // an existing line
   kLineOrEnd,  // an existing line, or the one after the last
   kLastLine,   // an existing line, not before the one of the parameter before
-  kColumn,     // a column of the line of the parameter before, or the one behind its last
+  kColumn,     // a column of the line of the parameter before, or the one after its last
   kCount,      // 0 or more
   kDocument,   // the number of a document
   kText,
   kLineText,  // a text without line ends
   kName,      // a text that is not empty
-  kWords,     // options: some of the words of the parameter, with blanks between
+  kWords,     // options: words of the parameter, separated by spaces
   kTexts,     // any number of texts; the last parameter
 };
 
 struct MacroParameter {
   const char* name;
   ParameterKind kind;
-  // For the user: what holds when it is left out, as all behind it are then. Null: it must be given.
-  const char* otherwise = nullptr;
-  std::vector<std::string_view> words = {};  // of kWords: those that there are
+  // The default value, for the user; a parameter without one (null) is required. Only the last
+  // arguments of a call can be omitted.
+  const char* defaultValue = nullptr;
+  std::vector<std::string_view> words = {};  // the words that kWords allows
 
-  bool Optional() const { return otherwise != nullptr; }
+  bool Optional() const { return defaultValue != nullptr; }
 };
 
 enum class ResultKind { kNone, kNumber, kText };
@@ -77,28 +76,28 @@ struct MacroFunction {
   const char* name;
   std::vector<MacroParameter> parameters;
   ResultKind result;
-  const char* help;  // one line that can be understood alone; what it answers comes last
+  const char* help;  // one line; names the result last
   MacroResult (*run)(MacroCall& call);
   const char* group = "";  // filled in by the table
 };
 
-// All functions, group by group. Function n has the number n + 1.
+// All functions, by group. The id of a function is its index + 1.
 std::span<const MacroFunction> MacroFunctions();
 
-// The number of a function, in any case (some script languages know none); kUnknownId if there is
-// none. Never 0, which engines call for an object's default value.
+// The id of a function, or kUnknownId. Ignores case, as some script languages do. Never 0, which is
+// an object's default value in Active Scripting.
 std::uint32_t MacroFunctionId(std::string_view name);
-// What to say of such a name; with the function that may have been meant.
+// The message for an unknown name, with a suggestion if one is similar.
 std::string NoMacroFunction(std::string_view name);
 
-// How a script engine shows its macros a text result, which it gets in UTF-16 by the system's ANSI
-// code page.
+// How a script engine passes a text result, which it gets as UTF-16 by the ANSI code page, to a
+// macro.
 enum class ResultEncoding {
-  kCharacters,  // as that UTF-16
-  kBytes,       // as the bytes that the host gave
+  kCharacters,  // as UTF-16
+  kBytes,       // as the bytes of the host
 };
 
-// Carries out function `id` as one step of the editor. Throws WrongCall.
+// Calls function `id` as one undo step. Throws WrongCall.
 MacroResult CallMacroFunction(std::uint32_t id, Editor& editor, EditorServices& services,
                               std::span<const HostArgument> arguments, ResultEncoding encoding);
 

@@ -41,7 +41,7 @@ void DiagnosticCollector::Take(std::string_view report) noexcept {
 
 void DiagnosticCollector::TakeScriptError(Diagnostic error) {
   Run& run = runs.back();
-  // A macro may have caught the error of the unknown name, and this is another one.
+  // A macro can catch the error of the unknown name; then this is another error.
   const std::string& unknown = run.unknownFunction;
   const bool names = error.message.empty() || error.message.find(unknown) != std::string::npos;
   if (!unknown.empty() && names) {

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Understands the module's reports: passes the errors among them on to the reporter, each once and in
-// one form, and tells what they mean for the outcome of a run.
+// Parses the module's reports, passes each error once to the reporter, and keeps what decides the
+// outcome of a run.
 //
 // Ownership: the reporter is the caller's. Errors: none. Threading: the run's thread.
 #pragma once
@@ -14,7 +14,7 @@
 
 class DiagnosticCollector {
  public:
-  // One run, outermost or nested: its errors count for it alone.
+  // One run, outermost or nested. Its errors count for this run only.
   class Scope {
    public:
     Scope(DiagnosticCollector& owner, MacroName macro) : collector(owner) {
@@ -34,15 +34,15 @@ class DiagnosticCollector {
 
   // The first two inside a scope.
   void Take(std::string_view report) noexcept;
-  void Add(Diagnostic error);  // one that does not come from the module
-  // Where a macro was stopped; the first place counts.
+  void Add(Diagnostic error);  // an error from another source
+  // The place where a macro was stopped. The first one counts.
   void AddStop(Diagnostic place);
-  // For the outcome: with the macro's name alone where the place is not known.
+  // The place of the stop; empty when it is unknown.
   Diagnostic Stop() const { return stop; }
-  // What was held back comes out, unless the run was stopped and so had to fail.
+  // Reports a failure that had no error of its own, unless the run was stopped.
   void EndRun(bool stopped);
   bool ErrorSeen() const { return runs.back().errorSeen; }
-  // Of the present run, for the user.
+  // The macro of the current run, for the user.
   const std::string& File() const { return runs.back().macro.shown; }
   // In any run.
   bool Faulted() const { return faulted; }
@@ -50,8 +50,8 @@ class DiagnosticCollector {
  private:
   struct Run {
     MacroName macro;
-    std::string unknownFunction;  // called last and not yet part of an error
-    std::string followUp;         // says less than a script error
+    std::string unknownFunction;  // of the last call, until an error reports it
+    std::string followUp;         // "Error parsing" or "Error executing"; a script error says more
     bool errorSeen;
   };
 

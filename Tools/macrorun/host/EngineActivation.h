@@ -1,11 +1,12 @@
 // SPDX-License-Identifier: MIT
 // Makes COM find EngineFactory under the ProgID of a script engine, and creates the real engine.
 //
-// For an engine that is registered, the class object is registered in this process under the engine's
-// class. The Ruby engine in the folder `ruby` beside this program is not registered anywhere.
-// Activation contexts take precedence over classes registered in the process. So a manifest inside
-// macrorun.exe names the program itself as the engine's server (DllGetClassObject). Under another file
-// name the program cannot use that manifest: it runs Ruby macros, but cannot interrupt them.
+// For an engine that is registered, the class object is registered in this process under the
+// engine's class. The Ruby engine in the folder `ruby` beside this program is not registered
+// anywhere. Activation contexts take precedence over classes registered in the process. So a
+// manifest inside macrorun.exe names the program itself as the engine's server (DllGetClassObject).
+// Under another file name the program cannot use that manifest: it runs Ruby macros, but cannot
+// interrupt them.
 //
 // Errors: UsageError for a manifest that the system refuses.
 // Threading: the thread that runs macros; one object at a time.

@@ -2,8 +2,8 @@
 // The class object through which COM creates this program's script engines. There is one for the
 // process, because COM also gets it through the exported DllGetClassObject.
 //
-// Ownership: it lives as long as the program; references are not counted. Threading: the thread that
-// runs macros.
+// Ownership: it lives as long as the program; references are not counted. Threading: the thread
+// that runs macros.
 #pragma once
 
 #include <windows.h>

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Keeps the script engines of this program within reach. The module creates an engine by its ProgID and
-// gets a proxy of it, which is in the list of running engines until its final release.
+// Keeps the script engines of this program within reach. The module creates an engine by its ProgID
+// and gets a proxy of it, which is in the list of running engines until its final release.
 //
 // Errors: UsageError for a manifest that the system refuses.
 // Threading: one object at a time, on the thread that runs macros.

@@ -14,7 +14,7 @@ static_assert(kTextArgument == static_cast<u32>(xArgument::kText) &&
                   kRealArgument == static_cast<u32>(xArgument::kReal),
               "the kind passes unchanged");
 
-// Constructs in place: the record's lists stand at offsets that no compiler would choose.
+// Placement new, because the record's lists are at fixed offsets.
 inline void* operator new(size_t, void* place) noexcept { return place; }
 
 struct HostLink final : HostInterface {
@@ -25,7 +25,7 @@ struct HostLink final : HostInterface {
   HostContext* Context() override { return &record; }
   void ReportMessage(const char* text) override { callbacks.report(callbacks.context, text); }
   void __cdecl DebugOutput(const char* format, ...) override;
-  // What an editor makes of these flags is its own affair; this host takes every text as it is.
+  // Each editor defines what these flags mean. This host does not change texts.
   void SetFixCRLF(u8) override {}
   void SetFixDelimiter(u8) override {}
   void Unused6() override {}
@@ -63,8 +63,9 @@ void __cdecl HostLink::DebugOutput(const char* format, ...) {
   callbacks.trace(callbacks.context, line.Text());
 }
 
-// No object with a destructor may live in this function: Stop() does not return. The stop request
-// may come from another thread at any time; what comes too late for this call is seen at the next.
+// No object with a destructor may live in this function, because Stop() does not return. Another
+// thread can request a stop at any time; a request after the last check takes effect at the next
+// call.
 void HostLink::CallFunction(u32 id) {
   HostLinkSetInteger(this, 0);
   if (!record.stopRequested) {

@@ -38,7 +38,7 @@ bool IsRubyMacro(const fs::path& macro) {
   return _wcsicmp(macro.extension().c_str(), L".rbs") == 0;
 }
 
-// The description of the language that has the macro's extension; there may be none.
+// The description for the macro's extension; the file may be missing.
 fs::path DescriptionFor(const fs::path& macro) {
   const std::wstring extension = macro.extension().wstring();
   const std::wstring language = extension.empty() ? extension : extension.substr(1);
@@ -51,8 +51,8 @@ Language Described(const fs::path& description) { return {description, EngineOf(
 
 Language ChooseLanguage(const LanguageOptions& options, const fs::path& macro) {
   if (options.engine.size() > kLongestEngine)
-    throw UsageError("--engine " + options.engine + ": the module takes " +
-                     std::to_string(kLongestEngine) + " characters at most");
+    throw UsageError("--engine " + options.engine + ": the name has more than " +
+                     std::to_string(kLongestEngine) + " characters");
   if (!options.engine.empty()) return {{}, options.engine};
   if (!options.description.empty()) {
     RequireReadable(options.description, "language description (--description)");
@@ -63,10 +63,10 @@ Language ChooseLanguage(const LanguageOptions& options, const fs::path& macro) {
   if (HasLanguage(macro)) return Described(file);
   if (_wcsicmp(macro.extension().c_str(), L".rb") == 0)
     throw UsageError(ToUtf8(macro) +
-                     ": the names of Ruby macros end in .rbs; rename it, or name the "
-                     "engine with --engine RubyScript");
+                     ": the name of a Ruby macro ends in .rbs; rename the file, or use "
+                     "--engine RubyScript");
   throw UsageError("no language description for " + ToUtf8(macro) + " (" + ToUtf8(file) +
-                   "); name the engine with --engine, or a description with --description");
+                   "); use --engine or --description");
 }
 
 bool IsRubyEngine(std::string_view engine) {

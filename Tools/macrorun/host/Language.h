@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
-// Which script engine runs a macro, and the description file that tells the module so.
+// The script engine of a macro, and the language description that the module reads.
 //
-// Errors: UsageError, which says what to name instead.
+// Errors: UsageError, which names the options to use.
 // Threading: any thread.
 #pragma once
 
@@ -20,13 +20,13 @@ bool IsRubyEngine(std::string_view engine);
 struct Language {
   bool IsRuby() const { return IsRubyEngine(engine); }
 
-  std::filesystem::path description;  // empty: one that names the engine only
+  std::filesystem::path description;  // empty: write one with the engine only
   std::string engine;                 // ProgID
 };
 
-// In this order: --engine, --description, the macro's extension (.rbs is Ruby, any other has a
-// description of its name in the program's folder `languages`).
+// Uses --engine, else --description, else the macro's extension: .rbs is Ruby, and .EXT is
+// described by EXT.qwsh in the program's folder `languages`.
 Language ChooseLanguage(const LanguageOptions& options, const std::filesystem::path& macro);
 
-// Whether the macro's extension tells the language, in the third of these ways.
+// Whether the macro's extension determines the language.
 bool HasLanguage(const std::filesystem::path& macro);

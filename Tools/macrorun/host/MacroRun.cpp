@@ -38,7 +38,7 @@ class MacroRun final : public NestedRunner {
   };
   using Arguments = std::vector<HostArgument>;
 
-  // The callbacks. None may let an exception out.
+  // The callbacks. No exception may leave them.
   static MacroRun& From(void* context) { return *static_cast<MacroRun*>(context); }
   static void OnReport(void* context, const char* text) { From(context).diagnostics.Take(text); }
   static void OnTrace(void* context, const char* text) { From(context).TraceLine(text); }
@@ -65,7 +65,7 @@ class MacroRun final : public NestedRunner {
   const ResultEncoding encoding;
   std::map<std::uint32_t, std::string> names;
   DiagnosticCollector diagnostics;
-  bool leftByJump = false;  // an engine that must not be touched any more
+  bool leftByJump = false;  // a stop has left an engine that must not be used
   std::unique_ptr<HostLink, DestroyLink> link;
   std::unique_ptr<RunControl> control;
   RunServices services;
@@ -98,7 +98,7 @@ ExitCode MacroRun::Outcome(bool succeeded) {
   const RunControl::Cause cause = control->StopCause();
   control.reset();
   if (diagnostics.Faulted()) return kFault;
-  // A request that came too late for a macro that has ended does not count.
+  // A stop request that came after the end of the macro does not count.
   if (cause != RunControl::Cause::kNone && !succeeded) {
     Diagnostic report = diagnostics.Stop();
     report.kind = "stop";
@@ -110,7 +110,7 @@ ExitCode MacroRun::Outcome(bool succeeded) {
   return succeeded ? kSuccess : kMacroFailed;
 }
 
-// One `execute`, outermost or nested: whether the macro has succeeded.
+// Calls `execute`, for the outermost or a nested run; whether the macro succeeded.
 bool MacroRun::Execute(const fs::path& macro) {
   const std::string name = ScriptModule::NameOf(macro);
   const DiagnosticCollector::Scope scope(diagnostics, {name, ToUtf8(macro)});
@@ -121,7 +121,7 @@ bool MacroRun::Execute(const fs::path& macro) {
   leftByJump |= HostLinkStopCause(link.get()) != kNotStopped;
   const bool stopped = control->StopCause() != RunControl::Cause::kNone;
   diagnostics.EndRun(stopped);
-  // An engine may count a macro as run although it has reported an error in it.
+  // An engine can report an error and return success.
   return result == 1 && !diagnostics.ErrorSeen();
 }
 
@@ -189,9 +189,9 @@ MacroResult MacroRun::Perform(std::uint32_t id, const std::string& name,
   }
 }
 
-// Whether the macro goes on.
+// Whether the macro continues.
 bool MacroRun::WrongCallMade(const std::string& name, const WrongCall& wrong) {
-  if (control->StopCause() != RunControl::Cause::kNone) {  // as of a prompt without its answer
+  if (control->StopCause() != RunControl::Cause::kNone) {  // an interrupted prompt
     Stopping();
     return false;
   }

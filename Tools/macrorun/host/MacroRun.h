@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: MIT
-// One run of a macro over documents: this program's side of the host macro interface.
+// Runs a macro on documents, as the host of the scripting module.
 //
 // Ownership: everything in the context is the caller's. Errors: those of the macro go to the
-// reporter and into the exit code; UsageError for a macro that cannot be read, or that the module
-// cannot name.
+// reporter and into the exit code; UsageError for a macro whose path the module cannot represent.
 // Threading: the thread that loaded the module.
 #pragma once
 
@@ -19,7 +18,7 @@
 #include "report/CallProfile.h"
 #include "report/Reporter.h"
 
-// What stays the same from run to run.
+// What the runs of one macro share.
 struct RunContext {
   const RunOptions& options;
   ScriptModule& module;
@@ -27,9 +26,9 @@ struct RunContext {
   RunningEngines& engines;
   Reporter& reporter;
   CallProfile& profile;
-  std::set<std::string> argumentsRead = {};  // the names that macros have asked for
+  std::set<std::string> argumentsRead = {};  // the names that macros have read
 };
 
-// Runs the options' macro, which changes the editor's documents, as often as they say and until a run
-// fails. Each run is one step.
+// Runs the options' macro as often as they say, until a run fails. Each run is one undo step of the
+// editor's documents.
 ExitCode RunMacro(RunContext& context, Editor& editor);

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
-// The site of a script engine that only parses: it keeps the first error.
+// The script site of an engine that only parses a macro. It keeps the first error.
 //
-// Ownership: the caller's, which closes the engine first; references are not counted.
+// Ownership: the caller owns it and closes the engine first; references are not counted.
 // Errors: HRESULTs. Threading: the engine's thread.
 #pragma once
 

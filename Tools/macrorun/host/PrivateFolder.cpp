@@ -65,7 +65,7 @@ PrivateFolder::PrivateFolder() {
     path = candidate;
     return;
   }
-  throw UsageError("cannot make a folder in the temporary folder " + ToUtf8(parent) + ": " +
+  throw UsageError("cannot create a folder in the temporary folder " + ToUtf8(parent) + ": " +
                    error.message());
 }
 
@@ -74,10 +74,10 @@ PrivateFolder::~PrivateFolder() {
     std::error_code error;
     RemoveFolder(path, error);
     if (error)
-      std::fprintf(stderr, "macrorun: the temporary folder %s is left behind: %s\n",
+      std::fprintf(stderr, "macrorun: cannot remove the temporary folder %s: %s\n",
                    ToUtf8(path).c_str(), error.message().c_str());
   } catch (...) {
-    std::fputs("macrorun: no memory to remove the temporary folder; a later run does\n", stderr);
+    std::fputs("macrorun: out of memory; the next run removes the temporary folder\n", stderr);
   }
 }
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
-// A folder under the user's temporary folder for a copy of the module and of its language description.
-// It is removed with the object. A process that is killed leaves its folder to the next run.
+// A folder under the user's temporary folder for a copy of the module and of its language
+// description. It is removed with the object. A process that is killed leaves its folder to the
+// next run.
 //
 // Errors: UsageError. Threading: one thread.
 #pragma once

@@ -4,16 +4,19 @@
 #include <oleauto.h>
 
 #include "platform/Encoding.h"
+#include "report/Diagnostic.h"
 
-// Active Scripting has no call for this, so the engine evaluates an expression. The frames after the
-// macro's top level belong to the macros that wait for it.
+// Active Scripting has no call for this, so the engine evaluates an expression. The frames after
+// the macro's top level belong to the macros that wait for it.
 std::string RubyCallChain(IActiveScriptParse& engine) {
-  constexpr wchar_t kExpression[] =
-      L"caller.grep(/\\Amacro:/).grep_v(/in `method_missing'\\z/).slice_after(/in `<compiled>'\\z/)"
+  const std::wstring macro = PathFromUtf8(kRubyMacroName).wstring();
+  const std::wstring expression =
+      L"caller.grep(/\\A" + macro +
+      L":/).grep_v(/in `method_missing'\\z/).slice_after(/in `<compiled>'\\z/)"
       L".first.to_a.first(20).join(\"\\n\").gsub(\"<compiled>'\", \"<main>'\")";
   VARIANT chain;
   VariantInit(&chain);
-  const HRESULT result = engine.ParseScriptText(kExpression, nullptr, nullptr, nullptr, 0, 0,
+  const HRESULT result = engine.ParseScriptText(expression.c_str(), nullptr, nullptr, nullptr, 0, 0,
                                                 SCRIPTTEXT_ISEXPRESSION, &chain, nullptr);
   std::string text;
   if (SUCCEEDED(result) && chain.vt == VT_BSTR)

@@ -8,6 +8,6 @@
 
 #include <string>
 
-// "macro:3:in `f'" a line, innermost first, without the macros that run this one; empty when the engine
-// reports an error. Call it on the engine's thread, during a call of a macro function.
+// "macro:3:in `f'" a line, innermost first, without the macros that run this one; empty when the
+// engine reports an error. Call it on the engine's thread, during a call of a macro function.
 std::string RubyCallChain(IActiveScriptParse& engine);

@@ -12,12 +12,12 @@ using namespace std::chrono_literals;
 
 namespace {
 
-// How long a macro may take to make its next call, and what an engine gets to end it.
+// The time for the macro's next call, and the time for an interrupted engine to end.
 constexpr auto kTimeToCall = 100ms;
 constexpr auto kTimeToEnd = 1000ms;
 constexpr int kAttempts = 3;
 
-// The run that Ctrl+C is for; the lock is held while it is asked.
+// The run that Ctrl+C stops. The lock is held during RequestStop.
 std::mutex currentLock;
 RunControl* current = nullptr;
 
@@ -29,7 +29,7 @@ RunControl* current = nullptr;
 BOOL WINAPI OnConsoleEvent(DWORD event) {
   if (event != CTRL_C_EVENT && event != CTRL_BREAK_EVENT) return FALSE;
   const std::lock_guard guard(currentLock);
-  if (!current || !current->Ask()) EndProgram();
+  if (!current || !current->RequestStop()) EndProgram();
   return TRUE;
 }
 
@@ -83,14 +83,14 @@ RunControl::Cause RunControl::StopCause() {
   return cause;
 }
 
-bool RunControl::Ask() {
+bool RunControl::RequestStop() {
   {
     const std::lock_guard guard(lock);
     if (cause == Cause::kUser) return false;
     cause = Cause::kUser;
   }
   changed.notify_all();
-  reporter.Note("stopping the macro; Ctrl+C again ends the program at once");
+  reporter.Note("stopping the macro; press Ctrl+C again to end the program");
   return true;
 }
 
@@ -111,7 +111,7 @@ void RunControl::AwaitCause(std::unique_lock<std::mutex>& hold) {
   }
 }
 
-// The lock is not held while others are called.
+// Releases the lock for calls of other objects.
 void RunControl::Stop(std::unique_lock<std::mutex>& hold) {
   hold.unlock();
   module.Kill();
@@ -120,7 +120,7 @@ void RunControl::Stop(std::unique_lock<std::mutex>& hold) {
   if (changed.wait_for(hold, kTimeToCall, isEnded)) return;
   for (int attempt = 1; !ended; ++attempt) {
     hold.unlock();
-    module.Kill();  // a run that had only begun, or one nested into it
+    module.Kill();  // again, for a nested run or one that had just started
     engines.Interrupt();
     hold.lock();
     changed.wait_for(hold, kTimeToEnd, isEnded);

@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: MIT
-// Stops a run that is under way: at Ctrl+C, and when its time is over. It first asks the host through
-// the module's `kill`, so that the macro's next call stops it; a macro that makes none within a
-// tenth of a second is interrupted through its engine. A second Ctrl+C, and one outside a run, ends
-// the program. So does a timeout when no engine can be interrupted.
+// Stops a run at Ctrl+C or after its timeout. It first calls the module's `kill`, so that the
+// macro's next call stops it. If the macro makes no call within a tenth of a second, its engine is
+// interrupted. A second Ctrl+C, or one outside of a run, ends the program. So does a timeout when
+// no engine can be interrupted.
 //
-// Ownership: module, engines and reporter are the caller's and outlive the object.
-// Units: seconds. Threading: made and destroyed on the run's thread, one object at a time; it has a
-// thread of its own, and Ctrl+C arrives on one of the console's.
+// Ownership: module, engines and reporter belong to the caller and outlive the object.
+// Units: seconds. Threading: the run's thread creates and destroys it, one object at a time. It
+// watches on a second thread, and the console reports Ctrl+C on a third.
 #pragma once
 
 #include <chrono>
@@ -22,7 +22,7 @@ class RunControl {
  public:
   enum class Cause { kNone, kUser, kTimeout };
 
-  // For the whole program, once: Ctrl+C comes here.
+  // Handles Ctrl+C for the program. Call it once.
   static void CatchInterrupts();
 
   // `timeout` 0: none.
@@ -31,14 +31,14 @@ class RunControl {
   RunControl(const RunControl&) = delete;
   RunControl& operator=(const RunControl&) = delete;
 
-  // Time that does not count, while a prompt waits for the user.
+  // Exclude the time of a prompt from the timeout.
   void Pause();
   void Resume();
 
   Cause StopCause();
 
-  // On the console's thread; false: it had been asked before.
-  bool Ask();
+  // Requests a stop, on the console's thread. False: a stop was requested before.
+  bool RequestStop();
 
  private:
   using Clock = std::chrono::steady_clock;

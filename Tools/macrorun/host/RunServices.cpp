@@ -13,7 +13,7 @@ namespace fs = std::filesystem;
 
 namespace {
 
-// Far below what the stack holds.
+// Far below the limit of the stack.
 constexpr std::size_t kDeepest = 16;
 
 // Why a macro cannot be run; empty when it can.
@@ -60,9 +60,9 @@ bool RunServices::RunMacro(const fs::path& macro) {
   std::error_code error;
   std::string reason;
   if (!fs::is_regular_file(file, error))
-    reason = "there is no macro " + ToUtf8(file);
+    reason = "no such macro: " + ToUtf8(file);
   else if (macros.size() >= kDeepest)
-    reason = "macros run each other more than " + std::to_string(kDeepest) + " deep";
+    reason = "run_macro is nested more than " + std::to_string(kDeepest) + " deep";
   else
     reason = Unreadable(file);
   if (reason.empty()) return nested.RunNested(file);

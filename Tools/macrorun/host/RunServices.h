@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
-// What macro functions get from this program: the user, the command line, and other macros.
+// Implements EditorServices with the user's terminal, the command line and nested runs.
 //
-// Ownership: everything it is made with is the caller's. Threading: the run's thread.
+// Ownership: the constructor's arguments belong to the caller. Threading: the run's thread.
 #pragma once
 
 #include <filesystem>
@@ -15,7 +15,7 @@
 
 class RunControl;
 
-// Runs a macro inside the present call; whether it has succeeded.
+// Runs a macro inside the current call; whether it succeeded.
 class NestedRunner {
  public:
   virtual ~NestedRunner() = default;
@@ -24,21 +24,21 @@ class NestedRunner {
 
 class RunServices final : public EditorServices {
  public:
-  // The names of arguments that macros ask for are added to the set.
+  // Adds the names of the arguments that macros read to the set.
   RunServices(const RunOptions& runOptions, Reporter& runReporter, NestedRunner& runner,
               std::set<std::string>& namesRead)
       : options(runOptions), reporter(runReporter), nested(runner), argumentsRead(namesRead) {}
 
-  // Whose time stands still while the user is asked; before the first prompt.
+  // Its timeout is paused during prompts. Call it before the first prompt.
   void SetControl(RunControl* runControl) { control = runControl; }
-  // Around each run.
+  // Enclose each run.
   void EnterMacro(const std::filesystem::path& macro) { macros.push_back(macro); }
   void LeaveMacro() { macros.pop_back(); }
 
-  // Also what a script engine itself says by it.
+  // Shows a message of the macro or of its engine.
   void Message(const std::string& text) override;
-  // The answers of the command line come first, then those of a user at a terminal, whose empty line
-  // is the proposal, and elsewhere the proposal.
+  // Returns the answers of the command line first. Then it asks the user at a terminal, where an
+  // empty line means the proposal. Without a terminal it returns the proposal.
   std::optional<std::string> Prompt(const std::string& question,
                                     const std::optional<std::string>& proposal) override;
   std::optional<std::string> MacroArgument(const std::string& name) override;

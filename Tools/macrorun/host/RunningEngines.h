@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
-// The script engines that are in use, innermost run last: interrupts them, and reads the call chain of
-// the innermost one.
+// The script engines that are in use, innermost run last: interrupts them, and reads the call chain
+// of the innermost one.
 //
-// Ownership: holds no reference. After a stop or a fault an engine is never released and must not be
-// used: the run then calls Abandon.
+// Ownership: holds no reference. After a stop or a fault an engine is never released and must not
+// be used: the run then calls Abandon.
 // Threading: the thread that runs macros. Interrupt may be called on any thread.
 #pragma once
 

@@ -1,16 +1,16 @@
 // SPDX-License-Identifier: MIT
-// A script engine that tells when it goes: passes every call on to the real one. A reference beside the
-// module's would keep an engine longer than the site that it calls as it goes, so whoever wants to
-// reach the engine from outside must know its end and hold none.
+// Proxy of a script engine that notifies its owner on final release. The owner holds no reference:
+// that would keep the engine longer than the script site, which the engine calls when it is
+// destroyed.
 //
-// Ownership: COM's; it holds the real engine. Errors: those of the real engine.
+// Ownership: by COM references; it holds the real engine. Errors: those of the real engine.
 // Threading: the real engine's.
 #pragma once
 
 #include <activscp.h>
 #include <windows.h>
 
-// The 32-bit form of the parser; libraries do not carry its identifier under the header's name.
+// The 32-bit parser interface. Libraries do not define its identifier under the header's name.
 inline constexpr IID kActiveScriptParse = {
     0xBB1A2AE2, 0xA4F9, 0x11CF, {0x8F, 0x20, 0x00, 0x80, 0x5F, 0x2C, 0xD0, 0x64}};
 
@@ -19,11 +19,11 @@ class ScriptEngineProxy final : public IActiveScript, public IActiveScriptParse 
   class Owner {
    public:
     virtual ~Owner() = default;
-    // Returns when nobody uses the engine any more.
+    // Called before the engine is released. After it returns, the owner must not use the engine.
     virtual void OnReleased(ScriptEngineProxy* engine) = 0;
   };
 
-  // Takes over the reference. The owner outlives the object.
+  // Takes over both references. The owner outlives the object.
   ScriptEngineProxy(IActiveScript* realEngine, IActiveScriptParse* realParser, Owner& engineOwner)
       : engine(realEngine), parser(realParser), owner(engineOwner) {}
   ScriptEngineProxy(const ScriptEngineProxy&) = delete;

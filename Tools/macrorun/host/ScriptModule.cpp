@@ -25,7 +25,7 @@ void Copy(const fs::path& from, const fs::path& to) {
   std::error_code error;
   fs::copy_file(from, to, error);
   if (error) throw UsageError("cannot copy " + ToUtf8(from) + ": " + error.message());
-  // A copy that is read-only like its model could not be removed.
+  // A read-only copy could not be removed.
   SetFileAttributesW(to.c_str(), FILE_ATTRIBUTE_NORMAL);
 }
 
@@ -36,8 +36,8 @@ void WriteDescription(const fs::path& file, const std::string& engine) {
 fs::path RequireAnsiNamed(const fs::path& path) {
   const std::optional<fs::path> named = AnsiNamed(path);
   if (!named)
-    throw UsageError("the system's code page cannot name " + ToUtf8(path) +
-                     ", and it has no short name");
+    throw UsageError("the system's code page cannot represent " + ToUtf8(path) +
+                     ", and it has no short name; rename it");
   return *named;
 }
 
@@ -46,7 +46,7 @@ fs::path RequireAnsiNamed(const fs::path& path) {
 ScriptModule::ScriptModule(const fs::path& file, const Language* language) {
   std::error_code error;
   if (!fs::is_regular_file(file, error))
-    throw UsageError("no module at " + ToUtf8(file) + " (--module)");
+    throw UsageError("no module at " + ToUtf8(file) + " (name it with --module)");
   const fs::path loaded = language ? CopyPrivately(file, *language) : fs::absolute(file);
   library = LoadLibraryExW(loaded.c_str(), nullptr, LOAD_WITH_ALTERED_SEARCH_PATH);
   if (!library)
@@ -55,7 +55,7 @@ ScriptModule::ScriptModule(const fs::path& file, const Language* language) {
   for (const char* name : {"execute", "kill", "version"}) {
     if (Export(name)) continue;
     FreeLibrary(library);
-    throw UsageError(ToUtf8(file) + " is no scripting module: it does not export " + name);
+    throw UsageError(ToUtf8(file) + " is not a scripting module: it does not export " + name);
   }
 }
 
@@ -70,8 +70,8 @@ fs::path ScriptModule::CopyPrivately(const fs::path& file, const Language& langu
   return RequireAnsiNamed(folder->Path()) / PrivateFolder::kModuleName;
 }
 
-// Also after a stop or a fault, which leave a script engine behind that points into the module: it
-// makes no call of its own, and the process ends next.
+// After a stop or a fault, a script engine that points into the module still exists. It makes no
+// calls, and the process ends next.
 ScriptModule::~ScriptModule() { FreeLibrary(library); }
 
 FARPROC ScriptModule::Export(const char* name) const { return GetProcAddress(library, name); }

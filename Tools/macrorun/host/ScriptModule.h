@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 // The loaded scripting module.
 //
-// The module reads its language description from its own folder, or else from the user's. To give it
-// another one, its file and the description are copied into a private temporary folder and loaded
-// from there.
+// The module reads the language description in its folder, or else the one in the user's folder.
+// For another description, this class copies the module and the description into a private
+// temporary folder and loads the module from there.
 //
 // Errors: UsageError. Threading: one thread, but Kill may come from any.
 #pragma once
@@ -21,31 +21,31 @@ struct ScriptInfoRecord;
 
 class ScriptModule {
  public:
-  // Loads `file` for the language; null: with the description that it finds.
+  // Loads `file` for the language. Null: the module uses the description that it finds.
   ScriptModule(const std::filesystem::path& file, const Language* language);
   ~ScriptModule();
   ScriptModule(const ScriptModule&) = delete;
   ScriptModule& operator=(const ScriptModule&) = delete;
 
-  // The macro's name as `execute` and the module's reports have it. Throws UsageError when the
-  // system's code page has no name for it.
+  // The macro's path for `execute`; the module repeats it in its reports. Throws UsageError when
+  // the system's code page cannot represent it.
   static std::string NameOf(const std::filesystem::path& macro);
 
-  // Runs a macro, by that name, with `host`, an object of the host macro interface; answers what
-  // `execute` does.
+  // Runs a macro by its path from NameOf. `host` is an object of the host macro interface. Returns
+  // the result of `execute`.
   int Execute(const std::string& macro, void* host);
-  // Asks the host of the run to stop it; false outside a run.
+  // Asks the host of the current run to stop it; false outside of a run.
   bool Kill();
 
-  // What the module tells of its language; false when it refuses.
+  // Fills the record of the language; false when the module refuses.
   bool FillRecord(ScriptInfoRecord& record);
-  // The name of the module's language; empty when the module refuses to tell.
+  // The name of the module's language; empty when the module refuses.
   std::string Description();
 
  private:
   std::filesystem::path CopyPrivately(const std::filesystem::path& file, const Language& language);
   FARPROC Export(const char* name) const;
 
-  std::optional<PrivateFolder> folder;  // outlives the library
+  std::optional<PrivateFolder> folder;  // destroyed after the library
   HMODULE library = nullptr;
 };

@@ -40,7 +40,7 @@ WORD Attributes(Colour colour, WORD plain) {
   return plain;
 }
 
-// The system's own attributes and not escape sequences: every console takes them.
+// Uses console attributes and not escape sequences, because every console supports them.
 void WriteTerminal(std::FILE* terminal, std::string_view text, Colour colour) {
   const HANDLE console = HandleOf(terminal);
   CONSOLE_SCREEN_BUFFER_INFO before = {};
@@ -56,7 +56,7 @@ void WriteTerminal(std::FILE* terminal, std::string_view text, Colour colour) {
   if (coloured) SetConsoleTextAttribute(console, before.wAttributes);
 }
 
-// What ends the input at the start of a line: Windows's own and, since Wine drops that one, Unix's.
+// End of input at the start of a line. Wine drops Ctrl+Z, so Ctrl+D counts as well.
 constexpr wchar_t kControlZ = L'\x1A', kControlD = L'\x04';
 
 using Line = std::optional<std::string>;
@@ -119,14 +119,14 @@ std::string ReadTerminalText() {
   return text;
 }
 
-// By a thread of its own, since no call ends a read of the terminal everywhere: Ctrl+C does on Windows,
-// but not under Wine.
+// Reads on a separate thread, because no call ends a read of the terminal on every system. Ctrl+C
+// ends it on Windows, but not under Wine.
 std::optional<std::string> ReadTerminalLine(const std::function<bool()>& isGivenUp) {
   struct Reading {
     Line line;
     std::atomic<bool> done = false;
   };
-  const auto reading = std::make_shared<Reading>();  // with the thread it may outlive the call
+  const auto reading = std::make_shared<Reading>();  // the thread can outlive the call
   std::thread([reading] {
     reading->line = ReadLine();
     reading->done = true;

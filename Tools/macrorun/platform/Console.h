@@ -1,12 +1,11 @@
 // SPDX-License-Identifier: MIT
-// The streams that a person may be looking at: whether they are a terminal, and text for them, with colour
-// on standard error.
+// Input and output on a terminal or a redirected stream, with colour on standard error.
 //
-// Texts are UTF-8; what is not passes as it is, except to a terminal, which shows a replacement
-// character. Colour is used on a terminal only, and never when the environment variable NO_COLOR is
-// set and not empty.
-// Errors: standard error that cannot be written is passed over; there is nobody to tell.
-// Threading: any thread; texts of two threads may mix line by line.
+// Texts are UTF-8. Other bytes are written unchanged; a terminal shows a replacement character.
+// Colour is used on a terminal only, and not when the environment variable NO_COLOR is set and not
+// empty.
+// Errors: a failed write to standard error is ignored.
+// Threading: any thread; texts of two threads can mix line by line.
 #pragma once
 
 #include <cstdio>
@@ -17,13 +16,13 @@
 
 enum class Colour { kPlain, kError, kHighlight, kFaint };
 
-// Standard error as it is, without the C library's line ends.
+// Switches standard error to binary, so that the C library does not change line ends.
 void PrepareStandardError();
 
 bool IsTerminal(std::FILE* stream);
 
-// Whether standard input is a pipe or a file of which there is something left to read, at this moment.
-// Also a pipe that does not tell: Wine looks into none of Unix's.
+// Whether standard input is a pipe or a file with unread data. True for a pipe that cannot be
+// examined, such as a Unix pipe under Wine.
 bool InputIsLeft();
 
 // To standard output, byte for byte unless it is a terminal. UsageError when that fails.
@@ -31,9 +30,10 @@ void WriteStandardOutput(std::string_view bytes);
 
 void WriteError(std::string_view text, Colour colour = Colour::kPlain);
 
-// The lines that the user types, each with a line feed, up to Ctrl+Z (or Ctrl+D) at the start of one.
+// Reads lines from the terminal, each with a line feed, until one starts with Ctrl+Z or Ctrl+D.
 std::string ReadTerminalText();
 
-// A line that the user types, without its end; nothing at the end of the input, and when `isGivenUp`, which
-// is asked again and again, says so. Then the terminal's next line is lost: the program is to end.
+// Reads a line from the terminal, without its line end. Returns nothing at the end of the input, or
+// once `isGivenUp` returns true. In the second case the terminal's next line is lost, so the
+// program must end.
 std::optional<std::string> ReadTerminalLine(const std::function<bool()>& isGivenUp);

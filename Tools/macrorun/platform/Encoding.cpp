@@ -17,7 +17,7 @@ std::wstring Widen(std::string_view text, UINT codePage) {
 
 std::string Narrow(std::wstring_view text, UINT codePage) {
   const int length = static_cast<int>(text.size());
-  // Only code pages that cannot hold every character take the flag.
+  // UTF-8 represents every character, and the flag is invalid for it.
   const DWORD flags = codePage == CP_UTF8 ? 0 : WC_NO_BEST_FIT_CHARS;
   const int needed =
       WideCharToMultiByte(codePage, flags, text.data(), length, nullptr, 0, nullptr, nullptr);

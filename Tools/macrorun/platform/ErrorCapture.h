@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Captures what this process writes to standard error, such as warnings of a library. Captures nothing
-// when there is no temporary file for it.
+// Captures what this process writes to standard error, such as warnings of a library. Captures
+// nothing when there is no temporary file for it.
 //
 // Threading: one object at a time.
 #pragma once

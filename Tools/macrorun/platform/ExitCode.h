@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// How the program ends.
+// Exit codes of the program.
 #pragma once
 
 #include <stdexcept>
@@ -12,7 +12,7 @@ enum ExitCode {
   kFault = 4,        // in this program, the module or the script engine
 };
 
-// Something the user must put right before a macro can run; the text names the file or option.
+// An error that the user must correct before a macro can run. The text names the file or option.
 struct UsageError : std::runtime_error {
   using std::runtime_error::runtime_error;
 };

@@ -25,7 +25,7 @@ using File = std::unique_ptr<std::FILE, int (*)(std::FILE*)>;
 
 constexpr wchar_t kTemporarySuffix[] = L".macrorun~";
 
-// NUL, AUX and the like are devices in every folder, whatever lies there.
+// NUL, AUX and similar names are devices in every folder.
 bool IsDevice(const fs::path& path) {
   using Function = ULONG(WINAPI*)(const wchar_t*);
   void* const found = reinterpret_cast<void*>(
@@ -35,7 +35,7 @@ bool IsDevice(const fs::path& path) {
 
 File Open(const fs::path& path, const char* what) {
   const std::string refused = std::string("cannot read the ") + what + " " + ToUtf8(path) + ": ";
-  if (IsDevice(path)) throw UsageError(refused + "Windows takes the name for a device");
+  if (IsDevice(path)) throw UsageError(refused + "the name is that of a Windows device");
   std::error_code ignored;
   if (fs::is_directory(path, ignored)) throw UsageError(refused + "it is a folder");
   File file(_wfopen(path.c_str(), L"rb"), std::fclose);
@@ -56,7 +56,7 @@ std::string ReadAll(std::FILE* file, const std::string& name) {
   throw UsageError("cannot write " + ToUtf8(path) + ": " + SystemMessage(code));
 }
 
-// Wine makes a Unix mode of an access list, and a wider one than it made the list from.
+// Wine converts an access list to a wider Unix mode than the one it came from.
 bool IsWine() { return GetProcAddress(GetModuleHandleW(L"ntdll.dll"), "wine_get_version"); }
 
 void CopyAccessList(const fs::path& from, const fs::path& to) {
@@ -68,7 +68,7 @@ void CopyAccessList(const fs::path& from, const fs::path& to) {
     SetFileSecurityW(to.c_str(), DACL_SECURITY_INFORMATION, descriptor.data());
 }
 
-// A file beside another one, which it replaces or leaves no trace.
+// A temporary file beside its target. It replaces the target, or is deleted.
 class Replacement {
  public:
   explicit Replacement(const fs::path& file) : target(file), path(file) {
@@ -107,7 +107,7 @@ void Replacement::Write(const std::string& bytes) {
   if (!FlushFileBuffers(handle)) FailWriting(target, GetLastError());
 }
 
-// Only MoveFileEx does it in one step: ReplaceFile first renames the old file away.
+// MoveFileEx replaces in one step. ReplaceFile would first rename the old file.
 void Replacement::Commit() {
   CloseHandle(handle);
   handle = INVALID_HANDLE_VALUE;
@@ -118,7 +118,7 @@ void Replacement::Commit() {
   done = true;
 }
 
-// As far as the file system has any: a failure here does not matter to the text.
+// A failure is ignored: not every file system has permissions.
 void Replacement::TakeOverPermissions() {
   const DWORD attributes = GetFileAttributesW(target.c_str());
   if (attributes == INVALID_FILE_ATTRIBUTES) return;  // there is no old file
@@ -128,7 +128,7 @@ void Replacement::TakeOverPermissions() {
 
 }  // namespace
 
-// By the long names: the system's own search finds "a.rbs~" for "*.rbs", too.
+// Compares long names: the system's search would also find "a.rbs~" for "*.rbs".
 std::vector<fs::path> FilesMatching(const fs::path& pattern) {
   if (pattern.filename().wstring().find_first_of(L"*?") == std::wstring::npos) return {pattern};
   const fs::path folder = pattern.parent_path();
@@ -172,7 +172,7 @@ void RequireReplaceable(const fs::path& path, bool mustExist) {
     std::error_code error;
     const fs::path folder = path.parent_path();
     if (!folder.empty() && !fs::is_directory(folder, error))
-      throw UsageError("cannot write " + ToUtf8(path) + ": there is no folder " + ToUtf8(folder));
+      throw UsageError("cannot write " + ToUtf8(path) + ": no such folder: " + ToUtf8(folder));
     return;
   }
   if (attributes & FILE_ATTRIBUTE_DIRECTORY)

@@ -12,7 +12,7 @@ namespace {
 
 constexpr std::size_t kLongestValue = 4096;
 
-// In the templates of whole lines.
+// Replaces \n, \r and \t, as the module does in the templates of whole lines.
 std::string Unescaped(const std::string& value) {
   std::string text;
   for (std::size_t i = 0; i < value.size(); ++i) {
@@ -39,14 +39,14 @@ class TemplateReader {
   }
 
  private:
-  // A text that fills its field is whole only if the description has no more of it.
+  // A text that fills its field may be cut, so it is compared with the description.
   template <class Decode>
   std::string Read(const char* field, std::size_t longest, const char* key,
                    const Decode& decode) const {
     const std::string text(field);
     if (text.size() == longest && decode(ValueOf(key, text)) != text)
       throw UsageError(source + ": " + key + " is longer than the " + std::to_string(longest) +
-                       " characters that the module hands out");
+                       " characters that the module passes on");
     return text;
   }
 
@@ -68,10 +68,10 @@ class TemplateReader {
 
 LanguageTemplates TemplatesOf(ScriptModule& module, const Language& language) {
   ScriptInfoRecord record;
-  if (!module.FillRecord(record)) throw UsageError("the module tells no templates");
+  if (!module.FillRecord(record)) throw UsageError("the module provides no templates");
   if (language.description.empty() && !language.IsRuby())
     throw UsageError("--engine " + language.engine +
-                     " says nothing of how to write a macro; name a --description instead");
+                     " has no templates for a macro; use --description instead");
   LanguageTemplates templates;
   templates.source =
       language.description.empty() ? record.description : ToUtf8(language.description);

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// How a script language writes a recorded macro, as the module tells its host in the record of
-// `version` (Docs/description-file.md has the meaning of each text).
+// The templates for recorded macros of a script language, from the record that the module's
+// `version` fills (Docs/description-file.md explains each of them).
 //
 // Errors: UsageError. Threading: the thread of the module.
 #pragma once
@@ -18,6 +18,6 @@ struct LanguageTemplates {
   char openBracket = '(', closeBracket = ')';
 };
 
-// `language` is the module's. Fails, naming the key, when the record had to cut a text of the
-// language's description, and for a language of which only the engine is known.
+// `language` is the language that the module was loaded for. Fails when only the engine of the
+// language is known, and when the record cuts a template; the error names its key.
 LanguageTemplates TemplatesOf(ScriptModule& module, const Language& language);

@@ -7,13 +7,10 @@
 #include <optional>
 
 #include "document/Characters.h"
-#include "iLib/iComText.h"
+#include "functions/Limits.h"
 #include "platform/ExitCode.h"
 
 namespace {
-
-// One byte more, and a host would have to take the text for one that was cut.
-constexpr std::size_t kLongestText = kNarrowLimit - 1;
 
 std::string_view UnitAt(std::string_view text, std::size_t offset) {
   const std::size_t length =
@@ -23,7 +20,7 @@ std::string_view UnitAt(std::string_view text, std::size_t offset) {
 
 bool IsControl(char byte) { return (byte >= 0 && byte < ' ') || byte == '\x7f'; }
 
-// The start of a line end, or a byte that may become part of a character.
+// A CR, which may start a line end, or a byte that may start or continue a character.
 bool IsOpen(std::string_view unit) {
   return unit == "\r" || (unit.size() == 1 && (unit[0] & 0x80) != 0);
 }
@@ -34,13 +31,13 @@ std::string HexEscape(char byte) {
   return text;
 }
 
-// VBScript takes the sign for an operator, and the lowest integer's digits for a real.
+// In VBScript the sign is an operator and 2147483648 is a real.
 std::string WrittenInteger(std::int32_t value) {
   return value == std::numeric_limits<std::int32_t>::min() ? "-2147483647-1"
                                                            : std::to_string(value);
 }
 
-// What a template says in a string with backslash escapes; nothing when it is not certain.
+// The text that a template means in a string with backslash escapes; nothing when that is unknown.
 std::optional<std::string> Meaning(const std::string& escape) {
   std::string text;
   for (std::size_t i = 0; i < escape.size(); ++i) {
@@ -74,7 +71,7 @@ MacroComposer::MacroComposer(const LanguageTemplates& languageTemplates)
   backslash = (quote == '\'' ? templates.tick : templates.quote).starts_with('\\');
 }
 
-// As printf reads it.
+// Parses the format as printf does.
 void MacroComposer::ReadFormat() {
   const std::string& format = templates.functionPrint;
   bool found = false, sound = true;
@@ -111,9 +108,9 @@ void MacroComposer::AddTyped(const RecordedStep& step) {
   if (typedOpen) Flush();
   for (std::size_t offset = 0; offset < step.text.size();) {
     const std::string_view unit = UnitAt(step.text, offset);
-    // A template may make two bytes of any line end.
+    // A template may write two bytes for a line end.
     const std::size_t bytes = unit == "\n" ? 2 : unit.size();
-    if (typedBytes + bytes > kLongestText) Flush();
+    if (typedBytes + bytes > kLongestArgument) Flush();
     typed += Escaped(unit, typed, step.kind == RecordedStep::Kind::kEnter, step);
     typedBytes += bytes;
     typedOpen = IsOpen(unit);
@@ -128,7 +125,7 @@ void MacroComposer::Flush() {
   typedOpen = false;
 }
 
-// Indented like typed text.
+// Indents the call like typed text.
 void MacroComposer::AddCall(const RecordedStep& step) {
   Flush();
   std::string call = beforeText.substr(0, beforeText.find_first_not_of(" \t"));
@@ -171,7 +168,7 @@ std::string MacroComposer::Escaped(std::string_view unit, std::string_view befor
   const auto use = [&](const std::string& escape, const char* key) {
     if (!escape.empty()) return escape;
     throw UsageError(step.place + ": " + templates.source + " has no " + key +
-                     ", which this text needs");
+                     " template, which this text needs");
   };
   if (enter) return use(templates.enter, "Enter");
   if (unit == "\r\n") return use(templates.crlf, "CRLF");
@@ -179,15 +176,12 @@ std::string MacroComposer::Escaped(std::string_view unit, std::string_view befor
   if (unit == "'") return use(templates.tick, "Tick");
   if (unit == "\"") return use(templates.quote, "Quote");
   if (unit == "\r")
-    throw UsageError(step.place +
-                     ": a carriage return without a line feed cannot be written by the templates "
-                     "of " +
+    throw UsageError(step.place + ": no template for a carriage return without a line feed in " +
                      templates.source);
   return std::string(unit);
 }
 
-// `before` is what stands in the string already: Ruby takes "#" followed by one of three characters
-// for the start of an expression.
+// `before` is the string so far: in Ruby "#" and one of three characters start an expression.
 std::string MacroComposer::BackslashEscaped(std::string_view unit, std::string_view before,
                                             bool enter) const {
   const auto use = [&](const std::string& escape, const char* otherwise) {

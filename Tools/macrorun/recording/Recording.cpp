@@ -14,7 +14,7 @@ using nlohmann::json;
 
 namespace {
 
-// What a key does: it writes a text or calls a macro function without arguments.
+// A key writes a text, or calls a macro function without arguments.
 constexpr struct {
   const char* name;
   const char* text;
@@ -42,7 +42,7 @@ const MacroFunction* FunctionNamed(const std::string& name) {
   return id == kUnknownId ? nullptr : &MacroFunctions()[id - 1];
 }
 
-// As JSON, cut for a message.
+// As JSON, shortened for a message.
 std::string Shown(const json& value) {
   std::string text = value.dump(-1, ' ', true);
   if (text.size() > 40) text = text.substr(0, 40) + "...";
@@ -92,7 +92,7 @@ RecordedStep StepReader::Read() const {
   return Typed(text);
 }
 
-// The one key that says what the step is.
+// The key that determines the kind of step.
 std::string StepReader::Kind() const {
   constexpr char kExpected[] = "expected an object with \"text\", \"bytes\", \"key\" or \"call\"";
   if (!step.is_object()) Fail("", std::string(kExpected) + ", got " + Shown(step));
@@ -100,14 +100,13 @@ std::string StepReader::Kind() const {
   for (const auto& [key, value] : step.items()) {
     if (key == "arguments") continue;
     if (key != "text" && key != "bytes" && key != "key" && key != "call")
-      Fail(key, step.contains("call") ? "no key of a call, beside which \"arguments\" may stand"
-                                      : std::string("no key of a step: ") + kExpected);
-    if (!kind.empty()) Fail(key, "cannot stand beside \"" + kind + "\"");
+      Fail(key, step.contains("call") ? "unknown key; a call has \"call\" and \"arguments\""
+                                      : std::string("unknown key; ") + kExpected);
+    if (!kind.empty()) Fail(key, "cannot be combined with \"" + kind + "\"");
     kind = key;
   }
   if (kind.empty()) Fail("", kExpected);
-  if (kind != "call" && step.contains("arguments"))
-    Fail("arguments", "stands beside \"call\" only");
+  if (kind != "call" && step.contains("arguments")) Fail("arguments", "needs \"call\"");
   return kind;
 }
 

@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: MIT
-// What a user typed and did while a macro was recorded, from a file of JSON: see "Recording" in
-// Docs/macrorun.md.
+// The steps of a recording, read from a JSON file: see "Recording" in Docs/macrorun.md.
 //
-// Texts are bytes without a zero byte, which could not pass to a macro function.
-// Ownership: steps point to functions of the table, which stay. Errors: UsageError, which names the
+// Texts are bytes without a zero byte, which would end an argument of a macro function.
+// Ownership: steps point to the static table of functions. Errors: UsageError, which names the
 // file, the step (from 1) and the key. Threading: any thread.
 #pragma once
 
@@ -16,7 +15,8 @@
 
 #include "functions/MacroFunctions.h"
 
-// A whole number of 32 bits is an integer, however it is written: not every language tells 2 from 2.0.
+// A whole number of 32 bits is an integer, also when written 2.0: some languages do not distinguish
+// them.
 using StepArgument = std::variant<std::int32_t, double, std::string>;
 
 struct RecordedStep {
@@ -29,10 +29,10 @@ struct RecordedStep {
   std::vector<StepArgument> arguments = {};
 };
 
-// Refuses what would be wrong in any document; the rest shows when the macro runs.
+// Refuses what every document would refuse. The macro function checks the rest.
 std::vector<RecordedStep> ReadRecording(const std::filesystem::path& file);
 
-// A step's arguments as the function gets them; the list points into the object.
+// A step's arguments in the form for a function. The list points into the object.
 class PassedArguments {
  public:
   explicit PassedArguments(const std::vector<StepArgument>& arguments);

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: MIT
 // Counts and times the calls of a macro's functions.
 //
-// Units: nanoseconds inside, milliseconds in the table. Time in a macro that another one runs counts
-// for the call that runs it. Threading: one thread.
+// Units: nanoseconds, in the table milliseconds. The time of a nested macro counts for the call of
+// run_macro. Threading: one thread.
 #pragma once
 
 #include <chrono>
@@ -16,8 +16,8 @@ class CallProfile {
   void AddCall(const std::string& function, Time time);
   void AddRun(Time time) { total += time; }
 
-  // A head line and one for each function, the longest time first; the last is for what the macro
-  // itself and its engine took.
+  // A heading, a line for each function, the longest time first, and a line for the macro and its
+  // engine.
   std::string Table() const;
 
  private:

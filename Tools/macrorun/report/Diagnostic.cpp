@@ -14,8 +14,7 @@ namespace {
 constexpr std::string_view kFileMark = " File: ";
 constexpr std::string_view kSourceMark = ") >> ";
 constexpr std::string_view kReasonMark = "\nReason: ";
-// The name that the Ruby engine gives to a macro, which it knows as a text only.
-constexpr std::string_view kRubyName = "macro";
+constexpr std::string_view kRubyName = kRubyMacroName;
 
 int Number(std::string_view digits) {
   int value = -1;
@@ -28,7 +27,7 @@ std::string_view Trimmed(std::string_view text) {
   return text.substr(0, end == text.npos ? 0 : end + 1);
 }
 
-// "LINE:COLUMN", the column from 0 and -1 for none.
+// "LINE:COLUMN"; the column counts from 0, -1 is unknown.
 void ReadPosition(std::string_view text, Diagnostic& error) {
   const std::size_t colon = text.find(':');
   if (colon == text.npos) return;
@@ -36,7 +35,7 @@ void ReadPosition(std::string_view text, Diagnostic& error) {
   error.column = std::max(Number(text.substr(colon + 1)) + 1, 0);
 }
 
-// What stands behind the place in "macro:3: text"; empty for another line.
+// The text after the place in "macro:3: text"; empty for other lines.
 std::string_view BehindPlace(std::string_view line) {
   const std::size_t digits = kRubyName.size() + 1;
   if (!line.starts_with(kRubyName) || line.substr(0, digits).back() != ':') return {};
@@ -45,8 +44,8 @@ std::string_view BehindPlace(std::string_view line) {
   return line.substr(end + 2);
 }
 
-// The first line "macro:3: text" without the place; a further one, of a second syntax error, and
-// "from macro:3:in `f'" with the file's name.
+// Removes the place from the first line "macro:3: text". In a further line, of a second syntax
+// error, and in "from macro:3:in `f'" replaces the engine's name by the file.
 std::string WithoutEngineName(std::string_view line, const std::string& file, bool first) {
   const std::string_view behind = BehindPlace(line);
   if (first && !behind.empty()) return std::string(behind);
@@ -59,12 +58,12 @@ std::string WithoutEngineName(std::string_view line, const std::string& file, bo
 }
 
 bool IsUnderline(std::string_view line) {
-  return line.find_first_not_of(" \t^~") == line.npos;  // an empty one, too
+  return line.find_first_not_of(" \t^~") == line.npos;  // true for an empty line
 }
 
 bool IsWarning(std::string_view line) { return BehindPlace(line).starts_with("warning: "); }
 
-// A chain that is the place of the error itself, once more.
+// A backtrace with one frame repeats the place of the error.
 void ForgetOwnPlace(Diagnostic& error) {
   if (error.details.size() == 1 && error.details[0].ends_with("in `<main>'")) error.details.clear();
 }

@@ -1,11 +1,10 @@
 // SPDX-License-Identifier: MIT
-// An error of a macro in one form, wherever it comes from: the module's reports, a script engine's
-// syntax check, or a macro function that was called wrongly.
+// An error of a macro: from a report of the module, the syntax check of a script engine, or a wrong
+// call of a macro function.
 //
-// Texts are bytes, UTF-8 by convention. Lines and columns count from 1, columns in characters once the
-// source is complete; 0 is unknown.
-// Errors: none; what a text does not tell stays empty.
-// Threading: values.
+// Texts are bytes, UTF-8 by convention. Lines and columns count from 1; 0 is unknown. Columns count
+// characters after CompleteSource.
+// Errors: none. Fields that a text does not contain stay empty.
 #pragma once
 
 #include <filesystem>
@@ -15,51 +14,56 @@
 #include <vector>
 
 struct Diagnostic {
-  std::string kind;  // as the user's guide lists them
+  std::string kind;  // one of the list in Docs/macrorun.md
   std::string file;
   int line = 0;
   int column = 0;
-  bool columnInBytes = false;  // as engines count that take each byte for a character
+  bool columnInBytes = false;  // for engines that take each byte for a character
   std::string message;         // one line
   std::string source;          // the text of the line
   std::vector<std::string> details;
-  std::string function;  // of a wrong call, as are the next two
-  int argument = 0;      // from 1; 0: not one of them
+  std::string function;  // for a wrong call, as are the next two
+  int argument = 0;      // from 1; 0: no single argument
   std::string expected;
 };
 
-// An error without a place. No path: of no file.
+// The Ruby engine's name of every macro. It gets the text without the file name.
+inline constexpr char kRubyMacroName[] = "macro";
+
+// An error without line and column. The path may be empty.
 Diagnostic PlainDiagnostic(const char* kind, const std::filesystem::path& file,
                            std::string message);
 
-// How a macro is named: in what `execute` is given and the module's reports say, and to the user.
+// The two names of a macro: the one for `execute`, which the module repeats in its reports, and the
+// one for the user.
 struct MacroName {
   std::string inModule;
   std::string shown;
 };
 
-// The module's report of a script error; nothing for another report.
+// Parses the module's report of a script error. Returns nothing for other reports.
 std::optional<Diagnostic> ParseScriptError(std::string_view report, const MacroName& macro);
 
-// An engine's description of an error becomes message and details: what repeats the place or the
-// source line is left out, and `file` stands for the name that the engine has for a macro.
+// Sets message and details from an engine's description. Skips repetitions of the place and of the
+// source line, and replaces the engine's name of the macro by the file.
 void SetDescription(Diagnostic& error, std::string_view description);
 
-// What an engine tells of the calls that led to a place, "macro:3:in `f'" a line, innermost first, becomes
-// line and details of an error whose file is known.
+// Parses a backtrace, "macro:3:in `f'" a line, innermost frame first. Sets line and details of an
+// error whose file is known.
 void SetCallChain(Diagnostic& error, std::string_view chain);
 
-// In warnings of the Ruby engine, a line each, the macro's file in place of the engine's name for it; other
-// lines as they are.
+// Replaces the engine's name of the macro by the file in lines that are warnings of the Ruby
+// engine.
 std::string WithFile(std::string_view text, const std::string& file);
 
-// The line's text from the macro file, where the engine has told none, and the column in characters.
+// Reads the source line from the macro file unless the engine has reported it, and converts the
+// column to characters.
 void CompleteSource(Diagnostic& error);
 
 // One JSON object without a line end.
 std::string DiagnosticAsJson(const Diagnostic& error);
 
-// "file:line:column: " as far as it is known.
+// "file:line:column: ", without the parts that are unknown.
 std::string Place(const Diagnostic& error);
 
 // The blanks and the caret below the source line; empty when the column is unknown or beyond it.

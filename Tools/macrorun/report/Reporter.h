@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: MIT
-// What the program tells its user while macros run, on standard error: for people, or for programs
-// one JSON object a line with the member "type" ("error", "message", "test", "trace", "note",
-// "profile").
+// Writes messages to standard error: as text, or as JSON, one object a line with the member "type"
+// ("error", "message", "test", "trace", "note", "profile").
 //
-// Errors: none; what cannot be written is passed over.
+// Errors: none; a failed write is ignored.
 // Threading: any thread.
 #pragma once
 
@@ -20,27 +19,27 @@ class Reporter {
 
   explicit Reporter(Form reportForm) : form(reportForm) {}
 
-  // Whose messages, traces and notes follow, and over which of its texts it is tested, both of which are
-  // told with each unless they are empty. Not while a macro runs.
+  // The macro and the test case that the following messages, traces and notes belong to; each one
+  // names them unless they are empty. Not while a macro runs.
   void SetMacro(std::string name, std::string textCase) {
     macro = std::move(name);
     macroCase = std::move(textCase);
   }
 
   void Error(Diagnostic error);
-  // What a macro says.
+  // A message of a macro.
   void Message(std::string_view text) { Line("message", "", text); }
   void Trace(std::string_view text) { Line("trace", "", text); }
-  // Several lines, each with its end.
+  // The lines of the table end with a line feed.
   void Profile(std::string_view table);
-  // What the program itself has to say.
+  // A message of this program.
   void Note(std::string_view text) { Line("note", "macrorun: ", text); }
 
-  // The outcome of that macro's test, with what its text has other than expected. Of one that has passed
-  // only programs are told.
+  // The result of the current macro's test, and the differences of its text. A test that passed
+  // appears in JSON only.
   void TestEnd(bool passed, const std::vector<DiffLine>& diff);
 
-  // "[2/10] name" on a line of its own that the next one replaces; on a terminal only.
+  // Shows "[2/10] name" on a terminal until the next output.
   void Progress(std::size_t number, std::size_t count, const std::string& name);
   void EndProgress();
 

@@ -15,7 +15,7 @@ using Kind = DiffLine::Kind;
 using Lines = std::vector<std::string_view>;
 using Diff = dtl::Diff<std::string_view, Lines>;
 
-// Beyond the control characters: blanks, marks on the letter before, and what takes no place.
+// Invisible besides the control characters: spaces, combining marks, zero-width characters.
 constexpr struct {
   char32_t first, last;
 } kShapeless[] = {{0xA0, 0xA0},     {0xAD, 0xAD},     {0x0300, 0x036F},  {0x2000, 0x200F},
@@ -32,7 +32,7 @@ Lines LinesOf(std::string_view text) {
   return lines;
 }
 
-// `character` is one in valid UTF-8.
+// `character` is valid UTF-8.
 char32_t CodePoint(std::string_view character) {
   const auto first = static_cast<unsigned char>(character.front());
   if (character.size() == 1) return first;
@@ -64,10 +64,10 @@ std::string Shown(std::string_view character, bool differs) {
   return std::string(character);
 }
 
-// `line` comes without its LF.
+// `line` has no LF.
 std::string ShownLine(std::string_view line, bool differs) {
   if (!differs && line.ends_with('\r')) line.remove_suffix(1);
-  const std::size_t blanks = line.find_last_not_of(" \r") + 1;  // where those at the end begin
+  const std::size_t blanks = line.find_last_not_of(" \r") + 1;  // start of the trailing spaces
   std::string shown;
   for (std::size_t at = 0; at < line.size();) {
     const std::string_view character = line.substr(at, CharacterLength(line, at));

@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: MIT
-// Where two texts differ, line by line, for people.
+// A unified diff of two texts in which differences are visible.
 //
-// A line of a text ends with its LF. Whatever would look the same or not show at all is written in angle
-// brackets: in every line control characters and bytes that are not UTF-8 (<U+001B>, <0xFF>), in lines
-// that differ also CR, tabs, blanks at the end, and characters without a shape of their own (<CR>,
-// <TAB>, <SPACE>, <U+00A0>). A last line without LF is followed by a line that says so.
+// A line ends with its LF. Angle brackets show control characters and bytes that are not UTF-8
+// (<U+001B>, <0xFF>). In lines that differ they also show CR, tabs, trailing spaces and invisible
+// characters (<CR>, <TAB>, <SPACE>, <U+00A0>). A remark follows a last line without LF.
 //
 // Errors: none. Threading: any thread.
 #pragma once
@@ -17,10 +16,9 @@ struct DiffLine {
   enum class Kind { kPlace, kSame, kMissing, kExtra, kRemark };
 
   Kind kind;
-  std::string text;  // with the mark of its kind, without line end
+  std::string text;  // starts with the sign of its kind; without line end
 };
 
-// A unified diff with three lines around each change; empty for equal texts. The names are for its first
-// two lines.
+// With three lines of context; empty for equal texts. The first two lines contain the names.
 std::vector<DiffLine> CompareTexts(const std::string& expectedName, std::string_view expected,
                                    const std::string& madeName, std::string_view made);

@@ -11,7 +11,8 @@ namespace {
 
 using Kind = ParameterKind;
 
-// A selection stays; else the word at the cursor changes and the cursor goes behind it.
+// Changes the selection and keeps it. Without one, changes the word at the cursor and moves after
+// it.
 MacroResult ChangeCase(MacroCall& call, LetterCase letterCase) {
   Document& document = call.document();
   const bool selected = document.HasSelection();
@@ -22,7 +23,8 @@ MacroResult ChangeCase(MacroCall& call, LetterCase letterCase) {
   return range.from != range.to ? 1 : 0;
 }
 
-// The lines that the selection, or the cursor, is in; not the one that it only reaches.
+// The lines of the selection or the cursor, without a line that contains only the end of the
+// selection.
 template <class Change>
 MacroResult ChangeLines(MacroCall& call, const Change& change) {
   Document& document = call.document();
@@ -37,7 +39,7 @@ MacroResult ChangeLines(MacroCall& call, const Change& change) {
 
 MacroResult Indent(MacroCall& call) {
   const std::size_t blanks = call.Number(0, 0);
-  if (blanks > 1000) call.Fail(0, "at most 1000 blanks");
+  if (blanks > 1000) call.Fail(0, "at most 1000 spaces");
   const std::string indent = blanks == 0 ? "\t" : std::string(blanks, ' ');
   return ChangeLines(call, [&](std::size_t line, const std::string&) {
     return Replacement{{{line, 0}, {line, 0}}, indent};
@@ -59,27 +61,27 @@ const std::vector<MacroFunction> kFunctions = {
     {"upper",
      {},
      kNumber,
-     "makes the selection, or the word at the cursor, upper case; 1, or 0 without one",
+     "converts the selection or the word at the cursor to upper case; returns 1, or 0 without one",
      [](MacroCall& call) { return ChangeCase(call, LetterCase::kUpper); }},
     {"lower",
      {},
      kNumber,
-     "makes the selection, or the word at the cursor, lower case; 1, or 0 without one",
+     "converts the selection or the word at the cursor to lower case; returns 1, or 0 without one",
      [](MacroCall& call) { return ChangeCase(call, LetterCase::kLower); }},
     {"title",
      {},
      kNumber,
-     "capitalises the words of the selection, or the one at the cursor; 1, or 0 without one",
+     "capitalises the words of the selection or at the cursor; returns 1, or 0 without one",
      [](MacroCall& call) { return ChangeCase(call, LetterCase::kTitle); }},
     {"indent",
      {{"blanks", Kind::kCount, "a tab"}},
      kNone,
-     "indents the selection's lines, or the cursor's, by blanks or a tab",
+     "indents the selection's lines, or the cursor's, by spaces or a tab",
      Indent},
     {"unindent",
      {{"blanks", Kind::kCount, "8"}},
      kNone,
-     "unindents the selection's lines, or the cursor's, by a tab or at most so many blanks",
+     "unindents the selection's lines, or the cursor's, by a tab or at most that many spaces",
      Unindent},
 };
 

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The editor's own clipboard, which all documents share. The system's is left alone, so that a run
-// depends on nothing but its input.
+// A clipboard that all documents share. It is not the system's, so that a run depends only on its
+// input.
 #include "functions/MacroCall.h"
 #include "functions/groups/FunctionGroups.h"
 
@@ -16,11 +16,11 @@ MacroResult Copy(MacroCall& call) {
 constexpr ResultKind kNumber = ResultKind::kNumber;
 
 const std::vector<MacroFunction> kFunctions = {
-    {"copy", {}, kNumber, "copies the selection; 1, or 0 without one", Copy},
+    {"copy", {}, kNumber, "copies the selection; returns 1, or 0 without a selection", Copy},
     {"cut",
      {},
      kNumber,
-     "copies and deletes the selection; 1, or 0 without one",
+     "copies and deletes the selection; returns 1, or 0 without a selection",
      [](MacroCall& call) -> MacroResult {
        const MacroResult copied = Copy(call);
        if (call.document().HasSelection()) call.document().Write("");
@@ -29,7 +29,7 @@ const std::vector<MacroFunction> kFunctions = {
     {"paste",
      {},
      ResultKind::kNone,
-     "writes what was copied",
+     "inserts the copied text",
      [](MacroCall& call) -> MacroResult {
        call.document().Write(call.editor.clipboard);
        return 0;
@@ -37,7 +37,7 @@ const std::vector<MacroFunction> kFunctions = {
     {"clipboard",
      {},
      ResultKind::kText,
-     "the text that was copied",
+     "returns the copied text",
      [](MacroCall& call) -> MacroResult { return call.editor.clipboard; }},
 };
 

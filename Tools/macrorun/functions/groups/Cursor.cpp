@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Where the cursor is and how it moves. Moving ends the selection.
+// Reads and moves the cursor. Moving ends the selection.
 #include <algorithm>
 
 #include "document/Characters.h"
@@ -16,7 +16,7 @@ MacroResult MoveTo(MacroCall& call, Position place) {
   return 0;
 }
 
-// Takes the first argument's number of steps, as far as there are any; answers how many it took.
+// Makes up to as many steps as the first argument says; returns how many it made.
 template <class Step>
 MacroResult Repeat(MacroCall& call, const Step& step) {
   const Document& document = call.document();
@@ -31,7 +31,7 @@ MacroResult Repeat(MacroCall& call, const Step& step) {
   return Answer(taken);
 }
 
-// The column is kept as far as the line has it.
+// Keeps the column, up to the end of the line.
 MacroResult MoveLines(MacroCall& call, bool down) {
   const Document& document = call.document();
   const Position cursor = document.Cursor();
@@ -58,55 +58,56 @@ const std::vector<MacroFunction> kFunctions = {
     {"cursor_line",
      {},
      kNumber,
-     "the cursor's line",
+     "returns the cursor's line",
      [](MacroCall& call) { return Answer(call.document().Cursor().line); }},
     {"cursor_column",
      {},
      kNumber,
-     "the cursor's column, in characters",
+     "returns the cursor's column, in characters",
      [](MacroCall& call) { return Answer(ColumnOf(call.document(), call.document().Cursor())); }},
     {"goto",
      {{"line", Kind::kLineOrEnd}, {"column", Kind::kColumn}},
      kNone,
-     "puts the cursor before the character in a line and column",
+     "moves the cursor to a line and column",
      [](MacroCall& call) { return MoveTo(call, call.At(0)); }},
     {"goto_line",
      {{"line", Kind::kLineOrEnd}},
      kNone,
-     "puts the cursor at the start of a line, or at the end of the text",
+     "moves the cursor to the start of a line, or to the end of the text",
      [](MacroCall& call) { return MoveTo(call, {call.Number(0), 0}); }},
     {"line_start",
      {},
      kNone,
-     "puts the cursor at the start of its line",
+     "moves the cursor to the start of its line",
      [](MacroCall& call) { return MoveTo(call, {call.document().Cursor().line, 0}); }},
     {"line_end",
      {},
      kNone,
-     "puts the cursor at the end of its line",
+     "moves the cursor to the end of its line",
      [](MacroCall& call) {
        return MoveTo(call, call.document().EndOfLine(call.document().Cursor().line));
      }},
     {"document_start",
      {},
      kNone,
-     "puts the cursor at the start of the text",
+     "moves the cursor to the start of the text",
      [](MacroCall& call) { return MoveTo(call, {}); }},
     {"document_end",
      {},
      kNone,
-     "puts the cursor at the end of the text",
+     "moves the cursor to the end of the text",
      [](MacroCall& call) { return MoveTo(call, call.document().TextEnd()); }},
-    {"cursor_left", kSteps, kNumber, "moves the cursor back by characters; how many it was", kLeft},
-    {"cursor_right", kSteps, kNumber, "moves the cursor on by characters; how many it was",
+    {"cursor_left", kSteps, kNumber, "moves the cursor left by characters; returns how many",
+     kLeft},
+    {"cursor_right", kSteps, kNumber, "moves the cursor right by characters; returns how many",
      [](MacroCall& call) { return Repeat(call, NextCharacter); }},
-    {"cursor_up", kSteps, kNumber, "moves the cursor up by lines; how many it was",
+    {"cursor_up", kSteps, kNumber, "moves the cursor up by lines; returns how many",
      [](MacroCall& call) { return MoveLines(call, false); }},
-    {"cursor_down", kSteps, kNumber, "moves the cursor down by lines; how many it was",
+    {"cursor_down", kSteps, kNumber, "moves the cursor down by lines; returns how many",
      [](MacroCall& call) { return MoveLines(call, true); }},
-    {"word_left", kSteps, kNumber, "moves the cursor back to starts of words; how many it was",
+    {"word_left", kSteps, kNumber, "moves the cursor left by words; returns how many",
      [](MacroCall& call) { return Repeat(call, PreviousWord); }},
-    {"word_right", kSteps, kNumber, "moves the cursor on to starts of words; how many it was",
+    {"word_right", kSteps, kNumber, "moves the cursor right by words; returns how many",
      [](MacroCall& call) { return Repeat(call, NextWord); }},
 };
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Deleting at the cursor. As with keys, a selection is deleted instead, whatever the count.
+// Deletes at the cursor. As with the keys, a selection is deleted instead, whatever the count.
 #include "document/Motion.h"
 #include "functions/MacroCall.h"
 #include "functions/groups/FunctionGroups.h"
@@ -35,7 +35,7 @@ const auto kBackspace = [](MacroCall& call) {
 };
 
 const std::vector<MacroFunction> kFunctions = {
-    {"delete_char", kCount, kNone, "deletes the selection, or characters behind the cursor",
+    {"delete_char", kCount, kNone, "deletes the selection, or characters after the cursor",
      [](MacroCall& call) { return Delete(call, NextCharacter); }},
     {"backspace", kCount, kNone, "deletes the selection, or characters before the cursor",
      kBackspace},
@@ -44,7 +44,7 @@ const std::vector<MacroFunction> kFunctions = {
     {"delete_selection",
      {},
      kNone,
-     "deletes what is selected",
+     "deletes the selection",
      [](MacroCall& call) -> MacroResult {
        if (call.document().HasSelection()) call.document().Write("");
        return 0;

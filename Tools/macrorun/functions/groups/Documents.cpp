@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Several documents. Paths count from the process's current directory. Document 1 is the run's,
-// which alone decides where it goes: it needs a path to be saved and cannot be closed.
+// Several documents. Paths are relative to the current directory. The run decides where document 1
+// is written: macros need a path to save it and cannot close it.
 #include "functions/MacroCall.h"
 #include "functions/groups/FunctionGroups.h"
 #include "platform/Encoding.h"
@@ -36,7 +36,7 @@ MacroResult SaveDocument(MacroCall& call) try {
   if (call.Has(0))
     path = fs::absolute(PathFromUtf8(call.Text(0)), error);
   else if (number == 1 || path.empty())
-    call.Fail(0, "the path of a file, since this document has none of its own to be saved in");
+    call.Fail(0, "a path, because this document has no file to save to");
   RequireReplaceable(path, false);
   ReplaceFileBytes(path, call.document().Bytes());
   if (number != 1) call.editor.SetName(number, path);
@@ -47,7 +47,7 @@ MacroResult SaveDocument(MacroCall& call) try {
 
 MacroResult CloseDocument(MacroCall& call) {
   const std::size_t number = call.Number(0, call.editor.CurrentNumber());
-  if (number == 1) call.Fail(0, "a document other than 1, which stays");
+  if (number == 1) call.Fail(0, "a document other than 1, which cannot be closed");
   call.editor.Close(number);
   return 0;
 }
@@ -60,7 +60,7 @@ const std::vector<MacroFunction> kFunctions = {
     {"new_document",
      {},
      kNumber,
-     "opens an empty document and makes it the current one; its number",
+     "opens an empty document and makes it the current one; returns its number",
      [](MacroCall& call) {
        call.editor.Open(Document(""), {});
        return CurrentNumber(call);
@@ -68,10 +68,10 @@ const std::vector<MacroFunction> kFunctions = {
     {"open_document",
      {{"path", Kind::kName}},
      kNumber,
-     "opens a file, if it is not open, and makes it the current document; its number",
+     "opens a file, if it is not open, and makes it the current document; returns its number",
      OpenDocument},
     {"save_document",
-     {{"path", Kind::kName, "its own"}},
+     {{"path", Kind::kName, "the document's file"}},
      kNone,
      "writes the current document to a file; document 1 needs a path",
      SaveDocument},
@@ -86,17 +86,17 @@ const std::vector<MacroFunction> kFunctions = {
     {"current_document",
      {},
      kNumber,
-     "the number of the current document",
+     "returns the number of the current document",
      [](MacroCall& call) { return CurrentNumber(call); }},
     {"document_count",
      {},
      kNumber,
-     "the number of documents",
+     "returns the number of documents",
      [](MacroCall& call) { return Answer(call.editor.DocumentCount()); }},
     {"document_name",
      {kOptionalDocument},
      ResultKind::kText,
-     "the path of a document's file, empty without one",
+     "returns the path of a document's file, or an empty text",
      [](MacroCall& call) -> MacroResult {
        return ToUtf8(call.editor.Name(call.Number(0, call.editor.CurrentNumber())));
      }},

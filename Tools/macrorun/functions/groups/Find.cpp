@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: MIT
 // Find and replace, plain and by regular expression.
 //
-// A search goes from the end of the selection (or the cursor) to the end of the text, backward from
-// its start to the start of the text; with wrap it goes on at the other end. A match is selected,
-// so the next search goes on behind it. An empty match where the search starts does not count, nor
-// does one behind the last line end, where no line is.
+// A search runs from the end of the selection (or the cursor) to the end of the text. Backward it
+// runs from the start of the selection to the start of the text. With `wrap` it continues at the
+// other end. A match is selected, so the next search starts after it. An empty match at the start
+// of a search does not count, nor does one after the last line end.
 #include <optional>
 
 #include "document/Regex.h"
@@ -16,7 +16,7 @@ namespace {
 using Kind = ParameterKind;
 using Match = Regex::Match;
 
-// The matches in the present document, whose text must not change meanwhile.
+// Finds matches in a document, whose text must not change meanwhile.
 class Search {
  public:
   Search(const Document& searched, const Regex& expression)
@@ -46,7 +46,7 @@ class Search {
   const Regex& regex;
 };
 
-// Runs `work` with the call's expression. The options follow the parameter `last`.
+// Runs `work` with the call's expression. The options are the parameter after `last`.
 template <class Work>
 MacroResult WithRegex(MacroCall& call, bool plain, std::size_t last, const Work& work) try {
   const auto words = call.Words(last + 1);
@@ -54,7 +54,7 @@ MacroResult WithRegex(MacroCall& call, bool plain, std::size_t last, const Work&
                                    words.contains("whole_word"), call.document().Flat().utf8});
   return work(regex, words);
 } catch (const RegexError& error) {
-  call.Fail(0, std::string("a regular expression that works (") + error.what() + ")");
+  call.Fail(0, std::string("a valid regular expression (") + error.what() + ")");
 }
 
 std::optional<Match> FindMatch(const Document& document, const Regex& regex,
@@ -127,8 +127,8 @@ MacroResult ReplaceAll(MacroCall& call, bool plain) {
 MacroResult MatchGroup(MacroCall& call) {
   const std::size_t group = call.Number(0), count = call.editor.lastMatch.size();
   if (group >= count)
-    call.Fail(0, count == 0 ? "something found before"
-                            : "a group from 0 to " + std::to_string(count - 1));
+    call.Fail(0,
+              count == 0 ? "an earlier match" : "a group from 0 to " + std::to_string(count - 1));
   return call.editor.lastMatch[group].value_or("");
 }
 
@@ -144,38 +144,39 @@ const std::vector<MacroFunction> kFunctions = {
     {"find",
      {kText, kOptions},
      kNumber,
-     "selects the next such text; 1, or 0 for none",
+     "selects the next occurrence of a text; returns 1, or 0 if there is none",
      [](MacroCall& call) { return Find(call, true); }},
     {"find_regex",
      {kPattern, kOptions},
      kNumber,
-     "selects the next match of a regular expression; 1, or 0 for none",
+     "selects the next match of a regular expression; returns 1, or 0 if there is none",
      [](MacroCall& call) { return Find(call, false); }},
     {"match_group",
      {{"group", Kind::kCount}},
      ResultKind::kText,
-     "the text of a group of what was found last; of group 0 the whole match",
+     "returns the text of a group of the last match; group 0 is the whole match",
      MatchGroup},
     {"replace",
      {kText, kReplacement, kOptions},
      kNumber,
-     "replaces the next such text; 1, or 0 for none",
+     "replaces the next occurrence of a text; returns 1, or 0 if there is none",
      [](MacroCall& call) { return Replace(call, true); }},
     {"replace_regex",
      {kPattern, kReplacement, kOptions},
      kNumber,
      "replaces the next match of a regular expression; $1 or \\1 is a group, ${name} a named one; "
-     "1, or 0 for none",
+     "returns 1, or 0 if there is none",
      [](MacroCall& call) { return Replace(call, false); }},
     {"replace_all",
      {kText, kReplacement, kAllOptions},
      kNumber,
-     "replaces every such text; how often",
+     "replaces every occurrence of a text; returns how many",
      [](MacroCall& call) { return ReplaceAll(call, true); }},
     {"replace_all_regex",
      {kPattern, kReplacement, kAllOptions},
      kNumber,
-     "replaces every match of a regular expression, with groups as in replace_regex; how often",
+     "replaces every match of a regular expression, with groups as in replace_regex; returns how "
+     "many",
      [](MacroCall& call) { return ReplaceAll(call, false); }},
 };
 

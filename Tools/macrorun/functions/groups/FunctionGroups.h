@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: MIT
-// The groups of macro functions, each in the file of its name.
+// The groups of macro functions.
 //
-// Errors: a function throws WrongCall (MacroCall::Fail) before it changes anything. One that
-// answers a text changes nothing at all, since whether the text can pass shows only afterwards.
+// Errors: a function throws WrongCall (MacroCall::Fail) before it changes anything. A function that
+// returns a text must not change anything, because the text is checked after the call.
 #pragma once
 
 #include <span>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Whole lines. Those that take a range of lines take its first and its last one.
+// Whole lines. A range of lines is given by its first and last line.
 #include <algorithm>
 #include <numeric>
 #include <utility>
@@ -12,7 +12,7 @@ namespace {
 
 using Kind = ParameterKind;
 
-// A text's lines; a line end at its end ends the last one, so the empty text has none.
+// A text's lines. A final line end does not start another line, so the empty text has none.
 std::vector<std::string> LinesOf(const std::string& text) {
   std::vector<std::string> lines;
   const Document document(text);
@@ -53,7 +53,7 @@ MacroResult DuplicateLine(MacroCall& call) {
   return 0;
 }
 
-// Answers 1, or 0 for a line that has none on that side.
+// Returns 1, or 0 when there is no line in that direction.
 MacroResult MoveLine(MacroCall& call, bool down) {
   const std::size_t line = call.LineOrCursor(0);
   if (line == (down ? call.document().LineCount() : 1)) return 0;
@@ -96,17 +96,17 @@ const std::vector<MacroFunction> kFunctions = {
     {"line_count",
      {},
      kNumber,
-     "the number of lines",
+     "returns the number of lines",
      [](MacroCall& call) { return Answer(call.document().LineCount()); }},
     {"get_line",
      {kLine},
      ResultKind::kText,
-     "the text of a line, without its line end",
+     "returns the text of a line without its line end",
      [](MacroCall& call) -> MacroResult { return call.document().Line(call.Number(0)); }},
     {"line_length",
      {kLine},
      kNumber,
-     "the number of a line's characters",
+     "returns the number of characters of a line",
      [](MacroCall& call) { return Answer(CharacterCount(call.document().Line(call.Number(0)))); }},
     {"set_line",
      {kLine, kLineText},
@@ -133,33 +133,33 @@ const std::vector<MacroFunction> kFunctions = {
     {"replace_lines",
      {kFirst, kLast, {"text", Kind::kText}},
      kNone,
-     "puts a text's lines in the place of those from the first to the last",
+     "replaces the lines from the first to the last by the lines of a text",
      ReplaceLines},
     {"join_lines",
-     {kFirst, kLast, {"separator", Kind::kLineText, "a blank"}},
+     {kFirst, kLast, {"separator", Kind::kLineText, "a space"}},
      kNone,
-     "makes one line of those from the first to the last, with a text between",
+     "joins the lines from the first to the last with a separator",
      JoinLines},
     {"split_line",
      {kLine, {"column", Kind::kColumn}},
      kNone,
-     "begins a new line at a column of a line",
+     "splits a line before a column",
      SplitLine},
-    {"duplicate_line", {kOptionalLine}, kNone, "repeats a line behind it", DuplicateLine},
+    {"duplicate_line", {kOptionalLine}, kNone, "inserts a copy of a line after it", DuplicateLine},
     {"move_line_up",
      {kOptionalLine},
      kNumber,
-     "moves a line before the one above; 1, or 0 for the first",
+     "moves a line up; returns 1, or 0 for the first line",
      [](MacroCall& call) { return MoveLine(call, false); }},
     {"move_line_down",
      {kOptionalLine},
      kNumber,
-     "moves a line behind the one below; 1, or 0 for the last",
+     "moves a line down; returns 1, or 0 for the last line",
      [](MacroCall& call) { return MoveLine(call, true); }},
     {"sort_lines",
      {kFirst, kLast, {"options", Kind::kWords, "none", {"descending", "ignore_case", "unique"}}},
      kNumber,
-     "sorts the lines from the first to the last; how many are left",
+     "sorts the lines from the first to the last; returns how many remain",
      SortLines},
 };
 

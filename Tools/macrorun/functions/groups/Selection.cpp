@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The selection: from a place up to the cursor, which is at its end.
+// The selection, which ends at the cursor.
 #include "document/Motion.h"
 #include "functions/MacroCall.h"
 #include "functions/groups/FunctionGroups.h"
@@ -15,11 +15,11 @@ MacroResult Select(MacroCall& call, Range range) {
 
 MacroResult SelectPlaces(MacroCall& call) {
   const Range range = {call.At(0), call.At(2)};
-  if (range.to < range.from) call.Fail(2, "a place that is not before the first");
+  if (range.to < range.from) call.Fail(2, "a position that is not before the first");
   return Select(call, range);
 }
 
-// With its line end, so that deleting the selection deletes the line.
+// Includes the line end, so that deleting the selection deletes the line.
 MacroResult SelectLine(MacroCall& call) {
   const std::size_t line = call.LineOrCursor(0);
   const Document& document = call.document();
@@ -42,7 +42,7 @@ const std::vector<MacroFunction> kFunctions = {
       {"last_line", Kind::kLineOrEnd},
       {"last_column", Kind::kColumn}},
      kNone,
-     "selects from one place up to another, where the cursor goes",
+     "selects from one position to another; the cursor moves to the end",
      SelectPlaces},
     {"select_all",
      {},
@@ -54,35 +54,39 @@ const std::vector<MacroFunction> kFunctions = {
      kNone,
      "selects a line with its line end",
      SelectLine},
-    {"select_word", {}, kNumber, "selects the word at the cursor; 1, or 0 without one", SelectWord},
+    {"select_word",
+     {},
+     kNumber,
+     "selects the word at the cursor; returns 1, or 0 without a word",
+     SelectWord},
     {"selection",
      {},
      ResultKind::kText,
-     "the selected text, with \\n for a line end",
+     "returns the selected text; a line end is \\n",
      [](MacroCall& call) -> MacroResult {
        return call.document().Text(call.document().Selection());
      }},
     {"has_selection",
      {},
      kNumber,
-     "1 when something is selected, else 0",
+     "returns 1 when something is selected, otherwise 0",
      [](MacroCall& call) -> MacroResult { return call.document().HasSelection() ? 1 : 0; }},
     {"selection_line",
      {},
      kNumber,
-     "the line in which the selection begins",
+     "returns the line where the selection begins",
      [](MacroCall& call) { return Answer(call.document().Selection().from.line); }},
     {"selection_column",
      {},
      kNumber,
-     "the column at which the selection begins",
+     "returns the column where the selection begins",
      [](MacroCall& call) {
        return Answer(ColumnOf(call.document(), call.document().Selection().from));
      }},
     {"replace_selection",
      {{"text", Kind::kText}},
      kNone,
-     "puts a text in the place of the selection and selects it",
+     "replaces the selection by a text and selects that text",
      [](MacroCall& call) -> MacroResult {
        Document& document = call.document();
        const Position from = document.Selection().from;
@@ -92,7 +96,7 @@ const std::vector<MacroFunction> kFunctions = {
     {"clear_selection",
      {},
      kNone,
-     "selects nothing; the cursor stays",
+     "ends the selection; the cursor stays",
      [](MacroCall& call) -> MacroResult {
        call.document().MoveCursor(call.document().Cursor());
        return 0;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The text as a whole and in pieces. What passes in one call is limited (MacroFunctions.h), so long
-// texts are read by get_text with a count and written by set_text followed by append_text.
+// The text, whole or in pieces. One call passes a limited length (MacroFunctions.h). So macros read
+// long texts with get_text and a count, and write them with set_text and append_text.
 #include <limits>
 
 #include "document/Characters.h"
@@ -11,7 +11,7 @@ namespace {
 
 using Kind = ParameterKind;
 
-// Stops early: no more than what can pass is of use, but one character more shows that it is more.
+// Stops at 8192 bytes, which are enough to detect that the text is too long for a result.
 MacroResult GetText(MacroCall& call) {
   const Document& document = call.document();
   std::size_t left = call.Number(2, std::numeric_limits<std::size_t>::max());
@@ -47,7 +47,7 @@ const std::vector<MacroFunction> kFunctions = {
     {"write",
      {{"text", Kind::kText}},
      kNone,
-     "inserts text at the cursor, or for the selection, and moves the cursor behind it",
+     "replaces the selection by a text, or inserts it at the cursor; the cursor moves after it",
      [](MacroCall& call) -> MacroResult {
        call.document().Write(call.Text(0));
        return 0;
@@ -57,17 +57,17 @@ const std::vector<MacroFunction> kFunctions = {
       {"column", Kind::kColumn, "1"},
       {"count", Kind::kCount, "all that follow"}},
      ResultKind::kText,
-     "the text from a place on",
+     "returns the text from a position on",
      GetText},
     {"set_text",
      {{"text", Kind::kText}},
      kNone,
-     "replaces the whole text; the cursor goes to its start",
+     "replaces the whole text and moves the cursor to its start",
      SetText},
     {"append_text",
      {{"text", Kind::kText}},
      kNone,
-     "adds text at the end",
+     "adds a text at the end",
      [](MacroCall& call) -> MacroResult {
        const Position end = call.document().TextEnd();
        call.document().Replace({{{end, end}, call.Text(0)}});
@@ -76,7 +76,7 @@ const std::vector<MacroFunction> kFunctions = {
     {"text_length",
      {},
      kNumber,
-     "the number of characters; a line end is one",
+     "returns the number of characters; a line end counts as one",
      [](MacroCall& call) { return Answer(CharacterCount(call.document().Flat().text)); }},
 };
 

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Undo and redo in the current document. The steps of the running macro are its calls, those before
-// it whole macros.
+// Undo and redo in the current document. A step is a call of the running macro, or an earlier
+// macro.
 #include "functions/MacroCall.h"
 #include "functions/groups/FunctionGroups.h"
 
@@ -12,12 +12,12 @@ const std::vector<MacroFunction> kFunctions = {
     {"undo",
      {},
      kNumber,
-     "takes back the last change; 1, or 0 without one",
+     "undoes the last change; returns 1, or 0 if there is none",
      [](MacroCall& call) -> MacroResult { return call.document().Undo() ? 1 : 0; }},
     {"redo",
      {},
      kNumber,
-     "makes the change taken back last again; 1, or 0 without one",
+     "redoes the last undone change; returns 1, or 0 if there is none",
      [](MacroCall& call) -> MacroResult { return call.document().Redo() ? 1 : 0; }},
 };
 
