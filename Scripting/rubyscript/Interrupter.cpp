@@ -2,8 +2,9 @@
 #include "Interrupter.h"
 
 #include "Interpreter.h"
+// Last: they rename what the headers above use.
 #include "RubyCall.h"
-// Last: it renames what the headers above use.
+#include "RubyInternals.h"
 #include <ruby.h>
 #include <ruby/debug.h>
 #include <ruby/thread.h>
@@ -13,8 +14,8 @@ namespace {
 // A fault by the rules of the host's guard: an error, of a customer's own.
 constexpr DWORD kUnstoppable = 0xE0525542;
 
-HANDLE wakeEvent = nullptr;  // made once, before the first macro
-VALUE interrupterThread = Qnil;
+HANDLE wakeEvent = nullptr;   // made once, before the first macro
+HANDLE mainHandle = nullptr;  // of the interpreter's thread
 VALUE mainThread = Qnil;
 bool waiting = false;  // the thread has come to its first wait
 
@@ -57,14 +58,22 @@ void OnEvent(rb_event_flag_t, VALUE, VALUE, ID, VALUE) {
   LeaveTask();
 }
 
+// As Thread#raise, without the events of a call: the macro may trace those.
 VALUE RaiseOnMainThread(VALUE) {
-  return rb_funcall(mainThread, rb_intern("raise"), 1, StopClass());
+  void* const thread = RTYPEDDATA_DATA(mainThread);
+  rb_threadptr_pending_interrupt_enque(thread, rb_obj_alloc(StopClass()));
+  rb_threadptr_interrupt(thread);
+  return Qnil;
 }
 
+// CRuby reads standard input in a call of the system that its own interrupts do not end. The lock of
+// the interpreter is held here, so the thread is not in a call of the host.
 VALUE Deliver(VALUE) {
   if (++deliveries == 2)
     rb_add_event_hook(OnEvent, RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL, Qnil);
-  return RaiseOnMainThread(Qnil);
+  RaiseOnMainThread(Qnil);
+  CancelSynchronousIo(mainHandle);
+  return Qnil;
 }
 
 // Threads may switch between the look and the exception; Settle lets this come to its end first.
@@ -99,22 +108,28 @@ VALUE Interrupt(void*) {
 
 }  // namespace
 
-void Interrupter::EnsureAlive() {
-  if (!wakeEvent) {
-    wakeEvent = CreateEventW(nullptr, FALSE, FALSE, nullptr);
-    if (!wakeEvent) return;  // tried again by the next macro
-    mainThread = rb_thread_current();
-    rb_gc_register_address(&mainThread);
-    rb_gc_register_address(&interrupterThread);
-  }
-  if (interrupterThread != Qnil && RTEST(rb_funcall(interrupterThread, rb_intern("alive?"), 0)))
-    return;
-  waiting = false;
-  interrupterThread = rb_thread_create(Interrupt, nullptr);
+static VALUE CreateRubyThread(VALUE, VALUE, int, const VALUE*, VALUE) {
+  return rb_thread_create(Interrupt, nullptr);
+}
+
+void Interrupter::EnsureStarted() {
+  if (waiting) return;
+  wakeEvent = CreateEventW(nullptr, FALSE, FALSE, nullptr);
+  if (!wakeEvent) return;  // tried again by the next macro
+  mainHandle = OpenThread(THREAD_TERMINATE, FALSE, GetCurrentThreadId());
+  mainThread = rb_thread_current();
+  rb_gc_register_mark_object(mainThread);
+  // The thread inherits the mask: a macro that finds it can neither end it nor raise anything in it.
+  VALUE mask = rb_hash_new();
+  rb_hash_aset(mask, rb_cObject, ID2SYM(rb_intern("never")));
+  const VALUE thread =
+      rb_block_call(rb_cThread, rb_intern("handle_interrupt"), 1, &mask, CreateRubyThread, Qnil);
   while (!waiting) rb_thread_schedule();  // else a macro could be slow to let it start
-  // Else it gives the macro the next tenth of a second, too, when one has gone by as it gets its turn.
-  rb_funcall(interrupterThread, rb_intern("priority="), 1, INT2FIX(3));
-  rb_funcall(ActiveScriptModule(), rb_intern("interrupter="), 1, interrupterThread);
+  // Else it waits for the end of the macro's time slice when it is due.
+  rb_funcall(thread, rb_intern("priority="), 1, INT2FIX(3));
+  const VALUE group = rb_class_new_instance(0, nullptr, rb_path2class("ThreadGroup"));
+  rb_funcall(group, rb_intern("add"), 1, thread);
+  rb_funcall(ActiveScriptModule(), rb_intern("interrupter="), 1, thread);
 }
 
 void Interrupter::StopMainThread() {

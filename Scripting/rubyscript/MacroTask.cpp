@@ -8,6 +8,7 @@
 // Last: they rename what the headers above use.
 #include "ComObject.h"
 #include "RubyCall.h"
+#include "RubyInternals.h"
 #include "VariantConversion.h"
 
 static_assert(sizeof(VALUE) == sizeof(unsigned long) && Qfalse == 0, "EngineState holds a value");
@@ -27,7 +28,7 @@ static VALUE StringOf(BSTR text, TextForm form) {
 // The context with all items that are new.
 VALUE MacroTask::PrepareBody(VALUE data) {
   MacroTask& task = From(data);
-  Interrupter::EnsureAlive();
+  Interrupter::EnsureStarted();
   if (!task.engineState.context) {
     const VALUE isByteHost = task.engineState.form == TextForm::kBytes ? Qtrue : Qfalse;
     const volatile VALUE context =  // collecting finds it on the stack
@@ -52,36 +53,116 @@ VALUE MacroTask::Compile() {
                     ULONG2NUM(firstLine + 1), ULONG2NUM(cookie), persistent ? Qtrue : Qfalse);
 }
 
-VALUE MacroTask::CallFunction() {
-  const VALUE list = rb_ary_new();
-  for (UINT i = arguments->cArgs; i-- > 0;)
-    rb_ary_push(list, FromVariant(arguments->rgvarg[i], engineState.form));
-  return rb_funcall(engineState.context, rb_intern("call"), 2, StringOf(text, TextForm::kUtf16),
-                    list);
-}
-
 VALUE MacroTask::WorkBody(VALUE data) {
   MacroTask& task = From(data);
-  switch (task.kind) {
-    case Kind::kCompile:
-      return task.Compile();
-    case Kind::kRun: {
-      const VALUE value = rb_funcall(task.engineState.context, rb_intern("run"), 0);
-      return task.wantsValue ? ToVariantValue(value, task.engineState.form) : Qnil;
-    }
-    case Kind::kCall:
-      return ToVariantValue(task.CallFunction(), task.engineState.form);
-    case Kind::kDefines:
-      return rb_funcall(task.engineState.context, rb_intern("defines?"), 1,
-                        StringOf(task.text, TextForm::kUtf16));
-    case Kind::kDiscard:
-      break;
+  if (task.kind == Kind::kCompile) return task.Compile();
+  return rb_funcall(task.engineState.context, rb_intern("defines?"), 1,
+                    StringOf(task.text, TextForm::kUtf16));
+}
+
+// --- The macro's own code ------------------------------------------------------------------------
+
+// Called without a Ruby method in between, so that its backtraces hold no frame of the engine.
+struct MacroTask::Code {
+  MacroTask& task;
+  VALUE list;   // what is compiled, or the function's arguments
+  VALUE value;  // of the code
+  VALUE block;  // of at_exit
+  VALUE error;  // of the code or the block before; nil without one
+};
+
+static MacroTask::Code& CodeFrom(VALUE data) { return *reinterpret_cast<MacroTask::Code*>(data); }
+
+VALUE MacroTask::StartBody(VALUE data) {
+  Code& code = CodeFrom(data);
+  MacroTask& task = code.task;
+  const VALUE context = task.engineState.context;
+  rb_funcall(context, rb_intern("start_work"), 0);
+  if (task.kind == Kind::kRun) {
+    code.list = rb_funcall(context, rb_intern("take_codes"), 0);
+  } else {
+    code.list = rb_ary_new();
+    for (UINT i = task.arguments->cArgs; i-- > 0;)
+      rb_ary_push(code.list, FromVariant(task.arguments->rgvarg[i], task.engineState.form));
   }
   return Qnil;
 }
 
+VALUE MacroTask::CodeBody(VALUE data) {
+  Code& code = CodeFrom(data);
+  MacroTask& task = code.task;
+  if (task.kind == Kind::kCall) {
+    const VALUE name = StringOf(task.text, TextForm::kUtf16);
+    const VALUE main = rb_funcall(task.engineState.context, rb_intern("main"), 0);
+    return rb_apply(main, rb_intern_str(name), code.list);
+  }
+  VALUE value = Qnil;
+  for (long i = 0; i < RARRAY_LEN(code.list); ++i)
+    value = rb_iseq_eval(rb_iseqw_to_iseq(rb_ary_entry(code.list, i)));
+  return value;
+}
+
+VALUE MacroTask::NextBlockBody(VALUE data) {
+  Code& code = CodeFrom(data);
+  return code.block = rb_funcall(code.task.engineState.context, rb_intern("next_exit_block"), 1,
+                                 code.error);
+}
+
+VALUE MacroTask::ExitBlockBody(VALUE data) {
+  rb_set_errinfo(CodeFrom(data).error);  // as `$!`
+  return rb_proc_call(CodeFrom(data).block, rb_ary_new());
+}
+
+// The error to report, or nil; the value is converted in the latter case.
+VALUE MacroTask::FinishBody(VALUE data) {
+  Code& code = CodeFrom(data);
+  const MacroTask& task = code.task;
+  rb_set_errinfo(Qnil);
+  const VALUE error = rb_funcall(task.engineState.context, rb_intern("finish_work"), 0);
+  const bool wanted = NIL_P(error) && (task.kind == Kind::kCall || task.wantsValue);
+  code.value = wanted ? ToVariantValue(code.value, task.engineState.form) : Qnil;
+  return error;
+}
+
+VALUE MacroTask::EndBody(VALUE data) {
+  return rb_funcall(From(data).engineState.context, rb_intern("end_work"), 0);
+}
+
+// The code, then the blocks of at_exit, each of which sees the last error.
+Outcome MacroTask::RunCode(Code& code) {
+  const VALUE self = reinterpret_cast<VALUE>(&code);
+  Outcome outcome = Protect(StartBody, self, code.error);
+  if (outcome != Outcome::kDone) return outcome;
+  VALUE (*body)(VALUE) = CodeBody;
+  VALUE answer;
+  do {
+    outcome = Protect(body, self, answer);
+    if (outcome == Outcome::kLeft) return code.error = answer, outcome;
+    if (outcome == Outcome::kDone && body == CodeBody) code.value = answer;
+    if (outcome == Outcome::kRaised) code.error = answer;
+    outcome = Protect(NextBlockBody, self, answer);
+    if (outcome != Outcome::kDone) return code.error = answer, outcome;
+    body = ExitBlockBody;
+  } while (!NIL_P(code.block));
+  outcome = Protect(FinishBody, self, code.error);
+  return outcome == Outcome::kDone && !NIL_P(code.error) ? Outcome::kRaised : outcome;
+}
+
+Outcome MacroTask::RunMacro(VALUE& outcomeValue) {
+  Code code = {*this, Qnil, Qnil, Qnil, Qnil};
+  VALUE ignored;
+  const Outcome outcome = RunCode(code);
+  Protect(EndBody, reinterpret_cast<VALUE>(this), ignored);
+  outcomeValue = outcome == Outcome::kDone ? code.value : code.error;
+  return outcome;
+}
+
 VALUE MacroTask::LeaveBody(VALUE data) {
   return rb_funcall(From(data).engineState.context, rb_intern("leave"), 0);
+}
+
+VALUE MacroTask::FinalizeBody(VALUE data) {
+  return rb_funcall(From(data).engineState.context, rb_intern("run_finalizers"), 0);
 }
 
 VALUE MacroTask::DiscardBody(VALUE data) {
@@ -170,7 +251,9 @@ void MacroTask::Work() {
   result = E_ABORT;
   Interpreter::SetInterruptible(true);
   if (!Interpreter::MustEnd()) {  // else it was interrupted before it began
-    const Outcome outcome = Protect(WorkBody, reinterpret_cast<VALUE>(this), outcomeValue);
+    const bool isMacro = kind == Kind::kRun || kind == Kind::kCall;
+    const Outcome outcome = isMacro ? RunMacro(outcomeValue)
+                                    : Protect(WorkBody, reinterpret_cast<VALUE>(this), outcomeValue);
     if (outcome == Outcome::kDone) SetValue(outcomeValue);
     if (outcome == Outcome::kRaised) {
       Interrupter::Settle();  // threads of the macro's may have raised more
@@ -183,11 +266,22 @@ void MacroTask::Work() {
   TellInterruption(outcomeValue);
 }
 
+// Finalizers are the macro's code.
+void MacroTask::Discard() {
+  VALUE ignored;
+  const VALUE self = reinterpret_cast<VALUE>(this);
+  Interpreter::SetInterruptible(true);
+  Protect(FinalizeBody, self, ignored);
+  Interpreter::SetInterruptible(false);
+  Interrupter::Settle();
+  Protect(DiscardBody, self, ignored);
+}
+
 void MacroTask::Run() {
   VALUE ignored;
   const VALUE self = reinterpret_cast<VALUE>(this);
   if (kind == Kind::kDiscard) {
-    if (engineState.context) Protect(DiscardBody, self, ignored);
+    if (engineState.context) Discard();
     result = S_OK;
     return;
   }
@@ -198,5 +292,5 @@ void MacroTask::Run() {
   Work();
   Protect(LeaveBody, self, ignored);
   // Nobody may ever close this engine.
-  if (Interpreter::IsAbandoned()) Protect(DiscardBody, self, ignored);
+  if (Interpreter::IsAbandoned()) Discard();
 }

@@ -16,6 +16,8 @@
 #include "ScriptError.h"
 #include "TextCoding.h"
 
+enum class Outcome;  // see RubyCall.h
+
 // An object that the host publishes under a name.
 struct NamedItem {
   BSTR name;
@@ -60,6 +62,8 @@ class MacroTask final : public RubyTask {
   bool wantsValue = false;                // of kRun
   const DISPPARAMS* arguments = nullptr;  // read before any macro code runs
 
+  struct Code;  // one run of the macro's code
+
   HRESULT result = E_FAIL;
   ScriptError* error = nullptr;  // owned; null when there is none
   VARIANT value = {};            // owned
@@ -68,11 +72,20 @@ class MacroTask final : public RubyTask {
   static unsigned long PrepareBody(unsigned long task);
   static unsigned long WorkBody(unsigned long task);
   static unsigned long LeaveBody(unsigned long task);
+  static unsigned long FinalizeBody(unsigned long task);
   static unsigned long DiscardBody(unsigned long task);
   static unsigned long DescribeBody(unsigned long data);
+  static unsigned long StartBody(unsigned long code);
+  static unsigned long CodeBody(unsigned long code);
+  static unsigned long NextBlockBody(unsigned long code);
+  static unsigned long ExitBlockBody(unsigned long code);
+  static unsigned long FinishBody(unsigned long code);
+  static unsigned long EndBody(unsigned long task);
   unsigned long Compile();
-  unsigned long CallFunction();
+  Outcome RunCode(Code& code);
+  Outcome RunMacro(unsigned long& value);
   void Work();
+  void Discard();
   // `hostText` of an interruption, else null.
   void SetError(unsigned long exception, BSTR hostText = nullptr);
   void TellInterruption(unsigned long exception);

@@ -4,10 +4,12 @@
 #include <io.h>
 
 #include "Interpreter.h"
+#include "ProcessGuards.h"
 #include "ProcessStateSnapshot.h"
 // Last: they rename what the headers above use.
 #include "ComObject.h"
 #include "RubyCall.h"
+#include "RubyInternals.h"
 #include "VariantConversion.h"
 
 namespace {
@@ -82,7 +84,49 @@ VALUE* TopSelfSlot() {
   return slot;
 }
 
-VALUE SetTopSelf(VALUE, VALUE object) { return *TopSelfSlot() = object; }
+// TOPLEVEL_BINDING begins with the same object, which `eval` and ERB use.
+VALUE SetTopSelf(VALUE, VALUE object) {
+  static const VALUE binding = rb_const_get(rb_cObject, rb_intern("TOPLEVEL_BINDING"));
+  *TopSelfSlot() = object;
+  RB_OBJ_WRITE(binding, static_cast<VALUE*>(RTYPEDDATA_DATA(binding)), object);
+  return object;
+}
+
+VALUE LabelBlockAsMain(VALUE child, VALUE, int, const VALUE*, VALUE);
+
+// Replaces "<compiled>" by "<main>" in the labels of a code and its blocks. CRuby has no setter: the
+// label is found in the code's structure by its value.
+VALUE LabelAsMain(VALUE, VALUE code) {
+  constexpr int kFields = 40;  // of which it is about the twentieth
+  VALUE* const iseq = static_cast<VALUE*>(const_cast<void*>(rb_iseqw_to_iseq(code)));
+  VALUE* const fields = reinterpret_cast<VALUE*>(iseq[2]);
+  const VALUE label = rb_funcall(code, rb_intern("label"), 0);
+  const char* const compiled = strstr(RSTRING_PTR(label), "<compiled>");
+  if (!compiled) return Qnil;  // a method or a class, and so are its blocks
+  const VALUE name = rb_str_freeze(
+      rb_sprintf("%.*s<main>", static_cast<int>(compiled - RSTRING_PTR(label)), RSTRING_PTR(label)));
+  for (int i = 0; i < kFields; ++i)
+    if (fields[i] == label) RB_OBJ_WRITE(reinterpret_cast<VALUE>(iseq), &fields[i], name);
+  rb_block_call(code, rb_intern("each_child"), 0, nullptr, LabelBlockAsMain, Qnil);
+  return Qnil;
+}
+
+VALUE LabelBlockAsMain(VALUE child, VALUE, int, const VALUE*, VALUE) {
+  return LabelAsMain(Qnil, child);
+}
+
+// `rescue` asks this. No class of exceptions takes the end of an interrupted macro.
+VALUE TakesException(VALUE exceptionClass, VALUE object) {
+  if (rb_obj_class(object) == StopClass()) return exceptionClass == StopClass() ? Qtrue : Qfalse;
+  return rb_obj_is_kind_of(object, exceptionClass);
+}
+
+// CRuby ends a Ractor with its main thread.
+VALUE EndRactor(VALUE, VALUE ractor) {
+  const VALUE threads = rb_ractor_thread_list(RTYPEDDATA_DATA(ractor));
+  for (long i = 0; i < RARRAY_LEN(threads); ++i) rb_thread_kill(rb_ary_entry(threads, i));
+  return Qnil;
+}
 
 VALUE Global(VALUE, VALUE name) { return rb_gv_get(rb_id2name(SYM2ID(name))); }
 
@@ -96,8 +140,14 @@ VALUE DefineModule(VALUE) {
   rb_define_singleton_method(module, "can_call?", CanCall, 0);
   rb_define_singleton_method(module, "lowest_descriptor", LowestDescriptor, 0);
   rb_define_singleton_method(module, "top_self=", SetTopSelf, 1);
+  rb_define_singleton_method(module, "label_as_main", LabelAsMain, 1);
   rb_define_singleton_method(module, "global", Global, 1);
   rb_define_singleton_method(module, "set_global", SetGlobal, 2);
+  rb_define_singleton_method(module, "end_ractor", EndRactor, 1);
+  rb_ext_ractor_safe(true);  // Ractors use `rescue`
+  rb_define_singleton_method(rb_eException, "===", TakesException, 1);
+  rb_ext_ractor_safe(false);
+  DefineProcessGuards();
   DefineComObject(module);
   const VALUE binding = rb_const_get(rb_cObject, rb_intern("TOPLEVEL_BINDING"));
   for (const PreludeFile& file : kPrelude)

@@ -3,6 +3,8 @@
 // thread interrupts the macro. The next one is as if nothing had been.
 #include "EngineHost.h"
 
+#include <fcntl.h>
+#include <io.h>
 #include <setjmp.h>
 
 #include <algorithm>
@@ -112,7 +114,15 @@ static double Interrupted(Host& host, const std::string& macro, DWORD wait = 20)
   return 1000.0 * (end.QuadPart - start.QuadPart) / frequency.QuadPart;
 }
 
+// Standard input becomes a pipe that stays empty.
+static void WaitForInput() {
+  int ends[2];
+  ASSERT_EQ(0, _pipe(ends, 64, _O_BINARY));
+  ASSERT_EQ(0, _dup2(ends[0], 0));
+}
+
 TEST(Ending, Interrupts) {
+  WaitForInput();
   Host host;
   host.item.Add("f");
   double longest = 0;

@@ -7,6 +7,10 @@ module ActiveScript
   class Context
     Source = Struct.new(:lines, :first_line, :cookie)
 
+    # One run of the macro's code: how many frames belong to outer macros, which Ractors were there
+    # before, and its errors in order.
+    Work = Struct.new(:outer_frames, :ractors, :errors)
+
     ENTERED = [] # innermost last
     private_constant :ENTERED
 
@@ -26,6 +30,8 @@ module ActiveScript
       @queue = []
       @persistent = []
       @exit_blocks = []
+      @works = [] # innermost last
+      @finalizers = {} # by the ids of their objects
       @left_open = []
       @output = HostOutput.new(self, STDOUT)
       @error_output = HostOutput.new(self, STDERR)
@@ -57,6 +63,7 @@ module ActiveScript
       @data = source.match(/^__END__(?:\r?\n(.*)|\z)/m)&.then { |match| match[1].to_s } if source.valid_encoding?
       RubyVM.keep_script_lines = true
       code = RubyVM::InstructionSequence.compile(source, name, nil, first_line)
+      ActiveScript.label_as_main(code)
       @queue.push(code)
       @persistent.push(code) if persistent
       nil
@@ -78,17 +85,62 @@ module ActiveScript
     # Threads that are not the macro's to see.
     def foreign_threads = @threads - [Thread.main]
 
-    # Runs what is compiled; the value of the last code.
-    def run
+    # --- Around the macro's own code, which the native part calls ---------------------------------
+
+    def main = @globals_snapshot.main
+
+    def start_work
+      @works.push(Work.new(ENTERED.size > 1 ? caller.size : 0, ractors, []))
+    end
+
+    # What is compiled and has not run.
+    def take_codes
       codes, @queue = @queue, []
       Object.const_set(:DATA, StringIO.new(@data)) if @data && !Object.const_defined?(:DATA)
       @error_output.pass_on
-      value = nil
-      work { codes.each { |code| value = code.eval } }
-      value
+      codes
     end
 
-    def call(name, arguments) = work { @globals_snapshot.main.__send__(name, *arguments) }
+    # The next block of `at_exit`, or nil. `error` is the last one that the code or a block has raised.
+    def next_exit_block(error)
+      errors = @works.last.errors
+      errors.push(error) if error && !errors.last.equal?(error)
+      @exit_blocks.pop if @works.size == 1
+    end
+
+    # The error to report to the host, or nil.
+    def finish_work
+      @outer_frames = @works.last.outer_frames
+      error = choose_error(@works.last.errors)
+      finish_output(error)
+      error
+    end
+
+    def end_work
+      work = @works.pop or return
+      @outer_frames = work.outer_frames
+      end_ractors(work.ractors) if @works.empty?
+    end
+
+    # Runs once: when its object is collected, or at the end of the macro.
+    def finalizer(id, callable)
+      (@finalizers[id] ||= []).push(callable)
+      proc { @finalizers.delete(id)&.each { |each| each.call(id) } }
+    end
+
+    def forget_finalizers(id) = @finalizers.delete(id)
+
+    def run_finalizers
+      return if @finalizers.empty?
+      enter
+      begin
+        while (id, callables = @finalizers.shift)
+          callables.each { |each| run_finalizer(each, id) }
+        end
+      ensure
+        leave
+      end
+    end
 
     # Files that the macro has left open would stay locked. Closing the pipe of a process would wait
     # for its end.
@@ -154,31 +206,42 @@ module ActiveScript
       outer&.put_back
     end
 
-    # The block is the macro's code. What ends by `exit` has succeeded.
-    def work
-      nested, @running = @running, true
-      outer_frames = ENTERED.size > 1 ? caller.size : 0
-      value = nil
-      error = attempt { value = yield }
-      while !nested && (block = @exit_blocks.pop)
-        error = attempt(&block) || error
-      end
-      @output.finish
-      @error_output.finish
-      return value if !error || (SystemExit === error && error.success?)
-      raise error
-    ensure
-      @outer_frames = outer_frames # for the error's description
-      @running = nested
+    MAIN_ONLY = [Ractor.main].freeze
+    private_constant :MAIN_ONLY
+
+    def ractors = Ractor.count > 1 ? ObjectSpace.each_object(Ractor).to_a : MAIN_ONLY
+
+    # They run in parallel, so they are given a moment to end.
+    def end_ractors(others)
+      (ractors - others).each { |ractor| ActiveScript.end_ractor(ractor) }
+      100.times { Ractor.count > others.size ? sleep(0.01) : break }
     end
 
-    def attempt
-      yield
-      nil
-    rescue Stop
-      raise
+    def run_finalizer(callable, id)
+      callable.call(id)
     rescue Exception => error
-      error
+      @error_output.write(description(error, nil), "\n")
+    end
+
+    # As in Ruby, the last error decides over success, and each one is shown. Those that are not
+    # reported go to the error output.
+    def choose_error(errors)
+      telling = errors.reject { |error| SystemExit === error && !aborted?(error, message_of(error)) }
+      last = errors.last
+      success = !last || (SystemExit === last && last.success?)
+      reported = telling.first || last unless success
+      telling.each do |error|
+        @error_output.write(description(error, nil), "\n") unless error.equal?(reported)
+      end
+      reported
+    end
+
+    # The host's function may fail; the macro's error comes first.
+    def finish_output(error)
+      @output.finish
+      @error_output.finish
+    rescue StandardError
+      raise unless error
     end
 
     def open_files = ObjectSpace.each_object(IO).reject(&:closed?)
@@ -273,7 +336,6 @@ module ActiveScript
       first, rest = message.split("\n", 2)
       frames = own_frames(Array(error.backtrace)).select { |each| @sources.key?(each[/\A[^:]*/]) }
                                      .reject { |each| each.end_with?("in `method_missing'") }
-                                     .map { |each| each.sub("<compiled>'", "<main>'") }
       text = SyntaxError === error ? message : ["#{first}#{hint(error)} (#{error.class})", rest].compact.join("\n")
       [host_text || text, *frames.first(20).map { |frame| "\tfrom #{frame}" }].join("\n")
     end

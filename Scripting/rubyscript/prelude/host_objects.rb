@@ -4,8 +4,12 @@
 module ActiveScript
   MAIN = TOPLEVEL_BINDING.receiver
 
-  # Ends an interrupted macro where it cannot be left otherwise. No macro should rescue it.
-  class Stop < Exception; end
+  # Ends an interrupted macro where it cannot be left otherwise. It does not depend on methods of
+  # Exception that a macro may redefine.
+  class Stop < Exception
+    def initialize(*) = nil
+    def exception(*) = self
+  end
 
   # A date on its way to the host.
   OleDate = Struct.new(:days)

@@ -18,7 +18,33 @@ module ActiveScript
       @pending = String.new(encoding: Encoding::BINARY)
     end
 
+    # What it wrote to before, when it is reopened with it.
+    def initialize_copy(original)
+      super
+      @redirected = original.redirected
+    end
+
+    # Sends what follows to a file or another stream, or back to where a copy of this one writes.
+    # Child processes keep the process's own stream.
+    def reopen(target, mode = "w", **options)
+      finish
+      flush
+      @redirected = case target
+                    when HostOutput then target.redirected
+                    when IO, StringIO then target
+                    else File.open(target, mode, **options)
+                    end
+      self
+    end
+
+    # For child processes: `system(command, out: $stdout)`.
+    def to_io = @stream
+    def fileno = @stream.fileno
+
+    def inspect = "#<#{self.class}:#{@stream.inspect[/<([A-Z]+)>/, 1]}>"
+
     def write(*texts)
+      return @redirected.write(*texts) if @redirected
       texts.map!(&:to_s)
       texts.each { |text| @pending << as_utf8(text).b }
       # A stopped macro's last words have nowhere to go; a thread's wait for the main thread.
@@ -34,14 +60,18 @@ module ActiveScript
       character
     end
 
-    def flush = self
+    def flush
+      @redirected&.flush
+      self
+    end
+
     def sync = true
     def tty? = false
     alias isatty tty?
 
     # Also the last line, when it has no end.
     def finish
-      return if @pending.empty?
+      return if @pending.bytesize.zero?
       @pending << "\n" if @context.messenger && !@pending.end_with?("\n")
       pass_on
     end
@@ -50,13 +80,17 @@ module ActiveScript
 
     # What can be passed on by now.
     def pass_on
-      return if @pending.empty?
+      return if @pending.bytesize.zero?
       messenger = @context.messenger
       length = messenger ? (@pending.rindex("\n") || -1) + 1 : @pending.bytesize
       return if length.zero?
       text = @pending.slice!(0, length)
       messenger ? show(messenger, text.chomp) : write_through(text)
     end
+
+    protected
+
+    attr_reader :redirected
 
     private
 
@@ -72,10 +106,10 @@ module ActiveScript
       text.force_encoding(Encoding::UTF_8)
       return messenger.message(text.scrub) unless @context.byte_host
       text = text.b.gsub("\0", "\u2400".b)
-      loop do
+      return messenger.message(text.force_encoding(Encoding::UTF_8)) if text.bytesize <= LIMIT
+      (text.bytesize / (LIMIT - 4) + 1).times do
         piece = text.slice!(0, cut(text))
-        messenger.message(piece.force_encoding(Encoding::UTF_8))
-        break if text.empty?
+        messenger.message(piece.force_encoding(Encoding::UTF_8)) if piece.bytesize.positive?
       end
     end
 
