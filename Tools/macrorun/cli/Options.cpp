@@ -261,7 +261,7 @@ int Refuse(const std::string& text) {
 
 std::optional<int> ParseOptions(Options& options) {
   Texts texts;
-  CLI::App app("Runs a macro over a text and prints the text.", "macrorun");
+  CLI::App app("Runs a macro on a text and prints the result.", "macrorun");
   app.allow_windows_style_options(false);  // "/x/y" is a path
   app.formatter(std::make_shared<HelpFormatter>());
   app.get_formatter()->column_width(29);

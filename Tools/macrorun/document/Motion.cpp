@@ -5,13 +5,13 @@
 
 namespace {
 
-bool WordBehind(const Document& document, Position place) {
+bool WordAfter(const Document& document, Position place) {
   if (place >= document.EndOfLine(place.line)) return false;
   return IsWordAt(document.Line(place.line), place.offset);
 }
 
 bool WordBefore(const Document& document, Position place) {
-  return place.offset > 0 && WordBehind(document, PreviousCharacter(document, place));
+  return place.offset > 0 && WordAfter(document, PreviousCharacter(document, place));
 }
 
 }  // namespace
@@ -30,8 +30,8 @@ Position PreviousCharacter(const Document& document, Position place) {
 }
 
 Position NextWord(const Document& document, Position place) {
-  while (WordBehind(document, place)) place = NextCharacter(document, place);
-  while (place < document.TextEnd() && !WordBehind(document, place))
+  while (WordAfter(document, place)) place = NextCharacter(document, place);
+  while (place < document.TextEnd() && !WordAfter(document, place))
     place = NextCharacter(document, place);
   return place;
 }
@@ -46,7 +46,7 @@ Position PreviousWord(const Document& document, Position place) {
 Range WordAround(const Document& document, Position place) {
   Range word = {place, place};
   while (WordBefore(document, word.from)) word.from = PreviousCharacter(document, word.from);
-  while (WordBehind(document, word.to)) word.to = NextCharacter(document, word.to);
+  while (WordAfter(document, word.to)) word.to = NextCharacter(document, word.to);
   return word;
 }
 

@@ -5,15 +5,12 @@
 
 #include "functions/MacroFunctions.h"
 #include "host/RunningEngines.h"
-#include "xLib/xTexts.h"
+#include "report/ModuleTexts.h"
 
 namespace {
 
-constexpr std::string_view kUnknownFunction = "Call to unknown macro scripting function:  ";
-constexpr std::string_view kFollowUps[] = {"\nError parsing '", "\nError executing '"};
-
 bool IsFollowUp(std::string_view report) {
-  for (std::string_view beginning : kFollowUps)
+  for (std::string_view beginning : kFollowUpReports)
     if (report.starts_with(beginning)) return true;
   return false;
 }
@@ -30,8 +27,8 @@ void DiagnosticCollector::Take(std::string_view report) noexcept {
       AddStop(std::move(*error));
     else
       TakeScriptError(std::move(*error));
-  } else if (report.starts_with(kUnknownFunction)) {
-    runs.back().unknownFunction = report.substr(kUnknownFunction.size());
+  } else if (report.starts_with(kUnknownFunctionReport)) {
+    runs.back().unknownFunction = report.substr(kUnknownFunctionReport.size());
   } else if (IsFollowUp(report)) {
     runs.back().followUp = report;
   } else {

@@ -7,14 +7,9 @@
 #include <nlohmann/json.hpp>
 
 #include "platform/Encoding.h"
-#include "xLib/xTexts.h"
+#include "report/ModuleTexts.h"
 
 namespace {
-
-constexpr std::string_view kFileMark = " File: ";
-constexpr std::string_view kSourceMark = ") >> ";
-constexpr std::string_view kReasonMark = "\nReason: ";
-constexpr std::string_view kRubyName = kRubyMacroName;
 
 int Number(std::string_view digits) {
   int value = -1;
@@ -36,9 +31,9 @@ void ReadPosition(std::string_view text, Diagnostic& error) {
 }
 
 // The text after the place in "macro:3: text"; empty for other lines.
-std::string_view BehindPlace(std::string_view line) {
-  const std::size_t digits = kRubyName.size() + 1;
-  if (!line.starts_with(kRubyName) || line.substr(0, digits).back() != ':') return {};
+std::string_view TextAfterPlace(std::string_view line) {
+  const std::size_t digits = kRubyMacroName.size() + 1;
+  if (!line.starts_with(kRubyMacroName) || line.substr(0, digits).back() != ':') return {};
   const std::size_t end = line.find_first_not_of("0123456789", digits);
   if (end == line.npos || !line.substr(end).starts_with(": ")) return {};
   return line.substr(end + 2);
@@ -47,13 +42,13 @@ std::string_view BehindPlace(std::string_view line) {
 // Removes the place from the first line "macro:3: text". In a further line, of a second syntax
 // error, and in "from macro:3:in `f'" replaces the engine's name by the file.
 std::string WithoutEngineName(std::string_view line, const std::string& file, bool first) {
-  const std::string_view behind = BehindPlace(line);
-  if (first && !behind.empty()) return std::string(behind);
+  const std::string_view after = TextAfterPlace(line);
+  if (first && !after.empty()) return std::string(after);
   std::string text(line);
-  if (!behind.empty()) return text.replace(0, kRubyName.size(), file);
-  const std::string from = "from " + std::string(kRubyName) + ":";
+  if (!after.empty()) return text.replace(0, kRubyMacroName.size(), file);
+  const std::string from = "from " + std::string(kRubyMacroName) + ":";
   if (const std::size_t place = text.find(from); place != text.npos)
-    text.replace(place + 5, kRubyName.size(), file);
+    text.replace(place + 5, kRubyMacroName.size(), file);
   return text;
 }
 
@@ -61,7 +56,7 @@ bool IsUnderline(std::string_view line) {
   return line.find_first_not_of(" \t^~") == line.npos;  // true for an empty line
 }
 
-bool IsWarning(std::string_view line) { return BehindPlace(line).starts_with("warning: "); }
+bool IsWarning(std::string_view line) { return TextAfterPlace(line).starts_with("warning: "); }
 
 // A backtrace with one frame repeats the place of the error.
 void ForgetOwnPlace(Diagnostic& error) {
@@ -146,8 +141,8 @@ std::string WithFile(std::string_view text, const std::string& file) {
   std::string result;
   while (!text.empty()) {
     const std::string_view line = text.substr(0, text.find('\n'));
-    result +=
-        IsWarning(line) ? file + std::string(line.substr(kRubyName.size())) : std::string(line);
+    result += IsWarning(line) ? file + std::string(line.substr(kRubyMacroName.size()))
+                              : std::string(line);
     text.remove_prefix(line.size());
     if (text.empty()) break;
     result += '\n';

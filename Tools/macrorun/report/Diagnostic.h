@@ -28,7 +28,7 @@ struct Diagnostic {
 };
 
 // The Ruby engine's name of every macro. It gets the text without the file name.
-inline constexpr char kRubyMacroName[] = "macro";
+inline constexpr std::string_view kRubyMacroName = "macro";
 
 // An error without line and column. The path may be empty.
 Diagnostic PlainDiagnostic(const char* kind, const std::filesystem::path& file,
