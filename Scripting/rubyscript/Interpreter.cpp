@@ -166,8 +166,10 @@ void OnFrameDiscarded(void* entry) {
 HRESULT CreateRubyFiber() {
   if (!IsThreadAFiber() && !ConvertThreadToFiber(nullptr)) return E_OUTOFMEMORY;
   constexpr SIZE_T kCommitted = 64 * 1024;
-  constexpr SIZE_T kReserved = 16 * 1024 * 1024;  // deep recursion of macros takes place here
-  state.rubyFiber = CreateFiberEx(kCommitted, kReserved, 0, RunFiber, nullptr);
+  // CRuby's compiler and parts of its library recurse without a check of the stack. Address space is
+  // all that this costs until it is used; a host that has little left gets less.
+  for (SIZE_T reserved = 64 << 20; !state.rubyFiber && reserved >= 16 << 20; reserved /= 2)
+    state.rubyFiber = CreateFiberEx(kCommitted, reserved, 0, RunFiber, nullptr);
   if (!state.rubyFiber) return E_OUTOFMEMORY;
   return S_OK;
 }

@@ -21,6 +21,9 @@ constexpr char kHostObjects[] = {
 constexpr char kHostOutput[] = {
 #embed "prelude/host_output.rb"
 };
+constexpr char kSuggestions[] = {
+#embed "prelude/suggestions.rb"
+};
 constexpr char kContext[] = {
 #embed "prelude/context.rb"
 };
@@ -42,6 +45,7 @@ constexpr PreludeFile kPrelude[] = {
     {"rubyscript/host_objects.rb", kHostObjects, sizeof kHostObjects},
     {"rubyscript/host_output.rb", kHostOutput, sizeof kHostOutput},
     {"rubyscript/process_guards.rb", kProcessGuards, sizeof kProcessGuards},
+    {"rubyscript/suggestions.rb", kSuggestions, sizeof kSuggestions},
     {"rubyscript/context.rb", kContext, sizeof kContext},
     {"rubyscript/globals_snapshot.rb", kGlobalsSnapshot, sizeof kGlobalsSnapshot},
 };
