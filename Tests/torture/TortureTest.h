@@ -11,9 +11,6 @@
 #include "ModuleTest.h"
 #include "Resources.h"
 
-// The message boxes that the module has shown; they are answered at once.
-inline int boxes = 0;
-
 // The system opens some handles late, for itself.
 constexpr unsigned kOwnHandles = 4;
 
