@@ -5,7 +5,7 @@
 #   include/   headers for embedding (ruby.h, ruby/config.h)
 #   lib/       libmsvcrt-ruby310.dll.a
 #   ruby/      what a Windows machine needs: bin, lib/ruby/3.1.0, licenses. It works wherever it is copied.
-#   samples/   the package's own test/ruby, sample and benchmark, and tool/lib, which the tests need
+#   tests/     CRuby's own tests (test, spec, bootstraptest) and what they load (tool/lib)
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/cross-build.sh"
 
@@ -67,15 +67,14 @@ collect_licenses() {
     cp /usr/share/doc/gcc-mingw-w64-base/copyright $folder/gcc-copyright
 }
 
-collect_samples() {
-  mkdir -p result/samples/{test,tool} &&
-    cp -r source/{sample,benchmark} result/samples/ &&
-    cp -r source/test/ruby result/samples/test/ &&
-    cp -r source/tool/lib result/samples/tool/
+collect_tests() {
+  mkdir -p result/tests/tool &&
+    cp -r source/{test,spec,bootstraptest} result/tests/ &&
+    cp -r source/tool/lib result/tests/tool/
 }
 
 collect() {
-  collect_headers && collect_runtime && collect_licenses && collect_samples
+  collect_headers && collect_runtime && collect_licenses && collect_tests
 }
 
 # Everything that is shipped must load, and character tables must be there.

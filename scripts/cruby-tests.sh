@@ -1,0 +1,77 @@
+#!/usr/bin/env bash
+# SPDX-License-Identifier: MIT
+# Runs CRuby's own test suite inside the engine and in the ruby.exe of the same build, and compares the
+# outcome of each test:
+#
+#   scripts/cruby-tests.sh [--continue] [PATTERN...]
+#
+# PATTERN names files of CRuby's folder `test`, for example 'ruby/test_io*.rb'; without one, all files
+# are run. The outcomes are kept in build/cruby-tests. Those of ruby.exe are used again as long as CRuby
+# is the same, those of the engine only with --continue, which resumes a run that was interrupted.
+#
+# Tests/cruby/differences.txt lists the known differences. The exit code is 1 after any other one. JOBS
+# sets how many files run at a time (2), LIMIT how many seconds a file may take (300).
+set -euo pipefail
+source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
+
+KNOWN=$ROOT/Tests/cruby/differences.txt
+continue=
+[ "${1:-}" != --continue ] || { continue=1 && shift; }
+
+prepare run_ruby rubyscript
+CRUBY=$("$ROOT/scripts/build-cruby.sh")
+OUT=$BUILD/cruby-tests
+mkdir -p "$OUT"
+[ "$(cat "$OUT/cruby" 2>/dev/null)" = "$CRUBY" ] || rm -rf "$OUT/ruby.exe"
+printf '%s\n' "$CRUBY" >"$OUT/cruby"
+[ "$continue" ] || rm -rf "$OUT/engine"
+
+files=$(cd "$CRUBY/tests/test" && for pattern in "${@:-*}"; do
+  find . -path "./$pattern" -name 'test_*.rb' -type f
+done | sed 's,^\./,,' | sort -u)
+[ "$files" ] || die "no test file matches $*"
+
+run() { # run FILE...: in both, those that have no outcome yet
+  printf '%s\n' "$@" |
+    xargs -P "${JOBS:-2}" -I {} "$ROOT/Tests/cruby/run-file.sh" "$BUILD/release/bin" "$CRUBY/tests" {} \
+      "$OUT" "${LIMIT:-300}"
+}
+
+# outcomes SIDE: "FILE TEST<tab>OUTCOME", the last outcome of each test. A file that ruby.exe cannot load
+# is left out.
+outcomes() {
+  local file
+  for file in $files; do
+    [ ! -e "$OUT/engine/$file.log" ] || awk -F '\t' -v file="$file" '
+      { outcome[$1] = $2 }
+      END { for (test in outcome) print file " " test "\t" outcome[test] }' "$OUT/$1/$file.log"
+  done | LC_ALL=C sort -t $'\t' -k 1,1
+}
+
+# "TEST<tab>OUTCOME IN RUBY.EXE<tab>OUTCOME IN THE ENGINE"
+compare() {
+  LC_ALL=C join -t $'\t' -a 1 -a 2 -e missing -o 0,1.2,2.2 <(outcomes ruby.exe) <(outcomes engine) >"$OUT/all"
+  awk -F '\t' '$2 != $3' "$OUT/all" >"$OUT/different"
+}
+
+say "-- running $(wc -w <<<"$files") files"
+run $files
+compare
+
+# Tests depend on time: only a difference that shows twice is one.
+cp "$OUT/different" "$OUT/first"
+again=$(cut -d ' ' -f 1 "$OUT/first" | uniq)
+if [ "$again" ]; then
+  say "-- running once more: $(wc -w <<<"$again") files"
+  for file in $again; do rm -f "$OUT"/{ruby.exe,engine}/"$file".{log,done}; done
+  JOBS=1 run $again
+  compare
+fi
+
+sed '/^#/d' "$KNOWN" | LC_ALL=C sort >"$OUT/known"
+cut -f 1 "$OUT/different" >"$OUT/names"
+tests=$(grep -c '#' "$OUT/all")
+printf '%s files, %s tests, %s the same, %s different, %s of them known\n' "$(cut -d ' ' -f 1 "$OUT/all" | uniq | wc -l)" "$tests" \
+  "$((tests - $(wc -l <"$OUT/names")))" "$(wc -l <"$OUT/names")" \
+  "$(LC_ALL=C comm -12 "$OUT/names" "$OUT/known" | wc -l)"
+! LC_ALL=C join -t $'\t' -v 1 "$OUT/different" "$OUT/known" | sed 's/\t/: ruby.exe /; s/\t/, engine /' | grep .
