@@ -41,6 +41,7 @@ end
 tests = ENV.fetch("CRUBY_TESTS")
 $LOAD_PATH.unshift("#{tests}/tool/lib")
 Warning[:experimental] = false
+require "tmpdir" # as other files of the suite would have done
 require "test/unit"
 require "tracepointchecker"
 # It opens each descriptor by its number, which fails at random under Wine.
