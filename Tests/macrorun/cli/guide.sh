@@ -5,6 +5,21 @@
 . "$(dirname "$0")/runner.sh"
 guide=$root/Docs/writing-macros.md
 
+# expect_twice CODE TEXT MACRO FILE [OPTION...]: as expect; and two runs in one process make the
+# same text and show the same messages. Leaves the text of one run in `out`.
+expect_twice() {
+  expect "$@"
+  cp out once
+  cat out out > texts
+  cat err err > messages
+  code=$1 text=$2 macro=$3 file=$4
+  shift 4
+  expect "$code" "$text" "$macro" "$@" --each "$file" "$file"
+  cmp texts out && grep -v '^macrorun: ' err | diff messages - ||
+    fail "$(cat "$macro"): the second run differs"
+  mv once out
+}
+
 # The macros, and the texts before and after some of them
 awk '/^```ruby$/ { n++; file = n ".rbs"; next }
      /^```text before$/ { file = n ".in"; next }
@@ -16,7 +31,7 @@ for macro in *.rbs; do
   expect 0 '' --check "$macro"
   name=${macro%.rbs}
   [ -f "$name.out" ] || continue
-  expect 0 '' "$macro" "$name.in"
+  expect_twice 0 '' "$macro" "$name.in"
   diff "$name.out" out > difference || fail "$(cat "$macro"): $(cat difference)"
   ran=$((ran + 1))
 done
@@ -26,7 +41,7 @@ done
 run() {
   code=$1 text=$2 macro=$(grep -l -- "$3" ./*.rbs)
   shift 3
-  expect "$code" "$text" "$macro" text "$@"
+  expect_twice "$code" "$text" "$macro" text "$@"
 }
 printf 'a Colour and colour\n' > text
 run 0 '2 replaced' colour
