@@ -1,26 +1,37 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: MIT
-# Runs CRuby's own test suite inside the engine and in the ruby.exe of the same build, and compares the
-# outcome of each test:
+# Runs CRuby's own test suite inside the engine and in the ruby.exe of the same build, and compares
+# the outcome of each test:
 #
-#   scripts/cruby-tests.sh [--continue] [PATTERN...]
+#   scripts/cruby-tests.sh [--continue] [--children] [PATTERN...]
 #
-# PATTERN names files of CRuby's folder `test`, for example 'ruby/test_io*.rb'; without one, all files
-# are run. The outcomes are kept in build/cruby-tests. Those of ruby.exe are used again as long as CRuby
-# is the same, those of the engine only with --continue, which resumes a run that was interrupted.
+# PATTERN names files of CRuby's folder `test`, for example 'ruby/test_io*.rb'; without one, all
+# files are run. A test that starts another Ruby is skipped unless --children is given; then that
+# Ruby is the engine or ruby.exe as well. Such tests take some seconds each.
 #
-# Tests/cruby/differences.txt lists the known differences. The exit code is 1 after any other one. JOBS
-# sets how many files run at a time (2), LIMIT how many seconds a file may take (300).
+# The outcomes are kept in build/cruby-tests. Those of ruby.exe are used again as long as CRuby is
+# the same, those of the engine only with --continue, which resumes an interrupted run.
+#
+# Tests/cruby/differences.txt lists the known differences. The exit code is 1 after any other one.
+# JOBS sets how many files run at a time (2), LIMIT how many seconds a file may take (300).
 set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 KNOWN=$ROOT/Tests/cruby/differences.txt
-continue=
-[ "${1:-}" != --continue ] || { continue=1 && shift; }
+continue='' CHILDREN=''
+while [[ ${1:-} == --* ]]; do
+  case $1 in
+    --continue) continue=1 ;;
+    --children) CHILDREN=1 ;;
+    *) die "unknown option: $1" ;;
+  esac
+  shift
+done
+export CHILDREN
 
 prepare run_ruby rubyscript
 CRUBY=$("$ROOT/scripts/build-cruby.sh")
-OUT=$BUILD/cruby-tests
+OUT=$BUILD/cruby-tests${CHILDREN:+/children}
 mkdir -p "$OUT"
 [ "$(cat "$OUT/cruby" 2>/dev/null)" = "$CRUBY" ] || rm -rf "$OUT/ruby.exe"
 printf '%s\n' "$CRUBY" >"$OUT/cruby"
@@ -33,12 +44,12 @@ done | sed 's,^\./,,' | sort -u)
 
 run() { # run FILE...: in both, those that have no outcome yet
   printf '%s\n' "$@" |
-    xargs -P "${JOBS:-2}" -I {} "$ROOT/Tests/cruby/run-file.sh" "$BUILD/release/bin" "$CRUBY/tests" {} \
-      "$OUT" "${LIMIT:-300}"
+    xargs -P "${JOBS:-2}" -I {} "$ROOT/Tests/cruby/run-file.sh" "$BUILD/release/bin" \
+      "$CRUBY/tests" {} "$OUT" "${LIMIT:-300}"
 }
 
-# outcomes SIDE: "FILE TEST<tab>OUTCOME", the last outcome of each test. A file that ruby.exe cannot load
-# is left out.
+# outcomes SIDE: "FILE TEST<tab>OUTCOME", the last outcome of each test. A file that ruby.exe cannot
+# load is left out.
 outcomes() {
   local file
   for file in $files; do
@@ -48,19 +59,22 @@ outcomes() {
   done | LC_ALL=C sort -t $'\t' -k 1,1
 }
 
+sed '/^#/d' "$KNOWN" | LC_ALL=C sort >"$OUT/known"
+
 # "TEST<tab>OUTCOME IN RUBY.EXE<tab>OUTCOME IN THE ENGINE"
 compare() {
-  LC_ALL=C join -t $'\t' -a 1 -a 2 -e missing -o 0,1.2,2.2 <(outcomes ruby.exe) <(outcomes engine) >"$OUT/all"
+  LC_ALL=C join -t $'\t' -a 1 -a 2 -e missing -o 0,1.2,2.2 <(outcomes ruby.exe) \
+    <(outcomes engine) >"$OUT/all"
   awk -F '\t' '$2 != $3' "$OUT/all" >"$OUT/different"
+  LC_ALL=C join -t $'\t' -v 1 "$OUT/different" "$OUT/known" >"$OUT/new"
 }
 
 say "-- running $(wc -w <<<"$files") files"
 run $files
 compare
 
-# Tests depend on time: only a difference that shows twice is one.
-cp "$OUT/different" "$OUT/first"
-again=$(cut -d ' ' -f 1 "$OUT/first" | uniq)
+# Some tests depend on time: only a difference that shows twice counts.
+again=$(cut -d ' ' -f 1 "$OUT/new" | uniq)
 if [ "$again" ]; then
   say "-- running once more: $(wc -w <<<"$again") files"
   for file in $again; do rm -f "$OUT"/{ruby.exe,engine}/"$file".{log,done}; done
@@ -68,10 +82,8 @@ if [ "$again" ]; then
   compare
 fi
 
-sed '/^#/d' "$KNOWN" | LC_ALL=C sort >"$OUT/known"
-cut -f 1 "$OUT/different" >"$OUT/names"
 tests=$(grep -c '#' "$OUT/all")
-printf '%s files, %s tests, %s the same, %s different, %s of them known\n' "$(cut -d ' ' -f 1 "$OUT/all" | uniq | wc -l)" "$tests" \
-  "$((tests - $(wc -l <"$OUT/names")))" "$(wc -l <"$OUT/names")" \
-  "$(LC_ALL=C comm -12 "$OUT/names" "$OUT/known" | wc -l)"
-! LC_ALL=C join -t $'\t' -v 1 "$OUT/different" "$OUT/known" | sed 's/\t/: ruby.exe /; s/\t/, engine /' | grep .
+different=$(grep -c '#' "$OUT/different" || true)
+printf '%s files, %s tests, %s the same, %s different\n' \
+  "$(cut -d ' ' -f 1 "$OUT/all" | uniq | wc -l)" "$tests" "$((tests - different))" "$different"
+! sed 's/\t/: ruby.exe /; s/\t/, engine /' "$OUT/new" | grep .

@@ -4,9 +4,9 @@
 // --disable and --enable; any other option starts ruby.exe with the same command line. With --times
 // the program runs N times in one process, each time in an engine object of its own.
 //
-// The host publishes no object, so the program prints to the process's own streams. The host reports
-// errors as `NAME:LINE: DESCRIPTION`, and its exit code is then 1. It shares no code with the project
-// and needs no registration of the engine.
+// The host publishes no object, so the program prints to the process's own streams. The host
+// reports errors as `NAME:LINE: DESCRIPTION`, and its exit code is then 1. It shares no code with
+// the project and needs no registration of the engine.
 #include <windows.h>
 // They need windows.h before them, and this order.
 #include <oaidl.h>

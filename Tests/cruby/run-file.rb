@@ -1,9 +1,10 @@
 # SPDX-License-Identifier: MIT
-# Runs one file of CRuby's test suite and appends its outcome and that of each test to a log. ruby.exe and
-# the engine run this program unchanged. The environment has the folder of the tests (CRUBY_TESTS), the
-# file, relative to its folder `test` (CRUBY_TEST_FILES; of several, each run in one process takes the
-# next), and the log (CRUBY_TEST_LOG). A test that ends the process leaves the outcome "started". Tests
-# that start another Ruby are skipped; with CRUBY_TEST_CHILDREN only these run, as the log lists them.
+# Runs one file of CRuby's test suite and appends its outcome and that of each test to a log.
+# ruby.exe and the engine run this program unchanged. The environment has the folder of the tests
+# (CRUBY_TESTS), the file, relative to its folder `test` (CRUBY_TEST_FILES; of several, each run in
+# one process takes the next), and the log (CRUBY_TEST_LOG). A test that ends the process leaves the
+# outcome "started". Tests that start another Ruby are skipped; with CRUBY_TEST_CHILDREN only these
+# run, as the log lists them.
 
 # Bound methods, since tests replace `puts` and the like.
 module OutcomeLog
@@ -51,11 +52,12 @@ log = File.readlines(ENV.fetch("CRUBY_TEST_LOG"))
 files = ENV.fetch("CRUBY_TEST_FILES").split
 file = files[log.grep(/\A[^#]*\tstarted/).size % files.size]
 if ENV["CRUBY_TEST_CHILDREN"]
-  skipped = log.grep(/#{STARTS_ANOTHER}/).map { |line| line[/[^\t]*/] }
-  names = ["--name=/\\A(?:#{skipped.map { |name| Regexp.escape(name) }.join("|")})\\z/"]
+  skipped = log.grep(/#{STARTS_ANOTHER}/).map { |line| Regexp.escape(line[/[^\t]*/]) }
+  names = ["--name=/\\A(?:#{skipped.join("|")})\\z/"]
 else
   EnvUtil.singleton_class.prepend(NoChildren)
 end
 OutcomeLog.add(file, "started")
-Test::Unit::AutoRunner.run(true, "#{tests}/test", ["--test-order=alpha", *names, "#{tests}/test/#{file}"])
+arguments = ["--test-order=alpha", *names, "#{tests}/test/#{file}"]
+Test::Unit::AutoRunner.run(true, "#{tests}/test", arguments)
 OutcomeLog.add(file, "passed")

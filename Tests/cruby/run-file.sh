@@ -1,9 +1,10 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: MIT
-# run-file.sh BIN TESTS FILE OUT LIMIT: runs one file of CRuby's tests in ruby.exe and in the engine, each
-# unless OUT has its outcome. BIN is the folder of the build's programs, TESTS that of CRuby's tests, LIMIT
-# a number of seconds. OUT/ruby.exe and OUT/engine get FILE.log with the outcomes and FILE.done with the
-# exit codes and the output. The engine is left out when ruby.exe ran no test.
+# run-file.sh BIN TESTS FILE OUT LIMIT: runs one file of CRuby's tests in ruby.exe and in the
+# engine, each unless OUT has its outcome. BIN is the folder of the build's programs, TESTS that of
+# CRuby's tests, LIMIT a number of seconds. OUT/ruby.exe and OUT/engine get FILE.log with the
+# outcomes and FILE.done with the exit codes and the output. The engine is left out when ruby.exe
+# ran no test.
 set -euo pipefail
 . "$(dirname "$0")/../wine.sh"
 bin=$1 tests=$2 file=$3 out=$4 limit=$5
@@ -31,7 +32,7 @@ run_in() { # run_in SIDE PROGRAM [OPTION...]
   mkdir -p "${done%/*}"
   : >"$CRUBY_TEST_LOG"
   run "$@" >"$folder/done"
-  if grep -q 'starts another Ruby' "$CRUBY_TEST_LOG" && [ "${CHILDREN:-1}" = 1 ]; then
+  if grep -q 'starts another Ruby' "$CRUBY_TEST_LOG" && [ "${CHILDREN:-}" ]; then
     CRUBY_TEST_CHILDREN=1 run "$@" >>"$folder/done"
   fi
   mv "$folder/done" "$done"

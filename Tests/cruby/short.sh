@@ -1,8 +1,8 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: MIT
-# short.sh RUN_RUBY TESTS LIST: files of CRuby's tests in the engine, all of them twice in one process. Both
-# times they have the outcomes in LIST: a line for each file, and one for each test that neither passed
-# nor was skipped.
+# short.sh RUN_RUBY TESTS LIST: files of CRuby's tests in the engine, all of them twice in one
+# process. Both times they have the outcomes in LIST: a line for each file, and one for each test
+# that neither passed nor was skipped.
 set -euo pipefail
 . "$(dirname "$0")/../wine.sh"
 run_ruby=$1 list=$3
@@ -15,7 +15,8 @@ export CRUBY_TESTS=$2 CRUBY_TEST_LOG=$folder/log RUBY=Z:${run_ruby%/*}/ruby/bin/
 CRUBY_TEST_FILES=$(sed -n 's/^\([a-z]\S*\) .*/\1/p' "$list" | paste -sd ' ')
 export CRUBY_TEST_FILES
 status=0
-wine "$run_ruby" --times=$((2 * $(wc -w <<<"$CRUBY_TEST_FILES"))) "$driver" </dev/null >output 2>&1 || status=$?
+times=$((2 * $(wc -w <<<"$CRUBY_TEST_FILES")))
+wine "$run_ruby" --times=$times "$driver" </dev/null >output 2>&1 || status=$?
 
 # The outcomes of a pass, as the list has them. A file's own lines have no "#".
 summary() { # summary PASS
@@ -27,7 +28,8 @@ summary() { # summary PASS
       others = ""
       for (i = 1; i <= count; ++i) {
         test = order[i]
-        if (outcome[test] in number) number[outcome[test]]++; else others = others "\n  " test " " outcome[test]
+        if (outcome[test] in number) number[outcome[test]]++
+        else others = others "\n  " test " " outcome[test]
       }
       print file " " number["passed"] " passed " number["skipped"] " skipped" others
     }' log

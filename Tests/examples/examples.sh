@@ -1,7 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# examples.sh MACRORUN FOLDER: each macro in the folder makes the text NAME.out of NAME.in. It runs twice in one
-# process and shows the same messages both times.
+# examples.sh MACRORUN FOLDER: each macro in the folder makes the text NAME.out of NAME.in. It runs
+# twice in one process and shows the same messages both times.
 . "$(dirname "$0")/../wine.sh"
 folder=$(mktemp -d)
 trap 'rm -rf "$folder"' EXIT
