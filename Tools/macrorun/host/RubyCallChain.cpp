@@ -12,8 +12,8 @@ std::string RubyCallChain(IActiveScriptParse& engine) {
   const std::wstring macro = PathFromUtf8(kRubyMacroName).wstring();
   const std::wstring expression =
       L"caller.grep(/\\A" + macro +
-      L":/).grep_v(/in `method_missing'\\z/).slice_after(/in `<compiled>'\\z/)"
-      L".first.to_a.first(20).join(\"\\n\").gsub(\"<compiled>'\", \"<main>'\")";
+      L":/).grep_v(/in `method_missing'\\z/).slice_after(/in `<main>'\\z/)"
+      L".first.to_a.first(20).join(\"\\n\")";
   VARIANT chain;
   VariantInit(&chain);
   const HRESULT result = engine.ParseScriptText(expression.c_str(), nullptr, nullptr, nullptr, 0, 0,
