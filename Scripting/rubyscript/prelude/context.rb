@@ -244,7 +244,8 @@ module ActiveScript
       raise unless error
     end
 
-    def open_files = ObjectSpace.each_object(IO).reject(&:closed?)
+    # `closed?` raises for a stream that was allocated but never opened.
+    def open_files = ObjectSpace.each_object(IO).select { |file| quietly { !file.closed? } }
 
     # What Ruby does when its process ends. The search is only made when a file has been left open.
     def flush_files
