@@ -11,6 +11,10 @@ source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/cross-build.sh"
 
 PACKAGES+=(ruby)
 
+# The library win32ole calls COM, and is called by it, in the engine's own way (see OleEmbedder.h).
+PATCH=$ROOT/scripts/win32ole.patch
+RECIPE=$(sha256sum - "$PATCH" <<<"$RECIPE" | cut -c -64 | sha256sum)
+
 SOURCE=ruby3.1
 PACKAGE_VERSION=3.1.2-7+deb12u1
 API=3.1.0
@@ -95,6 +99,7 @@ check_runtime() {
 }
 
 build() {
+  step "patching CRuby" patch -d source -p1 -i "$PATCH"
   step "configuring CRuby" configure_ruby
   step "building CRuby (some minutes)" make -C build -j "$(nproc)"
   step "installing CRuby" install_ruby

@@ -5,6 +5,7 @@
 #include "VariantConversion.h"
 // Last: they rename what the headers above use.
 #include "ComObject.h"
+#include "OleEmbedder.h"
 #include "RubyCall.h"
 
 namespace {
@@ -367,6 +368,7 @@ void ReleaseCollectedObjects() {
     if (wrapped->dispatch) wrapped->dispatch->Release();
     free(wrapped);
   }
+  RunDeferredCalls();
 }
 
 // A release may run the host's code, and that change the list: each search begins anew.

@@ -25,7 +25,8 @@ bool IsComObject(VALUE value);
 // Borrowed; null after the object's engine has let go of it.
 IDispatch* DispatchOf(VALUE object);
 
-// Host side: gives back the references of objects that have been collected.
+// Host side: gives back the references of objects that have been collected, and makes what
+// win32ole has put off.
 void ReleaseCollectedObjects();
 // Host side: gives back those of all objects that were made for the owner's tasks (see RubyTask);
 // a call on one raises from now on.

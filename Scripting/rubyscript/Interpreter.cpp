@@ -2,6 +2,7 @@
 #include "Interpreter.h"
 
 #include <signal.h>
+#include <wchar.h>
 
 #include "FaultHandler.h"
 #include "Interrupter.h"
@@ -35,7 +36,8 @@ struct FloatControl {
 constexpr FloatControl kRubyFloatControl = {0x037F, 0x1F80};  // extended precision, all masked
 
 struct State {
-  LONG thread = 0;  // the first that asked
+  LONG thread = 0;                // the first that asked
+  HANDLE threadHandle = nullptr;  // kept: its id may be used again
   void* rubyFiber = nullptr;
   void* hostFiber = nullptr;  // of the latest switch; a host may use fibers itself
   bool started = false;
@@ -163,6 +165,39 @@ void OnFrameDiscarded(void* entry) {
     if (each == entry) return AbandonUpTo(each);
 }
 
+// Two interpreters in one process would change the same environment, signals and streams. The name
+// is held for as long as the process lives.
+bool IsOnlyCopy() {
+  static HANDLE mark = nullptr;
+  if (mark) return true;
+  wchar_t name[64];
+  swprintf(name, 64, L"Local\\RubyScript.Interpreter.%lu", GetCurrentProcessId());
+  const HANDLE created = CreateMutexW(nullptr, FALSE, name);
+  if (created && GetLastError() == ERROR_ALREADY_EXISTS) {
+    CloseHandle(created);
+    return false;
+  }
+  mark = created;
+  return true;
+}
+
+// Ruby's threads and the handler of faults run its code until the process ends.
+void PinLibrary() {
+  HMODULE module = nullptr;
+  GetModuleHandleExW(GET_MODULE_HANDLE_EX_FLAG_PIN | GET_MODULE_HANDLE_EX_FLAG_FROM_ADDRESS,
+                     reinterpret_cast<const wchar_t*>(PinLibrary), &module);
+}
+
+// The calling thread becomes the interpreter's if there is none yet.
+HRESULT ClaimThread() {
+  const LONG caller = static_cast<LONG>(GetCurrentThreadId());
+  const LONG owner = InterlockedCompareExchange(&state.thread, caller, 0);
+  if (owner == 0) state.threadHandle = OpenThread(SYNCHRONIZE, FALSE, GetCurrentThreadId());
+  const HANDLE handle = state.threadHandle;
+  if (handle && WaitForSingleObject(handle, 0) == WAIT_OBJECT_0) return RPC_E_SERVER_DIED;
+  return owner == 0 || owner == caller ? S_OK : RPC_E_WRONG_THREAD;
+}
+
 HRESULT CreateRubyFiber() {
   if (!IsThreadAFiber() && !ConvertThreadToFiber(nullptr)) return E_OUTOFMEMORY;
   constexpr SIZE_T kCommitted = 64 * 1024;
@@ -198,15 +233,17 @@ DWORD Interpreter::FatalExceptionCode() { return state.fault.ExceptionCode; }
 
 HRESULT Interpreter::Start() {
   if (FatalExceptionCode()) return E_ABORT;
-  const LONG caller = static_cast<LONG>(GetCurrentThreadId());
-  const LONG owner = InterlockedCompareExchange(&state.thread, caller, 0);
-  if (owner != 0 && owner != caller) return RPC_E_WRONG_THREAD;
+  if (!IsOnlyCopy()) return kOtherCopy;
+  const HRESULT claimed = ClaimThread();
+  if (FAILED(claimed)) return claimed;
+  if (IsRubySide()) return E_UNEXPECTED;
   if (state.rubyFiber) {
     if (!state.started) return E_FAIL;
     return IsThreadAFiber() || ConvertThreadToFiber(nullptr) ? S_OK : E_OUTOFMEMORY;
   }
   const HRESULT result = CreateRubyFiber();
   if (FAILED(result)) return result;
+  PinLibrary();
   SwitchToRuby(Message::kStart);
   if (FatalExceptionCode()) RaiseFault();
   return state.started ? S_OK : E_FAIL;
@@ -231,10 +268,12 @@ HRESULT Interpreter::Enter(RubyTask* task) {
   }
 }
 
+// The outermost one: a host function may have called the same macro again.
 static Entry* FindEntry(const void* owner) {
-  Entry* entry = state.innermost;
-  while (entry && entry->task->owner != owner) entry = entry->outer;
-  return entry;
+  Entry* found = nullptr;
+  for (Entry* each = state.innermost; each; each = each->outer)
+    if (each->task->owner == owner) found = each;
+  return found;
 }
 
 void Interpreter::Interrupt(const void* owner) {
@@ -279,6 +318,11 @@ void Interpreter::SetInterruptible(bool value) { state.innermost->interruptible 
 void Interpreter::SetLeaving() { state.innermost->leaving = true; }
 
 bool Interpreter::IsMainThread() { return static_cast<LONG>(GetCurrentThreadId()) == state.thread; }
+
+bool Interpreter::IsRubySide() {
+  return IsMainThread() && state.rubyFiber && IsThreadAFiber() &&
+         GetCurrentFiber() == state.rubyFiber;
+}
 
 const void* Interpreter::Owner() { return state.innermost->task->owner; }
 

@@ -49,9 +49,11 @@ class Interpreter {
   static bool HasStarted();
 
   // Host side, any thread. Starts the interpreter when this is the first use. RPC_E_WRONG_THREAD: it
-  // lives on another thread. E_OUTOFMEMORY: a later try may start it. E_FAIL: it does not start.
-  // E_ABORT: lost.
+  // lives on another thread. RPC_E_SERVER_DIED: its thread has ended. kOtherCopy: another copy of the
+  // engine's DLL runs one in this process. E_UNEXPECTED: the caller runs on the interpreter's stack.
+  // E_OUTOFMEMORY: a later try may start it. E_FAIL: it does not start. E_ABORT: lost.
   static HRESULT Start();
+  static constexpr HRESULT kOtherCopy = HRESULT_FROM_WIN32(ERROR_ALREADY_EXISTS);
   // Host side, after a successful Start: runs the task and serves its calls. S_OK: it has run and is
   // the caller's to delete; E_ABORT: it cannot go on, and is not the caller's any more. Raises the
   // fault of an interpreter that gets lost, as a structured exception of the same code. If the
@@ -84,6 +86,8 @@ class Interpreter {
   static unsigned TaskNumber();
   // Ruby side. Of the innermost task.
   static const void* Owner();
+  // Any thread. Whether the caller runs on the interpreter's stack, or on one of Ruby's fibers.
+  static bool IsRubySide();
   // Ruby side, any thread of Ruby's. Whether this is the thread that may call the host.
   static bool IsMainThread();
 };

@@ -7,6 +7,7 @@
 #include "RubyRuntime.h"
 // Last: they rename what the headers above use.
 #include "ComObject.h"
+#include "OleEmbedder.h"
 #include "RubyCall.h"
 #include "RubyInternals.h"
 #include "VariantConversion.h"
@@ -80,7 +81,7 @@ VALUE MacroTask::StartBody(VALUE data) {
   rb_funcall(context, rb_intern("start_work"), 0);
   if (task.kind == Kind::kRun) {
     code.list = rb_funcall(context, rb_intern("take_codes"), 0);
-  } else {
+  } else if (task.kind == Kind::kCall) {
     code.list = rb_ary_new();
     for (UINT i = task.arguments->cArgs; i-- > 0;)
       rb_ary_push(code.list, FromVariant(task.arguments->rgvarg[i], task.engineState.form));
@@ -91,6 +92,7 @@ VALUE MacroTask::StartBody(VALUE data) {
 VALUE MacroTask::CodeBody(VALUE data) {
   Code& code = CodeFrom(data);
   MacroTask& task = code.task;
+  if (task.kind == Kind::kCallBack) return task.body(task.data), Qnil;
   if (task.kind == Kind::kCall) {
     const VALUE name = StringOf(task.text, TextForm::kUtf16);
     const VALUE main = rb_funcall(task.engineState.context, rb_intern("main"), 0);
@@ -167,6 +169,7 @@ VALUE MacroTask::FinalizeBody(VALUE data) {
 
 VALUE MacroTask::DiscardBody(VALUE data) {
   EngineState& engineState = From(data).engineState;
+  CloseOleObjects();
   rb_funcall(engineState.context, rb_intern("close"), 0);
   engineState.context =
       From(data).persistent ? rb_funcall(engineState.context, rb_intern("successor"), 0) : Qnil;
@@ -180,7 +183,7 @@ VALUE MacroTask::DiscardBody(VALUE data) {
 void MacroTask::SetValue(VALUE passable) {
   if (kind == Kind::kDefines) {
     result = RTEST(passable) ? S_OK : S_FALSE;
-  } else if (kind == Kind::kCompile) {
+  } else if (kind == Kind::kCompile || kind == Kind::kCallBack) {
     result = S_OK;
   } else {
     result = FillVariant(passable, engineState.form, value) ? S_OK : E_OUTOFMEMORY;
@@ -251,7 +254,8 @@ void MacroTask::Work() {
   result = E_ABORT;
   Interpreter::SetInterruptible(true);
   if (!Interpreter::MustEnd()) {  // else it was interrupted before it began
-    const bool isMacro = kind == Kind::kRun || kind == Kind::kCall;
+    const bool isMacro =
+        kind == Kind::kRun || kind == Kind::kCall || kind == Kind::kCallBack;
     const Outcome outcome = isMacro ? RunMacro(outcomeValue)
                                     : Protect(WorkBody, reinterpret_cast<VALUE>(this), outcomeValue);
     if (outcome == Outcome::kDone) SetValue(outcomeValue);

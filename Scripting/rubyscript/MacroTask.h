@@ -44,6 +44,7 @@ class MacroTask final : public RubyTask {
     kRun,      // all that is compiled; sets `value`
     kDefines,  // whether the macro has a function named `text`; S_OK or S_FALSE
     kCall,     // the function named `text`, with `arguments`; sets `value`
+    kCallBack,  // `body` with `data`: Ruby code that COM calls through win32ole
     kDiscard,  // the context; what was persistent is compiled for the next one
   };
 
@@ -61,6 +62,8 @@ class MacroTask final : public RubyTask {
   bool persistent = false;
   bool wantsValue = false;                // of kRun
   const DISPPARAMS* arguments = nullptr;  // read before any macro code runs
+  unsigned long (*body)(unsigned long) = nullptr;
+  unsigned long data = 0;
 
   struct Code;  // one run of the macro's code
 

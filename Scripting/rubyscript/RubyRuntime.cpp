@@ -8,6 +8,7 @@
 #include "ProcessStateSnapshot.h"
 // Last: they rename what the headers above use.
 #include "ComObject.h"
+#include "OleEmbedder.h"
 #include "RubyCall.h"
 #include "RubyInternals.h"
 #include "VariantConversion.h"
@@ -153,6 +154,7 @@ VALUE DefineModule(VALUE) {
   rb_ext_ractor_safe(false);
   DefineProcessGuards();
   DefineComObject(module);
+  DefineOleEmbedder(module);
   const VALUE binding = rb_const_get(rb_cObject, rb_intern("TOPLEVEL_BINDING"));
   for (const PreludeFile& file : kPrelude)
     rb_funcall(binding, rb_intern("eval"), 3, rb_utf8_str_new(file.text, file.bytes),

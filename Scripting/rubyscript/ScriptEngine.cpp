@@ -19,6 +19,10 @@ static constexpr IID kActiveScriptParse = {
 // The name by which the 8-bit host is known.
 static constexpr wchar_t kByteHostItem[] = L"tarn";
 
+// All that there are, created on any thread.
+static ScriptEngine* engines = nullptr;
+static SRWLOCK enginesLock = SRWLOCK_INIT;
+
 HRESULT CreateScriptEngine(REFIID riid, void** object) {
   EngineState* const engineState = new (std::nothrow) EngineState;
   ScriptEngine* const engine = engineState ? new (std::nothrow) ScriptEngine(engineState) : nullptr;
@@ -31,9 +35,20 @@ HRESULT CreateScriptEngine(REFIID riid, void** object) {
   return result;
 }
 
-ScriptEngine::ScriptEngine(EngineState* newState) : engineState(newState) { AddServerReference(); }
+ScriptEngine::ScriptEngine(EngineState* newState) : engineState(newState) {
+  AddServerReference();
+  AcquireSRWLockExclusive(&enginesLock);
+  next = engines;
+  engines = this;
+  ReleaseSRWLockExclusive(&enginesLock);
+}
 
 ScriptEngine::~ScriptEngine() {
+  AcquireSRWLockExclusive(&enginesLock);
+  ScriptEngine** link = &engines;
+  while (*link != this) link = &(*link)->next;
+  *link = next;
+  ReleaseSRWLockExclusive(&enginesLock);
   if (!engineState->context) delete engineState;
   ReleaseServerReference();
 }
@@ -364,10 +379,27 @@ HRESULT ScriptEngine::CallFunction(LPCOLESTR name, const DISPPARAMS* arguments, 
   return Perform(task, result, exception);
 }
 
+HRESULT ScriptEngine::CallBack(const void* owner, unsigned long (*body)(unsigned long),
+                               unsigned long data) {
+  AcquireSRWLockShared(&enginesLock);
+  ScriptEngine* engine = engines;
+  while (engine && engine != owner) engine = engine->next;
+  ReleaseSRWLockShared(&enginesLock);
+  if (!engine || !engine->IsUsable() || !engine->IsStarted()) return CO_E_OBJNOTCONNECTED;
+  const Call call(engine);
+  MacroTask* const task = engine->NewTask(MacroTask::Kind::kCallBack, nullptr);
+  if (!task) return E_OUTOFMEMORY;
+  task->body = body;
+  task->data = data;
+  return engine->Perform(task, nullptr, nullptr);
+}
+
 // Runs and deletes the task, in a Call; what went wrong has gone to the site.
 HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* exception) {
   if (!task) return E_OUTOFMEMORY;
-  const bool runsCode = task->kind == MacroTask::Kind::kRun || task->kind == MacroTask::Kind::kCall;
+  const bool runsCode = task->kind == MacroTask::Kind::kRun ||
+                        task->kind == MacroTask::Kind::kCall ||
+                        task->kind == MacroTask::Kind::kCallBack;
   if (runsCode) site->OnEnterScript();
   HRESULT outcome = E_ABORT;
   if (IsUsable())
@@ -389,6 +421,28 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
   return outcome;
 }
 
+// Why Ruby cannot be entered, for the site.
+static void DescribeFailedStart(HRESULT started, wchar_t (&text)[256]) {
+  if (Interpreter::FatalExceptionCode()) {
+    swprintf(text, 256,
+             L"Ruby was lost to a fault (exception 0x%08lX) in an earlier macro. Start the program "
+             L"anew to run Ruby macros again.",
+             Interpreter::FatalExceptionCode());
+    return;
+  }
+  const wchar_t* reason = L"Ruby could not be started in this process.";
+  if (started == RPC_E_WRONG_THREAD)
+    reason = L"Ruby macros run on the thread that ran the first one.";
+  if (started == RPC_E_SERVER_DIED)
+    reason = L"The thread that ran the first Ruby macro has ended. Restart the program to run Ruby "
+             L"macros again.";
+  if (started == Interpreter::kOtherCopy)
+    reason = L"Another copy of the Ruby engine runs in this process. Use one copy of rubyscript.dll.";
+  if (started == E_UNEXPECTED)
+    reason = L"Ruby cannot be entered again from this call of the macro.";
+  swprintf(text, 256, L"%ls", reason);
+}
+
 // S_OK: the task has run. Otherwise it is gone; that Ruby is not to be had, the site is told.
 HRESULT ScriptEngine::Enter(MacroTask* task, EXCEPINFO* exception) {
   const HRESULT started = Interpreter::Start();
@@ -398,14 +452,8 @@ HRESULT ScriptEngine::Enter(MacroTask* task, EXCEPINFO* exception) {
     return entered;
   }
   delete task;
-  wchar_t text[256] = L"Ruby could not be started in this process.";
-  if (started == RPC_E_WRONG_THREAD)
-    swprintf(text, 256, L"Ruby macros run on the thread that ran the first one.");
-  if (Interpreter::FatalExceptionCode())
-    swprintf(text, 256,
-             L"Ruby was lost to a fault (exception 0x%08lX) in an earlier macro. Start the program "
-             L"anew to run Ruby macros again.",
-             Interpreter::FatalExceptionCode());
+  wchar_t text[256];
+  DescribeFailedStart(started, text);
   ScriptError* const error =
       new (std::nothrow) ScriptError(started, SysAllocString(text), 0, 0, nullptr, 0);
   return error ? Report(error, exception) : started;

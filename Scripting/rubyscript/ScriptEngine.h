@@ -71,6 +71,10 @@ class ScriptEngine final : public IActiveScript, public IActiveScriptParse, publ
   HRESULT Defines(LPCOLESTR name);
   HRESULT CallFunction(LPCOLESTR name, const DISPPARAMS* arguments, VARIANT* result,
                        EXCEPINFO* exception);
+  // Host side of the interpreter's thread: enters Ruby for the engine whose address is `owner`.
+  // CO_E_OBJNOTCONNECTED: there is no such engine, or it runs no code.
+  static HRESULT CallBack(const void* owner, unsigned long (*body)(unsigned long),
+                          unsigned long data);
 
  private:
   ~ScriptEngine();
@@ -91,6 +95,7 @@ class ScriptEngine final : public IActiveScript, public IActiveScriptParse, publ
   void FinishClose();
 
   LONG references = 1;
+  ScriptEngine* next = nullptr;  // in the list of all
   IActiveScriptSite* site = nullptr;
   DWORD thread = 0;  // of SetScriptSite; 0 before
   SCRIPTSTATE state = SCRIPTSTATE_UNINITIALIZED;

@@ -92,7 +92,8 @@ class Item final : public IDispatch {
                       VARIANT* result, EXCEPINFO* exception, UINT*) override;
 
   ULONG references = 1;
-  bool quiet = false;  // calls are not logged
+  bool quiet = false;        // calls are not logged
+  bool byReference = false;  // arguments may be references
 
  private:
   const std::string name;
