@@ -112,12 +112,6 @@ VALUE BstrToString(BSTR text, TextForm form) {
   return text ? StringFromHost(text, SysStringLen(text), form, TextOrigin::kResult) : Qnil;
 }
 
-[[noreturn]] void RaiseFailure(const Wrapped& wrapped, VALUE name, HRESULT outcome,
-                               VALUE description, VALUE source) {
-  rb_exc_raise(rb_funcall(ActiveScriptConst("ComError"), rb_intern("for"), 5, wrapped.name, name,
-                          ULONG2NUM(static_cast<ULONG>(outcome)), description, source));
-}
-
 [[noreturn]] void RaiseUnknown(const Wrapped& wrapped, VALUE name, HRESULT outcome) {
   rb_exc_raise(rb_funcall(ActiveScriptConst("ComError"), rb_intern("unknown"), 3, wrapped.name,
                           name, ULONG2NUM(static_cast<ULONG>(outcome))));
@@ -127,10 +121,14 @@ VALUE BstrToString(BSTR text, TextForm form) {
   EXCEPINFO& exception = call.exception;
   const VALUE description = BstrToString(exception.bstrDescription, wrapped.form);
   const VALUE source = BstrToString(exception.bstrSource, wrapped.form);
+  const VALUE helpFile = BstrToString(exception.bstrHelpFile, wrapped.form);
   const bool coded = call.outcome == DISP_E_EXCEPTION && FAILED(exception.scode);
-  const HRESULT code = coded ? exception.scode : call.outcome;
+  const VALUE code = ULONG2NUM(static_cast<ULONG>(coded ? exception.scode : call.outcome));
+  const VALUE wcode = INT2FIX(exception.wCode);
+  const VALUE helpContext = ULONG2NUM(exception.dwHelpContext);
   call.FreeException();
-  RaiseFailure(wrapped, name, code, description, source);
+  rb_exc_raise(rb_funcall(ActiveScriptConst("ComError"), rb_intern("for"), 8, wrapped.name, name,
+                          code, description, source, wcode, helpFile, helpContext));
 }
 
 // A call on a thread of the macro's own, or on an object whose engine is closed.

@@ -197,15 +197,28 @@ struct Description {
   VALUE exception;
   BSTR hostText;
   TextForm form;
-  BSTR text;
-  ULONG line;
-  LONG column;
-  BSTR lineText;
-  DWORD cookie;
+  ScriptError::Details details;
 };
 
 BSTR TextOf(VALUE string, TextForm form) {
   return TextToHost(RSTRING_PTR(string), static_cast<UINT>(RSTRING_LEN(string)), form);
+}
+
+// What the host's own object has said of the call that failed. A macro may have made such an error
+// itself, with anything inside.
+void DescribeFailedCall(Description& description) {
+  const VALUE exception = description.exception;
+  if (!RTEST(rb_obj_is_kind_of(exception, ActiveScriptConst("ComError")))) return;
+  ScriptError::Details& details = description.details;
+  const VALUE code = rb_ivar_get(exception, rb_intern("@hresult"));
+  const VALUE wcode = rb_ivar_get(exception, rb_intern("@wcode"));
+  const VALUE helpFile = rb_ivar_get(exception, rb_intern("@help_file"));
+  const VALUE helpContext = rb_ivar_get(exception, rb_intern("@help_context"));
+  if (RB_INTEGER_TYPE_P(code) && FAILED(static_cast<HRESULT>(NUM2ULONG(code))))
+    details.code = static_cast<HRESULT>(NUM2ULONG(code));
+  if (FIXNUM_P(wcode)) details.wCode = static_cast<WORD>(FIX2LONG(wcode));
+  if (RB_INTEGER_TYPE_P(helpContext)) details.helpContext = NUM2ULONG(helpContext);
+  if (RB_TYPE_P(helpFile, T_STRING)) details.helpFile = TextOf(helpFile, description.form);
 }
 
 }  // namespace
@@ -216,27 +229,29 @@ VALUE MacroTask::DescribeBody(VALUE data) {
       description.hostText ? StringOf(description.hostText, TextForm::kUtf16) : Qnil;
   const VALUE parts =
       rb_funcall(description.context, rb_intern("describe"), 2, description.exception, hostText);
-  description.line = NUM2ULONG(rb_ary_entry(parts, 1));
-  description.column = NUM2LONG(rb_ary_entry(parts, 2));
-  description.cookie = NUM2ULONG(rb_ary_entry(parts, 4));
-  description.text = TextOf(rb_ary_entry(parts, 0), description.form);
-  description.lineText = TextOf(rb_ary_entry(parts, 3), description.form);
+  ScriptError::Details& details = description.details;
+  details.line = NUM2ULONG(rb_ary_entry(parts, 1));
+  details.column = NUM2LONG(rb_ary_entry(parts, 2));
+  details.context = NUM2ULONG(rb_ary_entry(parts, 4));
+  details.description = TextOf(rb_ary_entry(parts, 0), description.form);
+  details.lineText = TextOf(rb_ary_entry(parts, 3), description.form);
+  DescribeFailedCall(description);
   return Qnil;
 }
 
 // Asks the exception, which may run the macro's own code: Ruby's exceptions have methods.
 void MacroTask::SetError(VALUE exception, BSTR hostText) {
-  Description description = {
-      engineState.context, exception, hostText, engineState.form, nullptr, 0, 0, nullptr, 0};
+  Description description = {engineState.context, exception, hostText, engineState.form, {}};
+  ScriptError::Details& details = description.details;
   VALUE ignored;
   if (Protect(DescribeBody, reinterpret_cast<VALUE>(&description), ignored) == Outcome::kLeft) {
+    SysFreeString(details.helpFile);
     result = E_ABORT;
     return;
   }
-  if (!description.text) description.text = SysAllocString(L"An error that cannot be described.");
-  error =
-      new (std::nothrow) ScriptError(E_FAIL, description.text, description.line, description.column,
-                                     description.lineText, description.cookie);
+  if (!details.description)
+    details.description = SysAllocString(L"An error that cannot be described.");
+  error = new (std::nothrow) ScriptError(details);
   result = error ? DISP_E_EXCEPTION : E_OUTOFMEMORY;
 }
 

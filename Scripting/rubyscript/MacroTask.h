@@ -40,12 +40,12 @@ struct EngineState {
 class MacroTask final : public RubyTask {
  public:
   enum class Kind {
-    kCompile,  // `text`, for a later kRun
-    kRun,      // all that is compiled; sets `value`
-    kDefines,  // whether the macro has a function named `text`; S_OK or S_FALSE
-    kCall,     // the function named `text`, with `arguments`; sets `value`
+    kCompile,   // `text`, for a later kRun
+    kRun,       // all that is compiled; sets `value`
+    kDefines,   // whether the macro has a function named `text`; S_OK or S_FALSE
+    kCall,      // the function named `text`, with `arguments`; sets `value`
     kCallBack,  // `body` with `data`: Ruby code that COM calls through win32ole
-    kDiscard,  // the context; what was persistent is compiled for the next one
+    kDiscard,   // the context; what was persistent is compiled for the next one
   };
 
   MacroTask(const void* engine, Kind taskKind, EngineState& state, NamedItem* const& namedItems)

@@ -434,10 +434,12 @@ static void DescribeFailedStart(HRESULT started, wchar_t (&text)[256]) {
   if (started == RPC_E_WRONG_THREAD)
     reason = L"Ruby macros run on the thread that ran the first one.";
   if (started == RPC_E_SERVER_DIED)
-    reason = L"The thread that ran the first Ruby macro has ended. Restart the program to run Ruby "
-             L"macros again.";
+    reason =
+        L"The thread that ran the first Ruby macro has ended. Restart the program to run Ruby "
+        L"macros again.";
   if (started == Interpreter::kOtherCopy)
-    reason = L"Another copy of the Ruby engine runs in this process. Use one copy of rubyscript.dll.";
+    reason =
+        L"Another copy of the Ruby engine runs in this process. Use one copy of rubyscript.dll.";
   if (started == E_UNEXPECTED)
     reason = L"Ruby cannot be entered again from this call of the macro.";
   swprintf(text, 256, L"%ls", reason);
@@ -454,8 +456,10 @@ HRESULT ScriptEngine::Enter(MacroTask* task, EXCEPINFO* exception) {
   delete task;
   wchar_t text[256];
   DescribeFailedStart(started, text);
-  ScriptError* const error =
-      new (std::nothrow) ScriptError(started, SysAllocString(text), 0, 0, nullptr, 0);
+  ScriptError::Details details;
+  details.code = started;
+  details.description = SysAllocString(text);
+  ScriptError* const error = new (std::nothrow) ScriptError(details);
   return error ? Report(error, exception) : started;
 }
 

@@ -3,18 +3,10 @@
 
 #include <oleauto.h>
 
-ScriptError::ScriptError(HRESULT errorCode, BSTR text, ULONG errorLine, LONG errorColumn,
-                         BSTR textOfLine, DWORD cookie)
-    : code(errorCode),
-      description(text),
-      line(errorLine),
-      column(errorColumn),
-      lineText(textOfLine),
-      context(cookie) {}
-
 ScriptError::~ScriptError() {
-  SysFreeString(description);
-  SysFreeString(lineText);
+  SysFreeString(details.description);
+  SysFreeString(details.lineText);
+  SysFreeString(details.helpFile);
 }
 
 static BSTR Copy(BSTR text) { return SysAllocStringLen(text, SysStringLen(text)); }
@@ -23,8 +15,11 @@ void ScriptError::Fill(EXCEPINFO* exception) const {
   if (!exception) return;
   *exception = {};
   exception->bstrSource = SysAllocString(L"RubyScript");
-  exception->bstrDescription = Copy(description);
-  exception->scode = code;
+  exception->bstrDescription = Copy(details.description);
+  exception->scode = details.code;
+  exception->wCode = details.wCode;
+  if (details.helpFile) exception->bstrHelpFile = Copy(details.helpFile);
+  exception->dwHelpContext = details.helpContext;
 }
 
 HRESULT ScriptError::QueryInterface(REFIID riid, void** object) {
@@ -52,14 +47,14 @@ HRESULT ScriptError::GetExceptionInfo(EXCEPINFO* exception) {
 
 HRESULT ScriptError::GetSourcePosition(DWORD* sourceContext, ULONG* lineNumber,
                                        LONG* characterPosition) {
-  if (sourceContext) *sourceContext = context;
-  if (lineNumber) *lineNumber = line;
-  if (characterPosition) *characterPosition = column;
+  if (sourceContext) *sourceContext = details.context;
+  if (lineNumber) *lineNumber = details.line;
+  if (characterPosition) *characterPosition = details.column;
   return S_OK;
 }
 
 HRESULT ScriptError::GetSourceLineText(BSTR* text) {
   if (!text) return E_POINTER;
-  *text = Copy(lineText);
+  *text = Copy(details.lineText);
   return *text ? S_OK : E_OUTOFMEMORY;
 }

@@ -11,10 +11,19 @@
 
 class ScriptError final : public IActiveScriptError {
  public:
-  // Line and column count from 0. Takes over both texts; null counts as empty. The context is the
-  // cookie that came with the source.
-  ScriptError(HRESULT code, BSTR description, ULONG line, LONG column, BSTR lineText,
-              DWORD context);
+  struct Details {
+    HRESULT code = E_FAIL;
+    BSTR description = nullptr;  // texts are owned; null counts as empty
+    ULONG line = 0;              // from 0, as the column
+    LONG column = 0;             // in UTF-16 units of the line as the host has it
+    BSTR lineText = nullptr;
+    DWORD context = 0;  // the cookie that came with the source
+    WORD wCode = 0;     // this and the help are a failed call's
+    BSTR helpFile = nullptr;
+    DWORD helpContext = 0;
+  };
+  // Takes over the texts.
+  explicit ScriptError(const Details& errorDetails) : details(errorDetails) {}
 
   // Null: no information. Fills fresh strings, which the caller frees.
   void Fill(EXCEPINFO* exception) const;
@@ -31,10 +40,5 @@ class ScriptError final : public IActiveScriptError {
   ~ScriptError();
 
   LONG references = 1;
-  const HRESULT code;
-  const BSTR description;
-  const ULONG line;
-  const LONG column;
-  const BSTR lineText;
-  const DWORD context;
+  const Details details;
 };

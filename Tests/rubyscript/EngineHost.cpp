@@ -135,6 +135,7 @@ static std::string Narrow(BSTR text) {
 // --- Item ----------------------------------------------------------------------------------------
 
 HRESULT Item::QueryInterface(REFIID riid, void** object) {
+  if (extension && (*object = extension(riid))) return S_OK;
   *object = riid == IID_IUnknown || riid == IID_IDispatch ? this : nullptr;
   return *object ? (AddRef(), S_OK) : E_NOINTERFACE;
 }
@@ -181,9 +182,9 @@ HRESULT Item::Invoke(DISPID id, REFIID riid, LCID, WORD flags, DISPPARAMS* param
 
 // --- Host ----------------------------------------------------------------------------------------
 
-void Host::Create() {
+void Host::Create(decltype(&DllGetClassObject) getClassObject) {
   void* factory = nullptr;
-  ASSERT_EQ(S_OK, GetClassObject(kEngineClass, IID_IClassFactory, &factory));
+  ASSERT_EQ(S_OK, getClassObject(kEngineClass, IID_IClassFactory, &factory));
   void* made = nullptr;
   const HRESULT result =
       static_cast<IClassFactory*>(factory)->CreateInstance(nullptr, __uuidof(IActiveScript), &made);
@@ -269,6 +270,8 @@ HRESULT Host::OnScriptError(IActiveScriptError* scriptError) {
   error.text = Narrow(exception.bstrDescription);
   error.lineText = Narrow(lineText);
   error.code = exception.scode;
+  error.wCode = exception.wCode;
+  error.help = Narrow(exception.bstrHelpFile) + ":" + std::to_string(exception.dwHelpContext);
   for (BSTR text :
        {exception.bstrDescription, exception.bstrSource, exception.bstrHelpFile, lineText})
     SysFreeString(text);

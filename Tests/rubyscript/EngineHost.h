@@ -37,7 +37,7 @@ void CheckTranscript(const std::string& file,
 
 // An entry point of the engine's DLL, which is loaded on first use and stays.
 void* EngineExport(const char* name);
-inline HRESULT GetClassObject(REFCLSID id, REFIID riid, void** object) {
+inline HRESULT WINAPI GetClassObject(REFCLSID id, REFIID riid, void** object) {
   return reinterpret_cast<decltype(&DllGetClassObject)>(EngineExport("DllGetClassObject"))(id, riid,
                                                                                            object);
 }
@@ -86,11 +86,17 @@ class Item final : public IDispatch {
   STDMETHODIMP_(ULONG) AddRef() override { return ++references; }
   STDMETHODIMP_(ULONG) Release() override { return --references; }
   STDMETHODIMP GetTypeInfoCount(UINT*) override { return E_NOTIMPL; }
-  STDMETHODIMP GetTypeInfo(UINT, LCID, ITypeInfo**) override { return E_NOTIMPL; }
+  STDMETHODIMP GetTypeInfo(UINT, LCID, ITypeInfo** info) override {
+    if (!type) return E_NOTIMPL;
+    return *info = type, type->AddRef(), S_OK;
+  }
   STDMETHODIMP GetIDsOfNames(REFIID riid, LPOLESTR* names, UINT count, LCID, DISPID* ids) override;
   STDMETHODIMP Invoke(DISPID id, REFIID riid, LCID, WORD flags, DISPPARAMS* parameters,
                       VARIANT* result, EXCEPINFO* exception, UINT*) override;
 
+  // Other interfaces and a type; AddRef is the caller's.
+  std::function<void*(REFIID)> extension;
+  ITypeInfo* type = nullptr;
   ULONG references = 1;
   bool quiet = false;        // calls are not logged
   bool byReference = false;  // arguments may be references
@@ -106,8 +112,8 @@ class Host final : public IActiveScriptSite {
   explicit Host(std::string name = "item") : itemName(std::move(name)), item(itemName) {}
   ~Host() { EXPECT_EQ(nullptr, script); }
 
-  // Makes an engine; initialised and with the item.
-  void Create();
+  // Makes an engine, of this copy of the library; initialised and with the item.
+  void Create(decltype(&DllGetClassObject) getClassObject = GetClassObject);
   void Open();
   // Text is UTF-8; the 8-bit host widens its bytes.
   HRESULT Parse(const std::string& text, DWORD flags = 0, VARIANT* result = nullptr,
@@ -146,6 +152,8 @@ class Host final : public IActiveScriptSite {
     LONG column;
     DWORD cookie;
     HRESULT code;
+    WORD wCode;
+    std::string help;  // file and context
   } error = {};
 };
 

@@ -3,6 +3,8 @@
 // end, its loss.
 #include "EngineHost.h"
 
+#include <thread>
+
 TEST(Life, KeepsTheLibraryFromItsStartOn) {
   const auto canUnload = reinterpret_cast<HRESULT(WINAPI*)()>(EngineExport("DllCanUnloadNow"));
   EXPECT_EQ(S_OK, canUnload());
@@ -22,6 +24,37 @@ TEST(Life, KeepsTheLibraryFromItsStartOn) {
   EXPECT_EQ(S_OK, canUnload());
   EXPECT_EQ("", host.Run("1"));
   EXPECT_EQ(S_FALSE, canUnload());
+  for (int i = 0; i < 5; ++i) FreeLibrary(GetModuleHandleA("rubyscript.dll"));
+  ASSERT_NE(nullptr, GetModuleHandleA("rubyscript.dll"));
+  EXPECT_EQ("", host.Run("1"));
+
+  const char* const copy = "another-rubyscript.dll";
+  ASSERT_TRUE(CopyFileA(RUBYSCRIPT_DLL, copy, FALSE));
+  const HMODULE dll = LoadLibraryA(copy);
+  const FARPROC get = GetProcAddress(dll, "DllGetClassObject");
+  ASSERT_NE(nullptr, get);
+  host.Create(reinterpret_cast<decltype(&DllGetClassObject)>(reinterpret_cast<void*>(get)));
+  host.script->SetScriptSite(&host);
+  host.parse->InitNew();
+  EXPECT_EQ(kReported, host.Parse("1"));
+  host.Close();
+  EXPECT_EQ(
+      "error: Another copy of the Ruby engine runs in this process. Use one copy of "
+      "rubyscript.dll.",
+      TakeLog());
+  FreeLibrary(dll);
+  DeleteFileA(copy);
+}
+
+// In a process of its own. The id of an ended thread may be given to the next one.
+TEST(Thread, HasEnded) {
+  const char* const ended =
+      "error: The thread that ran the first Ruby macro has ended. Restart the program to run Ruby "
+      "macros again.";
+  Host host, late;
+  std::thread([&] { EXPECT_EQ("", host.Run("1")); }).join();
+  for (int i = 0; i < 20; ++i) std::thread([&] { EXPECT_EQ(ended, late.Run("1")); }).join();
+  EXPECT_EQ(ended, late.Run("1"));
 }
 
 // The fault goes to the guard of the host that called last; nobody else waits for ever. Where in Ruby

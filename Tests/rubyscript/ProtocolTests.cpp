@@ -290,13 +290,39 @@ TEST(Protocol, ErrorsAndTheirPlaces) {
   EXPECT_EQ("oops (RuntimeError)\n\tfrom macro:101:in `f'\n\tfrom macro2:202:in `<main>'",
             host.error.text);
   const auto place = [&] {
-    return std::to_string(host.error.line) + " [" + host.error.lineText + "] " +
-           std::to_string(host.error.cookie);
+    return std::to_string(host.error.line) + ":" + std::to_string(host.error.column) + " [" +
+           host.error.lineText + "] " + std::to_string(host.error.cookie);
   };
-  EXPECT_EQ("100 [def f = raise('oops')] 11", place());
+  EXPECT_EQ("100:8 [def f = raise('oops')] 11", place());
   EXPECT_EQ(kReported, host.Parse("\n1 +", 0, nullptr, nullptr, 33, 300));
-  EXPECT_EQ("301 [1 +] 33", place());
+  EXPECT_EQ("301:0 [1 +] 33", place());
+  // Of another object, with a name that is missed; and more lines than CRuby counts by itself.
+  host.Parse("x = 5\n  x.missing", 0, nullptr, nullptr, 44, 400);
+  EXPECT_EQ("401:3 [  x.missing] 44", place());
+  for (const int line : {70'000, 140'000}) {
+    host.Parse(std::string(line - 500, '\n') + "1; raise 'far'", 0, nullptr, nullptr, 55, 500);
+    EXPECT_EQ(std::to_string(line) + ":3 [1; raise 'far'] 55", place());
+  }
+  host.Parse(std::string(70'000, '\n') + "raise 'far'");
+  EXPECT_NE(host.error.text.npos, host.error.text.find(":70001:in `<main>'")) << host.error.text;
   host.Close();
+  // Frames of a macro inside another one are its own, also those of a fiber.
+  Host outer;
+  outer.item.Does("nest", [&] {
+    host.Run("def r(n) = n.zero? ? raise('x') : r(n - 1)\nFiber.new { r 12 }.resume");
+    EXPECT_EQ(14, std::count(host.error.text.begin(), host.error.text.end(), '\t'));
+    host.Run("def r = raise('x')\nr");
+    EXPECT_EQ("x (RuntimeError)\n\tfrom macro:1:in `r'\n\tfrom macro:2:in `<main>'",
+              host.error.text);
+    TakeLog();
+  });
+  EXPECT_EQ("", outer.Run("def a = @item.nest\ndef b = a\nb"));
+  // Columns are units of the host's own text.
+  for (const char* const name : {"item", "tarn"}) {
+    Host each(name);
+    each.Run("'\xC3\xA4\xF0\x9F\x98\x80'; raise 'x'");
+    EXPECT_EQ(each.itemName == "tarn" ? 10 : 7, each.error.column);
+  }
   TakeLog();
 }
 

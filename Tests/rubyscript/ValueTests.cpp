@@ -192,7 +192,25 @@ TEST(Values, ObjectsOfTheHost) {
     call.exception->pfnDeferredFillIn = FillIn;
     return DISP_E_EXCEPTION;
   });
+  host.item.Add("helped", [](Item::Call call) {
+    *call.exception = {};
+    call.exception->wCode = 1001;
+    call.exception->bstrHelpFile = SysAllocString(L"help.chm");
+    call.exception->dwHelpContext = 42;
+    return DISP_E_EXCEPTION;
+  });
   CheckTranscript("objects.txt", [&](const std::string& macro) { return host.Run(macro); });
+  // What the failed call has said goes on to the site, unless the macro rescues it.
+  const auto error = [&](const char* macro) {
+    host.Run(macro);
+    return Hex(host.error.code) + " " + std::to_string(host.error.wCode) + " " + host.error.help;
+  };
+  EXPECT_EQ("80020009 1001 help.chm:42", error("@item.helped"));
+  EXPECT_EQ("80041234 0 :0", error("@item.explained"));
+  EXPECT_EQ("80070005 0 :0", error("@item.unexplained"));
+  EXPECT_EQ("80004005 0 :0",
+            error("raise ActiveScript::ComError.new('x', :y, 0, nil, [], [], {})"));
+  TakeLog();
   // Collected objects are given back while the macro runs, not only at its end.
   ULONG most = 0;
   host.item.quiet = true;

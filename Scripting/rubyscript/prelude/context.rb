@@ -90,7 +90,7 @@ module ActiveScript
     def main = @globals_snapshot.main
 
     def start_work
-      @works.push(Work.new(ENTERED.size > 1 ? caller.size : 0, ractors, []))
+      @works.push(Work.new(ENTERED.size > 1 ? caller : [], ractors, []))
     end
 
     # What is compiled and has not run.
@@ -285,21 +285,31 @@ module ActiveScript
 
     def run_time_position(error)
       location = location_of(error)
-      return [location.path, location.lineno, column_of(error, location)] if location
+      return [location.path, *place_of(error, location)] if location
       frame = own_frames(Array(error.backtrace)).find { |each| @sources.key?(each[/\A[^:]*/]) }
-      frame ? [frame[/\A[^:]*/], frame[/:(\d+)/, 1].to_i, 0] : [nil, nil, 0]
+      frame ? [frame[/\A[^:]*/], whole_line(frame)[/:(\d+)/, 1].to_i, 0] : [nil, nil, 0]
     end
 
-    # In bytes. The library's part that is loaded changes no message. CRuby can tell where the node of a frame begins.
-    def column_of(error, location)
+    # CRuby keeps lines of running code as signed numbers of so many values. Nodes have the whole number,
+    # counted from the text's first line.
+    LINES = 131_072
+    private_constant :LINES
+
+    # The line, and the column in bytes. The library's part that is loaded changes no message. CRuby can
+    # tell where the node of a frame begins.
+    def place_of(error, location)
       node = RubyVM::AbstractSyntaxTree.of(location, keep_script_lines: true)
+      before = @sources[location.path].first_line - 1
+      line = location.lineno + Rational(node.first_lineno + before - location.lineno, LINES).round * LINES
       require "error_highlight/base"
       spot = ErrorHighlight.spot(node, point_type: :name, name: error.name) if NameError === error
-      return spot[:first_column] if spot && spot[:first_lineno] == location.lineno
-      node.first_lineno == location.lineno ? node.first_column : 0
+      return [line, spot[:first_column]] if spot && spot[:first_lineno] + before == line
+      [line, node.first_lineno + before == line ? node.first_column : 0]
     rescue StandardError, LoadError
-      0
+      [location.lineno % LINES, 0]
     end
+
+    def whole_line(frame) = frame.sub(/(?<=:)-\d+/) { |line| line.to_i + LINES }
 
     def line_text(name, line)
       source = @sources[name]
@@ -307,9 +317,11 @@ module ActiveScript
       text&.dup&.force_encoding(Encoding::UTF_8)
     end
 
-    # In characters.
+    # In units of the text as the host has it: bytes for an 8-bit host, else UTF-16.
     def column_in(text, bytes)
-      text && bytes <= text.bytesize ? text.byteslice(0, bytes).length : 0
+      return 0 unless text && bytes <= text.bytesize
+      before = text.byteslice(0, bytes)
+      byte_host ? bytes : before.length + before.scrub.count("\u{10000}-\u{10FFFF}")
     end
 
     # The macro's own classes of exceptions may fail here, and their texts be in any encoding.
@@ -326,8 +338,9 @@ module ActiveScript
 
     # Below them stand those of a macro that waits for this one, whose texts have the same names.
     def own_frames(frames)
-      own = frames.size - @outer_frames.to_i
-      own.positive? ? frames.first(own) : frames
+      outer = @outer_frames.to_a
+      return frames if outer.empty? || frames.last(outer.size).map(&:to_s) != outer
+      frames.first(frames.size - outer.size)
     end
 
     def description(error, host_text)
@@ -337,6 +350,7 @@ module ActiveScript
       first, rest = message.split("\n", 2)
       frames = own_frames(Array(error.backtrace)).select { |each| @sources.key?(each[/\A[^:]*/]) }
                                      .reject { |each| each.end_with?("in `method_missing'") }
+                                     .map { |each| whole_line(each) }
       text = SyntaxError === error ? message : ["#{first}#{hint(error)} (#{error.class})", rest].compact.join("\n")
       [host_text || text, *frames.first(20).map { |frame| "\tfrom #{frame}" }].join("\n")
     end

@@ -52,15 +52,17 @@ module ActiveScript
 
   # A call of a COM object that failed.
   class ComError < StandardError
-    attr_reader :name, :hresult, :source
+    attr_reader :name, :hresult, :source, :wcode, :help_file, :help_context
 
-    def initialize(message, name = nil, hresult = 0x80004005, source = nil)
+    def initialize(message, name = nil, hresult = 0x80004005, source = nil, wcode = 0, help_file = nil,
+                   help_context = 0)
       super(message)
       @name, @hresult, @source = name, hresult, source
+      @wcode, @help_file, @help_context = wcode, help_file, help_context
     end
 
-    def self.for(object, name, hresult, description, source)
-      new("#{called(object, name)}: #{reason(hresult, description, source)}", name, hresult, source)
+    def self.for(object, name, hresult, description, source, *details)
+      new("#{called(object, name)}: #{reason(hresult, description, source)}", name, hresult, source, *details)
     end
 
     def self.unknown(object, name, hresult)

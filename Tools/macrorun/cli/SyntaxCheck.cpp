@@ -78,7 +78,7 @@ ExitCode Checker::Parse(const fs::path& macro, const std::string& engineName) {
     throw UsageError("cannot create the script engine " + engineName + ": " +
                      SystemMessage(static_cast<unsigned long>(result)));
   const Held<IActiveScript> engine(created);
-  ParseSite site(ToUtf8(macro), !IsRubyEngine(engineName));
+  ParseSite site(ToUtf8(macro));
   ErrorCapture warnings;
   result = ParseWith(engine.get(), site, text);
   engine->Close();

@@ -22,7 +22,7 @@ void DiagnosticCollector::Take(std::string_view report) noexcept {
     faulted = true;
     Add(Plain("fault", report));
   } else if (std::optional<Diagnostic> error = ParseScriptError(report, runs.back().macro)) {
-    error->columnInBytes = columnsInBytes;
+    error->columnInBytes = true;
     if (error->message == kInterruption)
       AddStop(std::move(*error));
     else

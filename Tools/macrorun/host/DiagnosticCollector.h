@@ -28,9 +28,7 @@ class DiagnosticCollector {
     DiagnosticCollector& collector;
   };
 
-  // `countsBytes`: whether the engine counts columns in bytes.
-  DiagnosticCollector(Reporter& target, bool countsBytes)
-      : reporter(target), columnsInBytes(countsBytes) {}
+  explicit DiagnosticCollector(Reporter& target) : reporter(target) {}
 
   // The first two inside a scope.
   void Take(std::string_view report) noexcept;
@@ -59,7 +57,6 @@ class DiagnosticCollector {
   static Diagnostic Plain(const char* kind, std::string_view report);
 
   Reporter& reporter;
-  const bool columnsInBytes;
   std::vector<Run> runs;
   Diagnostic stop;
   bool faulted = false;

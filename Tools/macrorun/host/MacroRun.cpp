@@ -75,7 +75,7 @@ MacroRun::MacroRun(RunContext& runContext, Editor& runEditor)
     : context(runContext),
       editor(runEditor),
       encoding(runContext.language.IsRuby() ? ResultEncoding::kBytes : ResultEncoding::kCharacters),
-      diagnostics(runContext.reporter, encoding == ResultEncoding::kCharacters),
+      diagnostics(runContext.reporter),
       services(runContext.options, runContext.reporter, *this, runContext.argumentsRead) {
   const HostCallbacks callbacks = {this, OnReport, OnTrace, OnFunctionId, OnCall, OnStopping};
   link.reset(CreateHostLink(&callbacks));

@@ -39,7 +39,7 @@ HRESULT ParseSite::OnScriptError(IActiveScriptError* scriptError) {
   scriptError->GetSourceLineText(&source);
   error->source = BytesOf(source, SysStringLen(source));
   SysFreeString(source);
-  error->columnInBytes = columnsInBytes;
+  error->columnInBytes = true;
   EXCEPINFO exception = {};
   scriptError->GetExceptionInfo(&exception);
   SetDescription(*error,

@@ -15,9 +15,7 @@
 
 class ParseSite final : public IActiveScriptSite {
  public:
-  // `countsBytes`: whether the engine counts columns in bytes.
-  ParseSite(std::string macroName, bool countsBytes)
-      : macro(std::move(macroName)), columnsInBytes(countsBytes) {}
+  explicit ParseSite(std::string macroName) : macro(std::move(macroName)) {}
 
   std::optional<Diagnostic> TakeError() { return std::move(error); }
 
@@ -37,6 +35,5 @@ class ParseSite final : public IActiveScriptSite {
 
  private:
   const std::string macro;
-  const bool columnsInBytes;
   std::optional<Diagnostic> error;
 };

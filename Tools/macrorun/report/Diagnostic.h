@@ -18,7 +18,7 @@ struct Diagnostic {
   std::string file;
   int line = 0;
   int column = 0;
-  bool columnInBytes = false;  // for engines that take each byte for a character
+  bool columnInBytes = false;  // as engines count: they get each byte as a character
   std::string message;         // one line
   std::string source;          // the text of the line
   std::vector<std::string> details;
