@@ -232,9 +232,11 @@ bool Interpreter::HasStarted() { return state.rubyFiber != nullptr; }
 DWORD Interpreter::FatalExceptionCode() { return state.fault.ExceptionCode; }
 
 HRESULT Interpreter::Start() {
-  if (FatalExceptionCode()) return E_ABORT;
   if (!IsOnlyCopy()) return kOtherCopy;
   const HRESULT claimed = ClaimThread();
+  // CRuby's own threads fail when the interpreter's has ended, which would count as a fault.
+  if (claimed == RPC_E_SERVER_DIED) return claimed;
+  if (FatalExceptionCode()) return E_ABORT;
   if (FAILED(claimed)) return claimed;
   if (IsRubySide()) return E_UNEXPECTED;
   if (state.rubyFiber) {

@@ -92,7 +92,7 @@ VALUE MacroTask::StartBody(VALUE data) {
 VALUE MacroTask::CodeBody(VALUE data) {
   Code& code = CodeFrom(data);
   MacroTask& task = code.task;
-  if (task.kind == Kind::kCallBack) return task.body(task.data), Qnil;
+  if (task.kind == Kind::kCallBack) return task.callBack(task.callBackData), Qnil;
   if (task.kind == Kind::kCall) {
     const VALUE name = StringOf(task.text, TextForm::kUtf16);
     const VALUE main = rb_funcall(task.engineState.context, rb_intern("main"), 0);
@@ -106,8 +106,8 @@ VALUE MacroTask::CodeBody(VALUE data) {
 
 VALUE MacroTask::NextBlockBody(VALUE data) {
   Code& code = CodeFrom(data);
-  return code.block = rb_funcall(code.task.engineState.context, rb_intern("next_exit_block"), 1,
-                                 code.error);
+  return code.block =
+             rb_funcall(code.task.engineState.context, rb_intern("next_exit_block"), 1, code.error);
 }
 
 VALUE MacroTask::ExitBlockBody(VALUE data) {
@@ -269,10 +269,10 @@ void MacroTask::Work() {
   result = E_ABORT;
   Interpreter::SetInterruptible(true);
   if (!Interpreter::MustEnd()) {  // else it was interrupted before it began
-    const bool isMacro =
-        kind == Kind::kRun || kind == Kind::kCall || kind == Kind::kCallBack;
-    const Outcome outcome = isMacro ? RunMacro(outcomeValue)
-                                    : Protect(WorkBody, reinterpret_cast<VALUE>(this), outcomeValue);
+    const bool isMacro = kind == Kind::kRun || kind == Kind::kCall || kind == Kind::kCallBack;
+    const Outcome outcome = isMacro
+                                ? RunMacro(outcomeValue)
+                                : Protect(WorkBody, reinterpret_cast<VALUE>(this), outcomeValue);
     if (outcome == Outcome::kDone) SetValue(outcomeValue);
     if (outcome == Outcome::kRaised) {
       Interrupter::Settle();  // threads of the macro's may have raised more

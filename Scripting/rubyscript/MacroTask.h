@@ -44,7 +44,7 @@ class MacroTask final : public RubyTask {
     kRun,       // all that is compiled; sets `value`
     kDefines,   // whether the macro has a function named `text`; S_OK or S_FALSE
     kCall,      // the function named `text`, with `arguments`; sets `value`
-    kCallBack,  // `body` with `data`: Ruby code that COM calls through win32ole
+    kCallBack,  // `callBack`: Ruby code that COM calls through win32ole
     kDiscard,   // the context; what was persistent is compiled for the next one
   };
 
@@ -60,10 +60,10 @@ class MacroTask final : public RubyTask {
   ULONG firstLine = 0;      // of the text, from 0
   DWORD cookie = 0;         // the host's own name for the text
   bool persistent = false;
-  bool wantsValue = false;                // of kRun
-  const DISPPARAMS* arguments = nullptr;  // read before any macro code runs
-  unsigned long (*body)(unsigned long) = nullptr;
-  unsigned long data = 0;
+  bool wantsValue = false;                             // of kRun
+  const DISPPARAMS* arguments = nullptr;               // read before any macro code runs
+  unsigned long (*callBack)(unsigned long) = nullptr;  // of kCallBack, with its argument
+  unsigned long callBackData = 0;
 
   struct Code;  // one run of the macro's code
 

@@ -389,8 +389,8 @@ HRESULT ScriptEngine::CallBack(const void* owner, unsigned long (*body)(unsigned
   const Call call(engine);
   MacroTask* const task = engine->NewTask(MacroTask::Kind::kCallBack, nullptr);
   if (!task) return E_OUTOFMEMORY;
-  task->body = body;
-  task->data = data;
+  task->callBack = body;
+  task->callBackData = data;
   return engine->Perform(task, nullptr, nullptr);
 }
 
@@ -423,7 +423,7 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
 
 // Why Ruby cannot be entered, for the site.
 static void DescribeFailedStart(HRESULT started, wchar_t (&text)[256]) {
-  if (Interpreter::FatalExceptionCode()) {
+  if (started == E_ABORT) {
     swprintf(text, 256,
              L"Ruby was lost to a fault (exception 0x%08lX) in an earlier macro. Start the program "
              L"anew to run Ruby macros again.",
