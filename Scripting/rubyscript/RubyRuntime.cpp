@@ -97,27 +97,17 @@ VALUE SetTopSelf(VALUE, VALUE object) {
   return object;
 }
 
-VALUE LabelBlockAsMain(VALUE child, VALUE, int, const VALUE*, VALUE);
-
-// Replaces "<compiled>" by "<main>" in the labels of a code and its blocks. CRuby has no setter: the
-// label is found in the code's structure by its value.
+// Replaces the label "<compiled>" of a code by "<main>". CRuby has no setter: the label is found in the
+// code's structure by its value. Blocks keep "block in <compiled>": asking for them leaks memory in CRuby.
 VALUE LabelAsMain(VALUE, VALUE code) {
   constexpr int kFields = 40;  // of which it is about the twentieth
   VALUE* const iseq = static_cast<VALUE*>(const_cast<void*>(rb_iseqw_to_iseq(code)));
   VALUE* const fields = reinterpret_cast<VALUE*>(iseq[2]);
   const VALUE label = rb_funcall(code, rb_intern("label"), 0);
-  const char* const compiled = strstr(RSTRING_PTR(label), "<compiled>");
-  if (!compiled) return Qnil;  // a method or a class, and so are its blocks
-  const VALUE name = rb_str_freeze(
-      rb_sprintf("%.*s<main>", static_cast<int>(compiled - RSTRING_PTR(label)), RSTRING_PTR(label)));
+  const VALUE name = rb_str_freeze(rb_str_new_cstr("<main>"));
   for (int i = 0; i < kFields; ++i)
     if (fields[i] == label) RB_OBJ_WRITE(reinterpret_cast<VALUE>(iseq), &fields[i], name);
-  rb_block_call(code, rb_intern("each_child"), 0, nullptr, LabelBlockAsMain, Qnil);
   return Qnil;
-}
-
-VALUE LabelBlockAsMain(VALUE child, VALUE, int, const VALUE*, VALUE) {
-  return LabelAsMain(Qnil, child);
 }
 
 // `rescue` asks this. No class of exceptions takes the end of an interrupted macro.

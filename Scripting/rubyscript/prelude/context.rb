@@ -350,7 +350,7 @@ module ActiveScript
       first, rest = message.split("\n", 2)
       frames = own_frames(Array(error.backtrace)).select { |each| @sources.key?(each[/\A[^:]*/]) }
                                      .reject { |each| each.end_with?("in `method_missing'") }
-                                     .map { |each| whole_line(each) }
+                                     .map { |each| whole_line(each).sub("<compiled>'", "<main>'") }
       text = SyntaxError === error ? message : ["#{first}#{hint(error)} (#{error.class})", rest].compact.join("\n")
       [host_text || text, *frames.first(20).map { |frame| "\tfrom #{frame}" }].join("\n")
     end
