@@ -94,10 +94,12 @@ BOOL WINAPI ProcessToken(HANDLE process, DWORD access, PHANDLE token) {
 }  // namespace
 
 TEST_F(SystemTest, AccessToAFolder) {
-  const Replacement check(dll, "AccessCheck", CheckAccess),
-      thread(dll, "OpenThreadToken", ThreadToken), process(dll, "OpenProcessToken", ProcessToken);
   char record[392] = {'\x88', 1};  // its size
   const std::string header(record, sizeof record);
+  // The first call in a process also chooses the path of the description.
+  EXPECT_TRUE(CallExport<bool>(dll, "version", &record[0], testFolder.c_str()));
+  const Replacement check(dll, "AccessCheck", CheckAccess),
+      thread(dll, "OpenThreadToken", ThreadToken), process(dll, "OpenProcessToken", ProcessToken);
   for (bool impersonates : {false, true}) {
     Log(impersonates ? "--- impersonating" : "--- as the process");
     if (impersonates) EXPECT_TRUE(ImpersonateSelf(SecurityImpersonation));
