@@ -1,4 +1,5 @@
 # SPDX-License-Identifier: MIT
+# shellcheck shell=sh
 # Sourced by the test scripts: the project's Wine prefix, unless the caller has chosen one.
 root=$(cd "$(dirname "$0")" && pwd)
 root=${root%/Tests/*}

@@ -1,22 +1,23 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: MIT
-# Measures what ships, each figure beside a peer's from the same run:
+# Measures the shipped programs; each figure is compared with a peer's from the same run:
 #
 #   scripts/bench.sh            all groups; writes Benchmarks/results.md and a chart of each group
 #   scripts/bench.sh GROUP...   those only, to standard output
 #
-# Groups: calls dispatch runs start files module macro library. Some minutes on an idle machine; a
-# busy one makes the spread wide. Sets the machine up and builds first when needed. The results
-# appear whole or not at all.
+# Groups: calls dispatch runs start files module macro library. Takes some minutes on an idle
+# machine; a busy one widens the spread. Sets the machine up and builds first when needed. The
+# results are written only when all groups have finished.
 set -euo pipefail
+# shellcheck source=scripts/lib.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 PACKAGES+=(gnuplot-nox)
 
 GROUPS_IN_ORDER=(calls dispatch runs start files module macro library)
 
-# measure GROUP [FILE]: the group's section; FILE receives the numbers of its chart. A file in
-# between, since Wine's server keeps a pipe open.
+# measure GROUP [FILE]: prints the group's section; FILE receives the numbers of its chart. The
+# output passes through a file, since Wine's server would keep a pipe open.
 measure() {
   local output
   output=$(mktemp)

@@ -7,11 +7,12 @@
 #   ruby/      what a Windows machine needs: bin, lib/ruby/3.1.0, licenses. It works wherever it is copied.
 #   tests/     CRuby's own tests (test, spec, bootstraptest) and what they load (tool/lib)
 set -euo pipefail
+# shellcheck source=scripts/cross-build.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/cross-build.sh"
 
 PACKAGES+=(ruby)
 
-# The library win32ole calls COM, and is called by it, in the engine's own way (see OleEmbedder.h).
+# Lets the engine route win32ole's calls to and from COM (see OleEmbedder.h).
 PATCH=$ROOT/scripts/win32ole.patch
 RECIPE=$(sha256sum - "$PATCH" <<<"$RECIPE" | cut -c -64 | sha256sum)
 
@@ -20,10 +21,10 @@ PACKAGE_VERSION=3.1.2-7+deb12u1
 API=3.1.0
 ARCH=i386-mingw32
 
-# Each needs a library that is not there for Windows, or serves none there.
+# Each needs a library that Windows lacks, or is of no use on Windows.
 LEFT_OUT=openssl,readline,readline-ext,zlib,dbm,gdbm,fiddle,psych,pty,syslog,socket
 
-# Libraries that cannot load without those, and tools for developers at a console.
+# Libraries that need those extensions, and tools for developers at a console.
 UNUSABLE=(
   bundled_gems.rb drb drb.rb ipaddr.rb net open-uri.rb psych psych.rb readline.rb resolv-replace.rb
   resolv.rb rinda win32 yaml yaml.rb "$ARCH/win32"
@@ -81,7 +82,7 @@ collect() {
   collect_headers && collect_runtime && collect_licenses && collect_tests
 }
 
-# Everything that is shipped must load, and character tables must be there.
+# Checks that every shipped library loads, and that the character tables are present.
 check_runtime() {
   timeout 300 wine result/ruby/bin/ruby.exe -W0 --disable-gems -r rbconfig -e '
     folder = RbConfig::CONFIG["rubylibdir"]

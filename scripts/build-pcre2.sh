@@ -3,8 +3,9 @@
 # Cross-builds PCRE2, the regular expressions of macrorun, for 32-bit Windows from Debian's source
 # package and prints the folder that holds it:
 #   include/pcre2.h, lib/libpcre2-8.a   8-bit characters, UTF and Unicode properties, no JIT
-#   licenses/                           what a package with the library in it has to carry
+#   licenses/                           to be included in every package that contains the library
 set -euo pipefail
+# shellcheck source=scripts/cross-build.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/cross-build.sh"
 
 SOURCE=pcre2

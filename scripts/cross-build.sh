@@ -1,18 +1,21 @@
 # SPDX-License-Identifier: MIT
 # shellcheck shell=bash
-# What build-cruby.sh and build-pcre2.sh share: they cross-build the source package SOURCE, pinned to
-# PACKAGE_VERSION, for 32-bit Windows and print the folder that holds the outcome. It is in a cache
-# outside the build folder and appears in one rename, so it is whole or not there. Changing a command
-# here or in the caller makes another one. It takes the build lock by itself: call it before.
+# Shared by build-cruby.sh and build-pcre2.sh, which cross-build the source package SOURCE, version
+# PACKAGE_VERSION, for 32-bit Windows and print the folder with the result. The folder is in a cache
+# outside the build folder. It appears in one rename, so it is never incomplete. A change to a
+# command here or in the caller gives a new folder. The script takes the build lock itself: call it
+# unlocked.
+# shellcheck source=scripts/lib.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 PACKAGES+=(dpkg-dev)
 
+# shellcheck disable=SC2034 # for the scripts that source this file
 HOST=i686-w64-mingw32
 CACHE=${SCRIPTRUBY_CACHE:-$HOME/.cache/scriptruby}
 RECIPE=$(grep -hv '^ *#' "$0" "${BASH_SOURCE[0]}" | sha256sum)
 
-# A list of its own: the machine's sources stay as they are, and root is not needed.
+# Uses a separate source list, so that the machine's lists do not change and root is not needed.
 fetch_source() {
   local codename mirror
   codename=$(. /etc/os-release && printf %s "$VERSION_CODENAME")
@@ -30,7 +33,7 @@ fetch_source() {
     mv "$SOURCE-${PACKAGE_VERSION%%-*}" source
 }
 
-# What an interrupted build left behind goes away; the lock says that nobody works there.
+# Deletes the remains of interrupted builds: under the lock, no other build uses them.
 build_into_cache() {
   local name=$1 result=$2
   rm -rf "$CACHE/.$name"-*
@@ -44,7 +47,7 @@ build_into_cache() {
   rm -rf "$WORK"
 }
 
-# print_cached NAME: builds with the caller's function `build` what is not in the cache under that name.
+# print_cached NAME: prints the folder in the cache. Calls the caller's `build` if it is missing.
 print_cached() {
   local name=$1 result=$CACHE/$1-${PACKAGE_VERSION%%-*}-${RECIPE:0:12}
   if [ ! -d "$result" ]; then

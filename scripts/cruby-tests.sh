@@ -6,8 +6,8 @@
 #   scripts/cruby-tests.sh [--continue] [--children] [PATTERN...]
 #
 # PATTERN names files of CRuby's folder `test`, for example 'ruby/test_io*.rb'; without one, all
-# files are run. A test that starts another Ruby is skipped unless --children is given; then that
-# Ruby is the engine or ruby.exe as well. Such tests take some seconds each.
+# files are run. Tests that start another Ruby are skipped unless --children is given. The other
+# Ruby is then the same one, engine or ruby.exe, and each of these tests takes some seconds.
 #
 # The outcomes are kept in build/cruby-tests. Those of ruby.exe are used again as long as CRuby is
 # the same, those of the engine only with --continue, which resumes an interrupted run.
@@ -15,6 +15,7 @@
 # Tests/cruby/differences.txt lists the known differences. The exit code is 1 after any other one.
 # JOBS sets how many files run at a time (2), LIMIT how many seconds a file may take (300).
 set -euo pipefail
+# shellcheck source=scripts/lib.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 # Libraries that are not in the package, and tests of programs other than Ruby macros.

@@ -19,7 +19,7 @@ PACKAGES=(
 export WINEARCH=win32
 export WINEPREFIX=$BUILD/wineprefix
 export WINEDEBUG=-all
-# Wine names files by it.
+# Wine converts file names by this locale.
 export LC_ALL=C.UTF-8
 
 say() { printf '%s\n' "$*" >&2; }
@@ -29,8 +29,8 @@ die() {
   exit "${STATUS:-1}"
 }
 
-# In the background: shows each half minute how far a step has come, until it is killed or the command
-# that it belongs to is gone.
+# Runs in the background and shows the progress of a step every 30 seconds, until it is killed or
+# the command that started it ends.
 show_progress() {
   trap 'kill $!; exit' TERM
   SECONDS=0 # of this shell's own
@@ -96,7 +96,7 @@ make_wine_prefix() {
     touch "$WINEPREFIX/.complete"
 }
 
-# Waits for the descriptor 9, which a command holds while it sets up or builds.
+# Locks descriptor 9, which a command holds while it sets up or builds.
 lock() {
   flock -n 9 && return
   say "-- waiting for another command that builds"
@@ -119,15 +119,15 @@ set_up() {
   fi
 }
 
-# start_wine [SECONDS]: keeps Wine's server that long after its last program (60), since starting it
-# takes longer than a macro does.
-# The first program starts Wine's services, which keep its output open: that must be no caller's pipe.
+# Starts Wine's server and keeps it for a minute after its last program: starting it takes longer
+# than a macro does. The first program starts Wine's services, which hold its output open, so that
+# output must not be a pipe of the caller.
 start_wine() {
-  wineserver -p"${1:-60}" >/dev/null 2>&1 </dev/null || true # it is running already
+  wineserver -p60 >/dev/null 2>&1 </dev/null || true # it is running already
   wine cmd /c exit >/dev/null 2>&1 </dev/null || true
 }
 
-# build_release CRUBY PCRE2 [TARGET...]: configures with those when it is due, and builds.
+# build_release CRUBY PCRE2 [TARGET...]: builds, and configures first when that is necessary.
 build_release() {
   local cruby=$1 pcre2=$2 made=$BUILD/release/build.ninja
   shift 2

@@ -6,6 +6,7 @@
 #
 # Sets the machine up and builds first when needed. The zip appears whole or not at all.
 set -euo pipefail
+# shellcheck source=scripts/lib.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 [[ ${1:-} != -* ]] || STATUS=2 die "usage: scripts/package.sh [FILE.zip]"

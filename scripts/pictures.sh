@@ -3,6 +3,7 @@
 # Makes the pictures of the documents: Docs/pictures/NAME.svg from NAME.dot (Graphviz) or NAME.puml
 # (PlantUML). Installs both programs when they are missing.
 set -euo pipefail
+# shellcheck source=scripts/lib.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 PACKAGES=(graphviz plantuml)

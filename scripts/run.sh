@@ -6,6 +6,7 @@
 #
 # Options are macrorun's (--help lists them). Sets the machine up and builds first when needed.
 set -euo pipefail
+# shellcheck source=scripts/lib.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 [ $# -gt 0 ] || STATUS=2 die "usage: scripts/run.sh [OPTION...] MACRO [FILE] (--help lists the options)"

@@ -2,6 +2,7 @@
 # SPDX-License-Identifier: MIT
 # Runs all tests: sets the machine up and builds first when needed. Arguments go to ctest.
 set -euo pipefail
+# shellcheck source=scripts/lib.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 PACKAGES+=(python3)

@@ -1,23 +1,24 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: MIT
-# The whole length of what ctest does for seconds, and prints its figures:
+# Runs the long form of the tests that ctest runs for seconds, and prints their figures:
 #
 #   scripts/torture.sh [memory | values | profile | hosts | recordings | fuzz | undefined | tidy]...
 #
-# Without arguments all of them, which takes one to two hours on an idle machine. The figures go to
-# Docs/reliability.md as well, each under the command that made it. SCRIPTRUBY_TORTURE_SEED, or in
-# the section profile CORE_TEST_SEED, repeats a random test by the seed that it printed; FUZZ_SECONDS
-# is the time for each fuzz target (60).
+# Without arguments, runs all of them, which takes one to two hours on an idle machine. The figures
+# are also written to Docs/reliability.md, each below the command that produced it. To repeat a
+# random test, set SCRIPTRUBY_TORTURE_SEED (in the section profile CORE_TEST_SEED) to the seed that
+# it printed. FUZZ_SECONDS is the time for each fuzz target (60).
 #
 # Sets the machine up and builds first when needed.
 set -euo pipefail
+# shellcheck source=scripts/lib.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 REPORT=$ROOT/Docs/reliability.md
 ALL=(memory values profile hosts recordings fuzz undefined tidy)
 failed=0
 
-# Puts the standard input in place of the section's block of figures.
+# Replaces the section's block of figures by the standard input.
 keep_figures() { # keep_figures SECTION
   awk -v heading="## $1" -v figures=/dev/stdin '
     /^## / { inside = ($0 == heading) }
@@ -29,7 +30,7 @@ keep_figures() { # keep_figures SECTION
   mv "$REPORT.new" "$REPORT"
 }
 
-# record SECTION SHOWN COMMAND...: runs the command from the root; SHOWN is how to repeat it.
+# record SECTION SHOWN COMMAND...: runs the command from the root; SHOWN is the command for users.
 record() {
   local section=$1 shown=$2 log=$LOGS/torture-$1.log status=0
   shift 2
@@ -67,7 +68,7 @@ fuzz() {
   return $status
 }
 
-# Tests that fault on purpose would not notice one fault more.
+# Tests that fault on purpose would not notice another fault.
 undefined() {
   local program out=$LOGS/undefined.out
   for program in module_tests torture_tests; do

@@ -6,6 +6,7 @@
 # outcomes and FILE.done with the exit codes and the output. The engine is left out when ruby.exe
 # ran no test.
 set -euo pipefail
+# shellcheck source=Tests/wine.sh
 . "$(dirname "$0")/../wine.sh"
 bin=$1 tests=$2 file=$3 out=$4 limit=$5
 driver=$(readlink -f "$(dirname "$0")")/run-file.rb

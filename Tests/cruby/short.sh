@@ -4,6 +4,7 @@
 # process. Both times they have the outcomes in LIST: a line for each file, and one for each test
 # that neither passed nor was skipped.
 set -euo pipefail
+# shellcheck source=Tests/wine.sh
 . "$(dirname "$0")/../wine.sh"
 run_ruby=$1 list=$3
 driver=$(readlink -f "$(dirname "$0")")/run-file.rb

@@ -2,6 +2,7 @@
 # SPDX-License-Identifier: MIT
 # examples.sh MACRORUN FOLDER: each macro in the folder makes the text NAME.out of NAME.in. It runs
 # twice in one process and shows the same messages both times.
+# shellcheck source=Tests/wine.sh
 . "$(dirname "$0")/../wine.sh"
 folder=$(mktemp -d)
 trap 'rm -rf "$folder"' EXIT

@@ -2,6 +2,7 @@
 # SPDX-License-Identifier: MIT
 # host.sh MINIMAL_HOST MODULE FOLDER: the example of a host, with its macro, with one that fails and with
 # one that is stopped.
+# shellcheck source=Tests/wine.sh
 . "$(dirname "$0")/../wine.sh"
 host=$1
 module=$(wine winepath -w "$2" 2> /dev/null | tr -d '\r')

@@ -2,12 +2,18 @@
 # SPDX-License-Identifier: MIT
 # cscript.sh RUBYSCRIPT_DLL: the system's script host runs a macro. A manifest beside it names the
 # engine; only the file extension is registered, for the time of the test.
+# shellcheck source=Tests/wine.sh
 . "$(dirname "$0")/../wine.sh"
 engine=$(dirname "$1")
 folder=$(mktemp -d)
 classes='HKLM\Software\Classes'
-trap 'rm -rf "$folder"; for key in .rbstest rbstest; do
-  wine reg delete "$classes\\$key" /f > /dev/null 2>&1; done' EXIT
+clean_up() {
+  rm -rf "$folder"
+  for key in .rbstest rbstest; do
+    wine reg delete "$classes\\$key" /f > /dev/null 2>&1
+  done
+}
+trap clean_up EXIT
 mkdir "$folder/bin"
 ln -s "$engine/../lib" "$folder/lib"
 ln -s "$engine"/*.dll "$folder/bin/"

@@ -1,6 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # registration.sh RUBYSCRIPT_DLL: what regsvr32 writes for the user, and that it takes only that back.
+# shellcheck source=Tests/wine.sh
 . "$(dirname "$0")/../wine.sh"
 dll=Z:$(echo "$1" | tr / '\\')
 classes='HKCU\Software\Classes'

@@ -1,6 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # command-line.sh MACRORUN FAKE_MODULE: usage, exit codes, wrong calls, texts and paths.
+# shellcheck source=Tests/macrorun/cli/runner.sh
 . "$(dirname "$0")/runner.sh"
 
 # The command line

@@ -1,6 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # errors.sh MACRORUN FAKE_MODULE: errors, messages, traces, profiles and syntax checks.
+# shellcheck source=Tests/macrorun/cli/runner.sh
 . "$(dirname "$0")/runner.sh"
 printf 'text\n' > input.txt
 
@@ -74,7 +75,7 @@ if command -v script > /dev/null; then
   grep -q 'Syntax error' terminal && grep -q "$colour" terminal || fail "no colour: $(cat -v terminal)"
   NO_COLOR=1 timeout 20 script -qec "wine '$macrorun' macro.js" terminal > /dev/null 2>&1
   grep -q 'Syntax error' terminal && ! grep -q "$colour" terminal || fail 'colour despite NO_COLOR'
-  NO_COLOR= timeout 20 script -qec "wine '$macrorun' macro.js" terminal > /dev/null 2>&1
+  NO_COLOR='' timeout 20 script -qec "wine '$macrorun' macro.js" terminal > /dev/null 2>&1
   grep -q "$colour" terminal || fail 'no colour with an empty NO_COLOR'
 fi
 

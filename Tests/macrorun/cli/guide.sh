@@ -2,6 +2,7 @@
 # SPDX-License-Identifier: MIT
 # guide.sh MACRORUN FAKE_MODULE: the macros in the guide for macro authors and the recordings in the
 # manual do what the text says.
+# shellcheck source=Tests/macrorun/cli/runner.sh
 . "$(dirname "$0")/runner.sh"
 guide=$root/Docs/writing-macros.md
 

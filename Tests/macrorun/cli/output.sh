@@ -1,6 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # output.sh MACRORUN FAKE_MODULE: output files; a file is replaced completely or not at all.
+# shellcheck source=Tests/macrorun/cli/runner.sh
 . "$(dirname "$0")/runner.sh"
 
 printf 'old\r\nno end' > original

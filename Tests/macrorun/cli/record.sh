@@ -1,6 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # record.sh MACRORUN FAKE_MODULE: macros made from recordings; wrong recordings and templates.
+# shellcheck source=Tests/macrorun/cli/runner.sh
 . "$(dirname "$0")/runner.sh"
 languages=$(dirname "$macrorun")/languages
 

@@ -2,6 +2,7 @@
 # SPDX-License-Identifier: MIT
 # reference.sh MACRORUN FAKE_MODULE: the list of macro functions, Docs/functions.md and the stubs
 # agree; --help and the table of options agree.
+# shellcheck source=Tests/macrorun/cli/runner.sh
 . "$(dirname "$0")/runner.sh"
 page=$root/Docs/functions.md
 
@@ -48,7 +49,7 @@ grep -qx '@tarn ||= Tarn.new' tarn.rb || fail 'the stubs have no @tarn'
 guide=$root/Docs/macrorun.md
 expect 0 '' --help
 for option in $(sed -n 's/^  \(-.,\)\?\(--[a-z-]*\).*/\2/p' out); do
-  grep -q -- "^| \(\`-.\`, \)\?\`$option[\` ]" "$guide" || fail "$option is not in the table"
+  grep -q -- "^| \(\`-.\`, \)\?\`${option}[\` ]" "$guide" || fail "$option is not in the table"
   cat "$root"/Tests/macrorun/cli/*.sh | grep -q -- "$option\b" || fail "no test uses $option"
 done
 [ "$(grep -c '^| `-' "$guide")" -eq "$(grep -c '^  -' out)" ] || fail 'the table has options that do not exist'

@@ -1,9 +1,12 @@
 # SPDX-License-Identifier: MIT
+# shellcheck shell=sh
 # Sourced by the tests of macrorun, which are called with MACRORUN and FAKE_MODULE: a temporary
 # folder and functions that check results. The last line of each test is `finish`.
+# shellcheck source=Tests/wine.sh
 . "$(dirname "$0")/../../wine.sh"
 exec < /dev/null
 macrorun=$1
+# shellcheck disable=SC2034 # for the tests that source this file
 fake=$2
 folder=$(mktemp -d)
 trap 'rm -rf "$folder"' EXIT

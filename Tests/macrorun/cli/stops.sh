@@ -1,6 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # stops.sh MACRORUN FAKE_MODULE: Ctrl+C and timeouts.
+# shellcheck source=Tests/macrorun/cli/runner.sh
 . "$(dirname "$0")/runner.sh"
 printf 'text\n' > input.txt
 

@@ -1,6 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # testing.sh MACRORUN FAKE_MODULE: --test and --promote: results, differences, files.
+# shellcheck source=Tests/macrorun/cli/runner.sh
 . "$(dirname "$0")/runner.sh"
 
 # Folders without tests
