@@ -247,7 +247,7 @@ bool CompareLibrary(Section& section) {
       "`std::unordered_map`'s doing the same work (the median of the rounds, with the least and "
       "the greatest), and in nanoseconds, for 10 to 1,000,000 elements (characters, for `Format` "
       "texts, for `Array` and `cHashTable` entries, put in and "
-      "read). \"Grows\" tells from which size an element "
+      "read). \"Grows\" is the size from which an element "
       "costs four times what it costs among a hundred. A dash: one run would take longer than " +
           TimeText(kLongestRun) + ".");
   std::string head = "| |";

@@ -10,8 +10,8 @@
 
 namespace fs = std::filesystem;
 
-// The raw host and the engine that does nothing tell what they see. Who plays an engine's script
-// listens.
+// The raw host and the empty engine log their calls here. A benchmark can act on each line, in
+// place of an engine's script.
 void Log(const std::string& line) {
   for (const auto& [beginning, act] : on)
     if (line.starts_with(beginning)) return act();

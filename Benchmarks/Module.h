@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The module that ships, as a host has it: a copy of the DLL in a folder of its own with the
-// description of a language beside it, and a host whose functions do nothing but keep time.
+// The shipped module as a host uses it: a copy of the DLL in a separate folder with a language
+// description beside it, and a host whose functions only measure time.
 #pragma once
 
 #include <windows.h>
@@ -11,25 +11,25 @@
 #include "BareObject.h"
 #include "RawHost.h"
 
-// Where this program lies, beside what it measures.
+// The folder of this program and of the programs that it measures.
 std::filesystem::path ProgramFolder();
 
-// Writes a file as it is; throws when that fails.
+// Writes the bytes to a file; throws on failure.
 void WriteFile(const std::filesystem::path& path, const std::string& bytes);
 
-// As the host of the module's tests, but a call of a function costs as good as nothing.
+// Like the host of the module's tests, but a call of a function costs almost nothing.
 class QuietHost : public RawHost {
  public:
   QuietHost();
 
   LoopClock clock;
-  Comparison* comparisons = nullptr;  // take's, by its index
+  Comparison* comparisons = nullptr;  // of the function `take`, by its index
 };
 
 class Module {
  public:
-  // `description` is the text of the description file; without one there is no file. What it throws
-  // tells which file is missing.
+  // `description` is the text of the description file; if it is empty, there is no file. The
+  // exception names a missing file.
   explicit Module(const std::string& description);
   ~Module();
   Module(const Module&) = delete;
@@ -40,9 +40,9 @@ class Module {
   // A macro file in the module's folder.
   std::string Macro(const std::string& name, const std::string& text);
 
-  // One run for the quiet host: its seconds, negative and told on standard error when it failed.
+  // Seconds of one run for the quiet host; negative, with a message on standard error, on failure.
   double TimeRun(const std::string& macro);
-  // `version` with a record of its own; the same.
+  // Seconds of one call of `version`; negative on failure.
   double TimeVersion();
 
   QuietHost host;

@@ -99,9 +99,9 @@ bool CompareRubyRuns(Section& section) {
   if (run() < 0) return false;  // which starts the engine
   const std::string evaluation = ruby.Macro("evaluation.rbs", kEvaluation);
   const auto evaluate = [&] {
-    Comparison told("");
-    ruby.host.comparisons = &told;
-    return ruby.TimeRun(evaluation) < 0 ? -1 : told.PeerTime();
+    Comparison received("");
+    ruby.host.comparisons = &received;
+    return ruby.TimeRun(evaluation) < 0 ? -1 : received.PeerTime();
   };
   using Measure = Comparison::Measure;
   return CompareEach(section,
@@ -115,11 +115,11 @@ bool CompareRubyRuns(Section& section) {
 
 bool CompareRuns(Section& section) {
   section.Begin("Running an empty macro",
-                "`execute`, from the call to its return. \"Engine\" stands for the engine's steps "
+                "`execute`, from the call to its return. \"Engine\" means the engine's steps "
                 "without the module: create it, give it a site and `tarn`, parse, connect, close. "
                 "JScript has the description file that ships with `macrorun`, Ruby none. "
                 "The module has to read two files for each run, the description and the macro, "
-                "both afresh: the rows in brackets tell what that costs by itself. The first of "
+                "each time: the rows in brackets show what that alone costs. The first of "
                 "them is the least that any module can reach.");
   section.Head();
   return CompareJScriptRuns(section) && CompareRubyRuns(section);

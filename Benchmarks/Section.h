@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The outcome of one group of measurements: a section in Markdown on standard output, and the
+// The results of one group of measurements: a section in Markdown on standard output, and the
 // numbers of its chart in a file.
 #pragma once
 
@@ -11,7 +11,7 @@
 
 class Section {
  public:
-  // An empty path: no numbers for a chart are kept. Throws when the file cannot be written.
+  // With an empty path, writes no chart. Throws when the file cannot be written.
   explicit Section(const std::string& chartFile) {
     if (chartFile.empty()) return;
     chart.exceptions(std::ofstream::failbit | std::ofstream::badbit);
@@ -26,12 +26,12 @@ class Section {
     Print(comparison.Row());
     if (chart.is_open()) chart << comparison.ChartLine() << std::flush;
   }
-  // Text in Markdown as it is.
+  // Prints Markdown text.
   void Print(const std::string& text) {
     std::fputs(text.c_str(), stdout);
     std::fflush(stdout);
   }
-  // A line of the chart's file as it is.
+  // Writes a line to the chart's file.
   void Chart(const std::string& line) {
     if (chart.is_open()) chart << line << std::flush;
   }

@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: MIT
-# Times the same calls of one object, as the engine's `@tarn` and through win32ole, round by round.
-# The object's `class_id` is what win32ole makes it by, and it is told the seconds of one call.
+# Times the same calls of one object in turns, as the engine's `@tarn` and through win32ole.
+# win32ole creates the object by its `class_id`. The object receives the seconds of one call.
 require "win32ole"
 
 ROUNDS = 9

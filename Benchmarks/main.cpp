@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // benchmarks GROUP [FILE]: measures one group and prints its section of the results in Markdown;
-// FILE receives the numbers of its chart. Each group wants a process of its own. The exit code tells
-// whether it could be measured, not whether the goals are met.
+// FILE receives the numbers of its chart. Run each group in a separate process. The exit code is 0
+// when the group was measured, whether or not the goals are met.
 #include <windows.h>
 // Needs windows.h before it.
 #include <objbase.h>

@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: MIT
-# The Core library's sources by layer, named here once: the module links them in the Microsoft ABI,
-# the tests build the portable base in other ABIs as well.
+# The Core library's sources by layer, listed once: the module links them in the Microsoft ABI,
+# and the tests also build the portable base in other ABIs.
 set(CORE ${CMAKE_CURRENT_LIST_DIR})
 
 # Pure text and container code; includes no Windows header.

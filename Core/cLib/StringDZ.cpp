@@ -55,7 +55,7 @@ const char* StringDZ::Joined() {
     const String& entry = *entries.At(i);
     joined.Append(entry.Text(), static_cast<int>(entry.Length() + 1));
   }
-  joined.Append("");  // a second zero byte also behind the empty list
+  joined.Append("");  // an empty list also ends in two zero bytes
   return joined.Text();
 }
 

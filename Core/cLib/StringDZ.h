@@ -39,7 +39,7 @@ class StringDZ {
   static void CheckLayout();
   bool Fill(String& entry, const char* s, bool numbered) const;
 
-  [[maybe_unused]] u32 mark = 170;  // constant; tells a live list in a memory dump
+  [[maybe_unused]] u32 mark = 170;  // constant; marks a live list in a memory dump
   Array<String> entries;
   String joined;
 };

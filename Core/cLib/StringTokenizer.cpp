@@ -29,7 +29,7 @@ void StringTokenizer::PassDelimiter() {
   lastDelimiter = *cursor++;
 }
 
-// Appends the quoted stretch that the cursor stands on; leaves the cursor behind it.
+// Appends the quoted part that starts at the cursor; moves the cursor past it.
 void StringTokenizer::TakeQuoted() {
   for (++cursor; *cursor; ++cursor) {
     if (*cursor == quote && *++cursor != quote) return;

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 // StringTokenizer: cuts a copy of a text into tokens at delimiter bytes.
 //
-// Text enclosed by the quote character (none until SetQuote) belongs to its token whatever it
-// holds, and loses its quotes; a doubled quote inside stands for one, an unclosed one runs to the
-// end. Threading: none; one thread at a time.
+// Text between quote characters (none until SetQuote) belongs to one token, without its quotes.
+// Delimiters in it do not count. A doubled quote in it is one quote; without a closing quote it
+// ends with the text. Threading: none; one thread at a time.
 #pragma once
 
 #include "cLib/cString.h"

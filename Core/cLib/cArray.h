@@ -156,8 +156,8 @@ void Array<T>::Truncate(i32 size) {
 template <class T>
 class List : public Array<T> {};
 
-// A cursor over a List, valid while the list does not shrink. Each step returns the element it
-// stands on, null past the end; empty slots inside the list also read as null.
+// A cursor over a List, valid while the list does not shrink. Each step returns the current
+// element, or null past the end. Empty slots in the list also read as null.
 template <class T>
 class ListIter {
  public:

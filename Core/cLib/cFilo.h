@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // FIFO: a history of fixed size, newest element first. Stack: an Array used last in, first out.
 //
-// Both hold pointers to heap objects of one class and own them unless told otherwise.
+// Both hold pointers to heap objects of one class, and own them by default.
 // Broken preconditions and missing memory are reported (source "cFilo").
 // Threading: none; one thread at a time.
 #pragma once

@@ -20,8 +20,8 @@ void* AllocateZeroedBlock(u32 bytes);
 void ReleaseBlock(void* block);
 
 #if CORE_MICROSOFT_ABI
-// The module has no C++ library: `new` takes its memory here too and is null on failure. The build
-// tells the compiler so (cmake/MicrosoftAbi.cmake), or a failed `new` would run the constructor.
+// The module has no C++ library: `new` also takes its memory here, and returns null on failure.
+// cmake/MicrosoftAbi.cmake has the compiler check for null before it runs the constructor.
 void* __cdecl operator new(size_t bytes) noexcept;
 void __cdecl operator delete(void* block) noexcept;
 void __cdecl operator delete(void* block, size_t bytes) noexcept;

@@ -39,5 +39,5 @@ DebugHook SetDebugHook(DebugHook hook);
 // Writes the text unchanged to standard output; null writes nothing.
 void WriteStdout(const char* text);
 
-// Reports a failed precondition of the unit `source` at the line where it stands.
+// Reports a failed precondition of the unit `source`, with the line of the macro's use.
 #define REPORT_ASSERT(source, text) Report(source, __LINE__, text, kReportAssert)

@@ -465,8 +465,8 @@ u32 String::ReplaceAll(const char* needle, const char* replacement) {
   return occurrences;
 }
 
-// In one pass: where the text becomes longer it is first moved to the end of the room that it will
-// take, so that what is read always lies behind what has been written.
+// Works in one pass. A text that becomes longer is first moved to the end of the space that the
+// result takes, so that reading stays ahead of writing.
 void String::ReplaceEach(u32 occurrences, const Argument& from, const Argument& to, u32 result) {
   const char* const end = text + (result > length ? result : length);
   const char* source =

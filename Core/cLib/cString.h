@@ -104,7 +104,7 @@ class String {
   // False for null or for another length. Ignoring case follows the C runtime's current locale.
   bool Equals(const char* s, bool caseSensitive) const;
   bool EndsWith(const char* s, bool caseSensitive) const;  // false for null or empty
-  // Highest position, not below `fromPos`, at which `s` stands; -1 when there is none.
+  // Highest position of `s` that is not below `fromPos`; -1 if there is none.
   int FindReverse(const char* s, int fromPos, bool caseSensitive) const;
   u32 CountChar(char ch) const;
   int FirstNonBlank(int limit) const;  // its index, at most `limit`; -1 when there is none
@@ -160,8 +160,8 @@ class String {
   void FromUtf8ToUtf16(const char* s, int n = -1);
 
  private:
-  // Bytes that an operation reads while it changes its own block: copied, and terminated by two
-  // zero bytes, when they stand in that block, else used where they are.
+  // Bytes that an operation reads while it changes its own block. Bytes in that block are copied,
+  // with two zero bytes at the end; others are used in place.
   class Argument {
    public:
     Argument(const String& owner, const void* source, u32 size);
@@ -180,7 +180,7 @@ class String {
   u32 TextLength(const char* s, u32 most = kLargestSize) const;  // of an argument
   bool Begin(u32 n);                      // the first block, for `n` characters
   void TakeBlock(char* block, u32 size);  // in place of the old one
-  // The block has room. The length is counted anew, up to a zero byte.
+  // The block must have room. Recounts the length, up to the first zero byte.
   void ReplaceAt(u32 pos, u32 count, const char* bytes, u32 size);
   void ReplaceEach(u32 occurrences, const Argument& from, const Argument& to, u32 result);
   void DeleteThroughSlot(u32& pos);

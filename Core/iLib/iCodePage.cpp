@@ -18,7 +18,7 @@ void SetActiveCodePageFromKeyboard() {
   activeCodePage = codePage ? codePage : kUtf8CodePage;
 }
 
-// Writes up to `zeros` zero units behind `count` of them, while the room lasts.
+// Appends up to `zeros` zero units to `count` units, as far as `room` allows.
 template <class Unit>
 static void Terminate(Unit* out, int room, int count, int zeros) {
   for (int i = 0; i < zeros && count < room; ++i) out[count++] = 0;

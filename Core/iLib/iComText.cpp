@@ -19,8 +19,8 @@ const char* NarrowFromWide(const wchar_t* text) { return NarrowFromWide(text, na
 
 const wchar_t* WideFromNarrow(const char* text) {
   if (!text) text = "";
-  // A byte makes one unit at most. Four bytes a unit are more than any code page needs, so a
-  // character that is cut at the end of what is converted lies behind the last unit that is kept.
+  // A byte makes one unit at most, and no code page needs four bytes a unit. So a character that is
+  // cut at the end of the input comes after the last unit that is kept.
   wchar_t units[4 * kWideLimit];
   const int bytes = static_cast<int>(strnlen(text, 4 * kWideLimit));
   const int count = MultiByteToWideChar(CP_ACP, 0, text, bytes, units, bytes);

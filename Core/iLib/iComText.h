@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Text at the COM edge, through two module-wide buffers: each result is valid until the next
-// conversion in the same direction, so callers copy it first, or give a buffer of their own.
+// Text conversions for COM through two module-wide buffers. A result is valid until the next
+// conversion in the same direction: copy it before that, or pass a separate buffer.
 //
 // Threading: none; the thread of the macro run only.
 #pragma once

@@ -21,7 +21,7 @@ static bool ReadWhole(HANDLE file, char* bytes, DWORD size) {
   return true;
 }
 
-// The file's bytes with ten zeros behind them, or null. Freed with CoTaskMemFree.
+// The file's bytes followed by ten zeros, or null. Free with CoTaskMemFree.
 static char* LoadBytes(HANDLE file, DWORD size) {
   char* bytes = static_cast<char*>(CoTaskMemAlloc(size + 10));
   if (!bytes) return nullptr;
@@ -35,7 +35,7 @@ static wchar_t* Widen(const char* bytes, DWORD size) {
   const u32 wideBytes = size * 2 + 20;
   wchar_t* text = static_cast<wchar_t*>(CoTaskMemAlloc(wideBytes));
   if (!text) return nullptr;
-  // Where the conversion fails half-way it does not tell where: what it has written is kept.
+  // A conversion that fails half-way does not report the position: the part before it is kept.
   memset(text, 0, wideBytes);
   mbstowcs(text, bytes, size + 1);
   return text;

@@ -16,7 +16,7 @@
 
 static constexpr int kFolderLocalAppData = 28;    // CSIDL_LOCAL_APPDATA
 static constexpr DWORD kLongestModuleName = 255;  // longer names no longer join with a file name
-// Readers of logs know this check by its number, so it is fixed, wherever the check stands.
+// The line number in reports of this check. It is fixed, since readers of logs know the check by it.
 static constexpr int kModuleNameReportLine = 899;
 
 static String productFolder;

@@ -7,7 +7,7 @@
 #include "cLib/cString.h"
 
 // Full folder of the loaded module with its trailing backslash; empty when the system does not
-// tell. A name of 255 characters or more, or none, is reported (source "iGeneral").
+// report it. A name of 255 characters or more, or none, is reported (source "iGeneral").
 String ModuleFolder();
 
 // Whether the current user, as the thread's token has it when it impersonates, else the process's,

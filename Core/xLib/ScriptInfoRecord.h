@@ -15,7 +15,7 @@ constexpr u32 kScriptInfoRecordVersion = 77;
 #pragma pack(push, 1)
 struct ScriptInfoRecord {
   u32 size;           // in bytes; set by the host, zero after a successful call
-  u32 layoutVersion;  // likewise
+  u32 layoutVersion;  // set by the host, zero after a successful call
   char description[56];
   char extension[21];  // of macro files, without the dot
   char macroBegin[76];

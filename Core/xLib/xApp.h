@@ -7,8 +7,8 @@
 // Only an application calls the dialog and the check; the module is a library and does not.
 #pragma once
 
-// Whether the Core library runs inside an application of its own. The module clears it on loading:
-// it is a library, and nothing that only applications start may run.
+// Whether an application contains the Core library. The module clears this when it is loaded: it is
+// a library, and must not run code that is for applications only.
 bool RunsInApplication();
 void SetRunsInApplication(bool runs);
 

@@ -56,7 +56,7 @@ RealParts::RealParts(u64 bits) : whole(0), fraction(0) {
   const int exponent = static_cast<int>(bits >> 52 & 0x7FF);
   const u64 hidden = u64{exponent != 0} << 52;
   const u64 mantissa = (bits & ((u64{1} << 52) - 1)) | hidden;
-  const int places = 1075 - (exponent ? exponent : 1);  // of the mantissa, behind the binary point
+  const int places = 1075 - (exponent ? exponent : 1);  // of the mantissa, after the binary point
   negative = bits >> 63 != 0;
   fits = places > 21;
   if (!fits) return;

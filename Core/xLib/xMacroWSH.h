@@ -15,7 +15,7 @@ class xMacroWSH : public xMacro {
   // The description file is xMacroWSH.qwsh in the module's folder where the user may write there,
   // else in the user's product folder. The choice is made once and cached.
   xMacroWSH();
-  // The description file is `descriptionFile`, for later engines too.
+  // Uses `descriptionFile` as the description file, also for later engines.
   explicit xMacroWSH(const char* descriptionFile);
   xMacroWSH(const xMacroWSH&) = delete;
   xMacroWSH& operator=(const xMacroWSH&) = delete;

@@ -38,7 +38,7 @@ ULONG xScript::AddRef() { return static_cast<ULONG>(InterlockedIncrement(&refere
 
 ULONG xScript::Release() {
   if (InterlockedDecrement(&references) == 0) return 0;
-  // Read again, deliberately: engines are shown the count as it is now.
+  // Deliberately read again: engines get the current count.
   return static_cast<ULONG>(references);
 }
 
@@ -133,8 +133,8 @@ static bool ArePlain(const DISPPARAMS& params) {
   return true;
 }
 
-// Whether this module made it, not the host, which may have a destructor and a heap of its own. Objects
-// begin with the address of their class's table of operations.
+// Whether this module created the argument. One from the host may have another destructor and heap.
+// Objects begin with the address of their class's virtual table.
 static bool IsOwn(const xArgument& argument) {
   return IsInModule(*reinterpret_cast<void* const*>(&argument));
 }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
-// The object that scripts see as `tarn`: an IDispatch without methods of its own. Every name is
-// looked up in the host's table of macro functions and every call is carried out by the host, which
-// finds the arguments in, and leaves the result in, the context record.
+// The object that scripts see as `tarn`: an IDispatch that forwards everything to the host. Names
+// are looked up in the host's table of macro functions. The host executes each call; arguments and
+// result are in the context record.
 //
 // Ownership: the script site holds it by value, so the reference count never ends its life.
 // Errors: COM results, E_OUTOFMEMORY (without a call) among them; what the host meets while it runs

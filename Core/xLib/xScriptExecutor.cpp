@@ -21,7 +21,7 @@ static constexpr char kRubyEngine[] = "RubyScript";
 
 xScriptExecutor::xScriptExecutor(const char* progId, bool fixCRLF, bool fixDelimiter, u8 siteFlag)
     : dispatch(fixCRLF, fixDelimiter), host(CurrentHost()) {
-  // The caller's text may be read anew by a run that the host nests into this creation.
+  // A run that the host nests into this creation may change the caller's text.
   const String name(progId);
   // Whatever it answers, the destructor undoes one initialisation.
   CoInitialize(nullptr);
@@ -190,9 +190,9 @@ static void AppendNumber(String& text, long number) {
   text.Append(digits.Text());
 }
 
-// What the engine gives of the error's place and reason; its results are not looked at, the
-// defaults stand where it gives nothing. The exception's own strings are deliberately not
-// freed: the engine goes on with them.
+// Reads the position and the reason of the error. The engine's results are ignored: defaults apply
+// where it gives nothing. The strings of the exception are deliberately not freed: the engine still
+// uses them.
 HRESULT xScriptExecutor::OnScriptError(IActiveScriptError* error) {
   if (!error) return E_POINTER;
   BSTR lineText = nullptr;

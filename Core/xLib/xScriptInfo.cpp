@@ -16,7 +16,7 @@ static xScriptInfo defaultScriptInfo(true);
 xScriptInfo& CurrentScriptInfo() { return currentScriptInfo; }
 xScriptInfo& DefaultScriptInfo() { return defaultScriptInfo; }
 
-// The texts that have a key of their own, in the order of the file, after Language.
+// The texts and their keys, in the order of the file, after Language.
 struct TextKey {
   const char* key;
   String xScriptInfo::*member;
@@ -78,7 +78,7 @@ void xScriptInfo::SetDefaults() {
   FixDelimiter = false;
 }
 
-// Fills one field of the record, cutting the text to its width and clearing nothing behind it.
+// Fills one field of the record: cuts the text to its width, clears no bytes after the terminator.
 template <size_t width>
 static void CopyField(char (&field)[width], const String& text) {
   const size_t copied = text.Length() < width ? text.Length() : width - 1;

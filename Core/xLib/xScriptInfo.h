@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The language description: which Active Scripting engine to create, and the templates from which
-// the host editor writes a recorded keyboard macro in that language. Docs/description-file.md tells
-// users about every key.
+// the host editor writes a recorded keyboard macro in that language. Docs/description-file.md
+// documents every key.
 //
 // The module keeps two: the default description (built-in values, then the Ruby ones) and the
 // current one, read from the description file each time an engine is created. Threading: none.
@@ -19,8 +19,8 @@ class xScriptInfo {
   explicit xScriptInfo(bool withDefaults);
 
   SLOTS_FROM(0);
-  // Turns \n, \r and \t, in this order, into control characters. A backslash has no escape of its
-  // own.
+  // Turns \n, \r and \t, in this order, into control characters. There is no escape for a
+  // backslash.
   SLOT(0) void Unescape(String& text);
   // Unescape on the five templates from MacroBegin to FunctionPostfix. The escape members keep
   // their backslashes.
@@ -33,8 +33,8 @@ class xScriptInfo {
   SLOT(6) bool IsFixDelimiter() const { return FixDelimiter; }
   SLOT(7) const char* GetLanguage() const { return Language.Text(); }
   SLOT(8) bool IsNoCase() const { return NoCase; }
-  // Writes the description as it stands: nothing is escaped back, NoCase and Description have no
-  // key. The result is that of the last write.
+  // Writes the description without escaping it. NoCase and Description have no key. The result is
+  // that of the last write.
   SLOT(9) bool Write(Profile& profile);
   // Reads every key, falling back on `defaults`; never fails.
   SLOT(10) void Read(Profile& profile, const xScriptInfo& defaults);
