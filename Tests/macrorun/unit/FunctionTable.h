@@ -16,7 +16,7 @@ struct FakeServices : EditorServices {
   void Message(const std::string& text) override { messages += text + "\n"; }
   std::optional<std::string> Prompt(const std::string& question,
                                     const std::optional<std::string>& proposal) override {
-    if (question == "nobody?") return proposal;
+    if (question == "no answer?") return proposal;
     return question + "=" + proposal.value_or("");
   }
   std::optional<std::string> MacroArgument(const std::string& name) override {
