@@ -6,6 +6,7 @@
 #include "Interrupter.h"
 #include "RubyRuntime.h"
 // Last: they rename what the headers above use.
+#include "ClassSnapshot.h"
 #include "ComObject.h"
 #include "OleEmbedder.h"
 #include "RubyCall.h"
@@ -159,6 +160,10 @@ Outcome MacroTask::RunMacro(VALUE& outcomeValue) {
   return outcome;
 }
 
+VALUE MacroTask::EndThreadsBody(VALUE data) {
+  return rb_funcall(From(data).engineState.context, rb_intern("end_threads"), 0);
+}
+
 VALUE MacroTask::LeaveBody(VALUE data) {
   return rb_funcall(From(data).engineState.context, rb_intern("leave"), 0);
 }
@@ -195,6 +200,7 @@ namespace {
 struct Description {
   VALUE context;
   VALUE exception;
+  VALUE message;
   BSTR hostText;
   TextForm form;
   ScriptError::Details details;
@@ -221,14 +227,18 @@ void DescribeFailedCall(Description& description) {
   if (RB_TYPE_P(helpFile, T_STRING)) details.helpFile = TextOf(helpFile, description.form);
 }
 
+VALUE MessageBody(VALUE exception) {
+  return rb_obj_as_string(rb_funcall(exception, rb_intern("message"), 0));
+}
+
 }  // namespace
 
 VALUE MacroTask::DescribeBody(VALUE data) {
   Description& description = *reinterpret_cast<Description*>(data);
   const VALUE hostText =
       description.hostText ? StringOf(description.hostText, TextForm::kUtf16) : Qnil;
-  const VALUE parts =
-      rb_funcall(description.context, rb_intern("describe"), 2, description.exception, hostText);
+  const VALUE parts = rb_funcall(description.context, rb_intern("describe"), 3,
+                                 description.exception, hostText, description.message);
   ScriptError::Details& details = description.details;
   details.line = NUM2ULONG(rb_ary_entry(parts, 1));
   details.column = NUM2LONG(rb_ary_entry(parts, 2));
@@ -239,12 +249,20 @@ VALUE MacroTask::DescribeBody(VALUE data) {
   return Qnil;
 }
 
-// Asks the exception, which may run the macro's own code: Ruby's exceptions have methods.
+// Asks the exception for its message, which may run the macro's own code. The rest is the engine's.
 void MacroTask::SetError(VALUE exception, BSTR hostText) {
-  Description description = {engineState.context, exception, hostText, engineState.form, {}};
+  VALUE message;
+  Outcome outcome = Protect(MessageBody, exception, message);
+  if (outcome == Outcome::kRaised) message = rb_utf8_str_new_cstr("");
+  Description description = {engineState.context, exception, message, hostText, engineState.form, {}};
   ScriptError::Details& details = description.details;
-  VALUE ignored;
-  if (Protect(DescribeBody, reinterpret_cast<VALUE>(&description), ignored) == Outcome::kLeft) {
+  if (outcome != Outcome::kLeft) {
+    VALUE ignored;
+    const VALUE context = ClassSnapshot::Suspend();
+    outcome = ProtectUntraced(DescribeBody, reinterpret_cast<VALUE>(&description), ignored);
+    ClassSnapshot::Resume(context);
+  }
+  if (outcome == Outcome::kLeft) {
     SysFreeString(details.helpFile);
     result = E_ABORT;
     return;
@@ -289,14 +307,16 @@ void MacroTask::Work() {
 void MacroTask::Discard() {
   VALUE ignored;
   const VALUE self = reinterpret_cast<VALUE>(this);
+  ClassSnapshot::Resume(engineState.context);
   Interpreter::SetInterruptible(true);
   Protect(FinalizeBody, self, ignored);
   Interpreter::SetInterruptible(false);
   Interrupter::Settle();
-  Protect(DiscardBody, self, ignored);
+  ClassSnapshot::Suspend();
+  ProtectUntraced(DiscardBody, self, ignored);
 }
 
-void MacroTask::Run() {
+void MacroTask::RunInContext() {
   VALUE ignored;
   const VALUE self = reinterpret_cast<VALUE>(this);
   if (kind == Kind::kDiscard) {
@@ -305,11 +325,21 @@ void MacroTask::Run() {
     return;
   }
   if (kind != Kind::kCompile) ApplyRubyEnvironment();
-  const Outcome prepared = Protect(PrepareBody, self, ignored);
+  const Outcome prepared = ProtectUntraced(PrepareBody, self, ignored);
   if (prepared == Outcome::kRaised) SetError(ignored);
   if (prepared != Outcome::kDone) return;
+  ClassSnapshot::Resume(engineState.context);
   Work();
-  Protect(LeaveBody, self, ignored);
+  ProtectUntraced(EndThreadsBody, self, ignored);
+  ClassSnapshot::Suspend();
+  if (ProtectUntraced(LeaveBody, self, ignored) != Outcome::kDone || RTEST(ignored))
+    ClassSnapshot::DropChanges();
   // Nobody may ever close this engine.
   if (Interpreter::IsAbandoned()) Discard();
+}
+
+void MacroTask::Run() {
+  const VALUE waiting = ClassSnapshot::Suspend();  // in a call of the host
+  RunInContext();
+  ClassSnapshot::Resume(waiting);
 }

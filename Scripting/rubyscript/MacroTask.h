@@ -74,6 +74,7 @@ class MacroTask final : public RubyTask {
  private:
   static unsigned long PrepareBody(unsigned long task);
   static unsigned long WorkBody(unsigned long task);
+  static unsigned long EndThreadsBody(unsigned long task);
   static unsigned long LeaveBody(unsigned long task);
   static unsigned long FinalizeBody(unsigned long task);
   static unsigned long DiscardBody(unsigned long task);
@@ -89,6 +90,7 @@ class MacroTask final : public RubyTask {
   Outcome RunMacro(unsigned long& value);
   void Work();
   void Discard();
+  void RunInContext();
   // `hostText` of an interruption, else null.
   void SetError(unsigned long exception, BSTR hostText = nullptr);
   void TellInterruption(unsigned long exception);

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "Interpreter.h"
 // Last: it renames what the header above uses.
+#include "CRubyInternals.h"
 #include "RubyCall.h"
 
 namespace {
@@ -40,6 +41,11 @@ VALUE Catch(VALUE data) {
   return rb_catch_obj(LeaveTag(), CallBody, data);
 }
 
+VALUE CallUntraced(VALUE data) {
+  const Guarded& guarded = *reinterpret_cast<Guarded*>(data);
+  return rb_suppress_tracing(guarded.body, guarded.argument);
+}
+
 VALUE CallMethod(VALUE data) {
   const SendArguments& call = *reinterpret_cast<SendArguments*>(data);
   return rb_funcallv(call.receiver, rb_intern(call.method), call.count, call.arguments);
@@ -63,6 +69,11 @@ Outcome Protect(VALUE (*body)(VALUE), VALUE argument, VALUE& result) {
   if (!RB_TYPE_P(result, T_OBJECT))
     result = rb_exc_new_cstr(rb_eLocalJumpError, "jump out of the macro");
   return RTEST(rb_obj_is_kind_of(result, StopClass())) ? Outcome::kLeft : Outcome::kRaised;
+}
+
+Outcome ProtectUntraced(VALUE (*body)(VALUE), VALUE argument, VALUE& result) {
+  Guarded guarded = {body, argument};
+  return Protect(CallUntraced, reinterpret_cast<VALUE>(&guarded), result);
 }
 
 Outcome Send(VALUE receiver, const char* method, int count, const VALUE* arguments, VALUE& result) {

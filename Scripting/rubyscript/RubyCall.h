@@ -15,6 +15,8 @@ enum class Outcome {
 
 // Runs body(argument). Any thread of Ruby's.
 Outcome Protect(VALUE (*body)(VALUE), VALUE argument, VALUE& result);
+// The same for the engine's own code, without trace functions and trace points.
+Outcome ProtectUntraced(VALUE (*body)(VALUE), VALUE argument, VALUE& result);
 // Calls receiver.method(arguments...).
 Outcome Send(VALUE receiver, const char* method, int count, const VALUE* arguments, VALUE& result);
 

@@ -7,11 +7,13 @@
 #include "ProcessGuards.h"
 #include "ProcessStateSnapshot.h"
 // Last: they rename what the headers above use.
+#include "ClassSnapshot.h"
 #include "ComObject.h"
 #include "OleEmbedder.h"
 #include "RubyCall.h"
 #include "RubyInternals.h"
 #include "VariantConversion.h"
+#include <ruby/encoding.h>
 
 namespace {
 
@@ -129,6 +131,24 @@ VALUE SetGlobal(VALUE, VALUE name, VALUE value) {
   return rb_gv_set(rb_id2name(SYM2ID(name)), value);
 }
 
+// CRuby would load the encoding under a lock. In a process that has had Ractors it keeps the lock, and
+// the next thread waits for it without end.
+VALUE SetDefaultExternal(VALUE, VALUE encoding) {
+  rb_warning("setting Encoding.default_external");
+  if (!NIL_P(encoding)) rb_to_encoding(encoding);
+  rb_enc_set_default_external(encoding);
+  return encoding;
+}
+
+VALUE SetDefaultInternal(VALUE, VALUE encoding) {
+  rb_warning("setting Encoding.default_internal");
+  if (!NIL_P(encoding)) rb_to_encoding(encoding);
+  rb_enc_set_default_internal(encoding);
+  return encoding;
+}
+
+constexpr const char* kCompaction[] = {"compact", "auto_compact=", "verify_compaction_references"};
+
 VALUE DefineModule(VALUE) {
   const VALUE module = rb_define_module("ActiveScript");
   rb_define_singleton_method(module, "system_message", SystemMessage, 1);
@@ -149,6 +169,12 @@ VALUE DefineModule(VALUE) {
   for (const PreludeFile& file : kPrelude)
     rb_funcall(binding, rb_intern("eval"), 3, rb_utf8_str_new(file.text, file.bytes),
                rb_utf8_str_new_cstr(file.name), INT2FIX(1));
+  // It moves objects that native code holds.
+  for (const char* const name : kCompaction)
+    rb_define_singleton_method(rb_mGC, name, rb_f_notimplement, -1);
+  rb_define_singleton_method(rb_cEncoding, "default_external=", SetDefaultExternal, 1);
+  rb_define_singleton_method(rb_cEncoding, "default_internal=", SetDefaultInternal, 1);
+  ClassSnapshot::Start();
   return Qnil;
 }
 

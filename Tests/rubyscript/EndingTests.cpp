@@ -33,12 +33,12 @@ bool StartAndLeave(Host& host, Leave leave, int depth = 0) {
 
 // A trail that outlives the macro that leaves it.
 const std::string kMark =
-    "def mark(x) = (Comparable.instance_variable_get(:@trail) || "
-    "Comparable.instance_variable_set(:@trail, [])) << x\n";
+    "def mark(x) = (ActiveScript.instance_variable_get(:@trail) || "
+    "ActiveScript.instance_variable_set(:@trail, [])) << x\n";
 std::string Trail() {
   Host host;
   return host.Inspect(
-      "Comparable.instance_variable_get(:@trail).tap { Comparable.instance_variable_set(:@trail, "
+      "ActiveScript.instance_variable_get(:@trail).tap { ActiveScript.instance_variable_set(:@trail, "
       "nil) }");
 }
 

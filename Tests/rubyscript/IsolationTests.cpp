@@ -8,6 +8,7 @@
 
 #include <fstream>
 #include <random>
+#include <regex>
 #include <thread>
 
 #include "../module/Resources.h"
@@ -36,7 +37,7 @@ void ReadTable(const std::string& file, std::vector<IntrusiveMacro>& macros) {
   }
 }
 
-// All tables; only the named one with SCRIPTRUBY_TEST_TABLE.
+// All tables; with SCRIPTRUBY_TEST_TABLE only the named one.
 std::vector<IntrusiveMacro> ReadTables() {
   std::vector<IntrusiveMacro> macros;
   const char* const wanted = std::getenv("SCRIPTRUBY_TEST_TABLE");
@@ -62,6 +63,7 @@ class Isolation : public testing::Test {
 
   // A macro that does not end by itself is interrupted, after a while with a failure.
   std::string Run(const IntrusiveMacro& macro) {
+    if (std::getenv("SCRIPTRUBY_TEST_VERBOSE")) std::cout << macro.place << std::endl;
     const HANDLE ended = CreateEventA(nullptr, TRUE, FALSE, nullptr);
     host.Open();
     std::thread watch([&] {
@@ -75,7 +77,7 @@ class Isolation : public testing::Test {
     watch.join();
     CloseHandle(ended);
     host.Close();
-    return TakeLog();
+    return std::regex_replace(TakeLog(), std::regex("0x[0-9a-f]+"), "0x");  // addresses
   }
 
   std::string RunRight() {

@@ -12,7 +12,8 @@ module ActiveScript
     Work = Struct.new(:outer_frames, :ractors, :errors)
 
     ENTERED = [] # innermost last
-    private_constant :ENTERED
+    METHOD = Kernel.instance_method(:method)
+    private_constant :ENTERED, :METHOD
 
     class << self
       def current = ENTERED.last
@@ -75,9 +76,19 @@ module ActiveScript
       @compiling = false
     end
 
-    # What a thread of the macro's raises here waits until it is done.
+    # What a thread of the macro's raises here waits until it is done. `leave` returns whether threads
+    # were left running: their `ensure` blocks may have changed classes.
     def enter = Thread.handle_interrupt(Object => :never) { begin_part }
     def leave = Thread.handle_interrupt(Object => :never) { end_part }
+
+    # Called with the macro's methods and constants in place, for the threads' `ensure` blocks, and by
+    # `leave` without them, in case they have prevented it. Whether threads were left running.
+    def end_threads(seconds = 1)
+      return false if ENTERED[-2].equal?(self)
+      threads = ALL_THREADS.call.reject { |thread| @threads.any? { |each| GlobalsSnapshot.same?(each, thread) } }
+      threads.each { |thread| thread.kill.join(seconds) }
+      threads.any?
+    end
 
     def put_aside = @globals_snapshot.put_aside
     def put_back = @globals_snapshot.put_back
@@ -156,8 +167,8 @@ module ActiveScript
 
     # Whether the host may call the name: what the macro has defined at its top level.
     def defines?(name)
-      own = @globals_snapshot.main.method(name)
-      own.source_location&.then { |path, _| @sources.key?(path) } || false
+      path, = METHOD.bind_call(@globals_snapshot.main, name).source_location
+      path ? @sources.key?(path) : false
     rescue NameError
       false
     end
@@ -174,8 +185,10 @@ module ActiveScript
     end
 
     # What the host is told of an error: description, line and column from 0, the line's text, the
-    # cookie of its source. Of an interruption the text is the host's own.
-    def describe(error, host_text)
+    # cookie of its source. Of an interruption the text is the host's own. The message comes from the
+    # macro's own code, in any encoding.
+    def describe(error, host_text, message)
+      @described, @message = error, message
       name, line, column = syntax_position(error) || run_time_position(error)
       text = line_text(name, line)
       [description(error, host_text), line ? line - 1 : 0, column_in(text, column), text.to_s,
@@ -197,13 +210,14 @@ module ActiveScript
     end
 
     def end_part
+      threads = end_threads(0.2)
       ENTERED.pop
       outer = ENTERED.last
-      return if outer.equal?(self)
-      (ALL_THREADS.call - @threads).each { |thread| thread.kill.join(1) }
+      return false if outer.equal?(self)
       flush_files
       put_aside
       outer&.put_back
+      threads
     end
 
     MAIN_ONLY = [Ractor.main].freeze
@@ -321,12 +335,11 @@ module ActiveScript
     def column_in(text, bytes)
       return 0 unless text && bytes <= text.bytesize
       before = text.byteslice(0, bytes)
-      byte_host ? bytes : before.length + before.scrub.count("\u{10000}-\u{10FFFF}")
+      byte_host ? bytes : before.length + before.scrub.each_codepoint.count { |each| each > 0xFFFF }
     end
 
-    # The macro's own classes of exceptions may fail here, and their texts be in any encoding.
     def message_of(error)
-      message = error.message.to_s
+      message = GlobalsSnapshot.same?(@described, error) ? @message : error.message.to_s
       return message.scrub if message.encoding == Encoding::UTF_8
       return message.b.force_encoding(Encoding::UTF_8).scrub if message.encoding == Encoding::BINARY
       message.encode(Encoding::UTF_8, invalid: :replace, undef: :replace)

@@ -2,21 +2,21 @@
 # What keeps macros apart at the one top level that Ruby has.
 
 module ActiveScript
-  # What every macro begins with. Libraries that macros load are added to it: they stay.
+  # Where the files of the library are.
+  LIBRARY = File.dirname($LOAD_PATH.grep(%r{/ruby/\d[^/]*\z}).first).freeze
+
+  # What every macro begins with. Files of the library that macros load are added to it: they stay.
   class Baseline
     # Belong to a frame or a thread, or cannot be set, or show something else under another name.
     SPECIAL = /\A\$([~_!@&`'+1-9?$<>.":*=]\z|-[pladFKivw]|FILENAME|KCODE|LOAD|PROGRAM_NAME|VERBOSE)/
     private_constant :SPECIAL
 
-    attr_reader :constants, :methods, :globals, :settings, :lists, :features, :locals
+    attr_reader :globals, :settings, :lists, :features, :locals
 
     def initialize
-      @folder = File.dirname($LOAD_PATH.grep(%r{/ruby/\d[^/]*\z}).first)
-      @constants = Object.constants(false).to_h { |name| [name, GlobalsSnapshot.constant(name)] }
-      @methods = GlobalsSnapshot.method_names(Object).to_h { |name| [name, true] }
       @settings = GlobalsSnapshot.settings
       @lists = GlobalsSnapshot::LISTS.map(&:dup)
-      @features = $LOADED_FEATURES.to_h { |path| [path, true] }
+      @features = $LOADED_FEATURES.dup
       @locals = Thread.current.keys
       @globals = {}
       @fixed = {}
@@ -25,19 +25,6 @@ module ActiveScript
 
     def fixed?(global) = @fixed.key?(global)
     def fix(global) = @fixed[global] = true
-
-    # Whether the place of a definition is in a library.
-    def library?(location) = location.first.start_with?(@folder)
-
-    # A constant of a library in C has no place; a module of a library may have been opened by the macro
-    # first.
-    def library_constant?(location, value)
-      return true if location.empty? || library?(location)
-      return false unless Module === value
-      methods = GlobalsSnapshot.method_names(value).map { |name| value.instance_method(name) } +
-                value.singleton_methods(false).map { |name| value.method(name) }
-      methods.any? { |method| method.source_location&.then { |place| library?(place) } }
-    end
 
     private
 
@@ -51,25 +38,52 @@ module ActiveScript
     end
   end
 
-  # A macro's share of the top level: an object of its own and the methods, constants, variables and
-  # settings that belong to Ruby as a whole. It is in place while the macro runs and put aside when it
-  # does not.
+  # Trace points that macros have made. They end with the part of the macro that runs.
+  TRACE_POINTS = []
+  private_constant :TRACE_POINTS
+
+  module TracePointList
+    def new(*)
+      point = super
+      TRACE_POINTS.push(point)
+      point
+    end
+
+    def trace(*)
+      point = super
+      TRACE_POINTS.push(point)
+      point
+    end
+
+    def self.clear
+      TRACE_POINTS.each { |point| point.disable if point.enabled? }
+      TRACE_POINTS.clear
+    end
+  end
+  TracePoint.singleton_class.prepend(TracePointList)
+
+  # A macro's share of the top level: an object of its own, and the variables and settings that belong
+  # to Ruby as a whole. It is in place while the macro runs and put aside when it does not. Methods and
+  # constants are handled natively (ClassSnapshot.h): they are out while this code runs, so Ruby's
+  # classes are as they were at the start. Objects that a macro has made may still do anything when
+  # they are called. Each step is on its own: one that fails skips no other.
   class GlobalsSnapshot
     LISTS = [ARGV, $LOAD_PATH].freeze
     FEATURES = $LOADED_FEATURES
+    COMPILER = RubyVM::InstructionSequence
+    EQUAL = BasicObject.instance_method(:equal?)
+    private_constant :EQUAL, :COMPILER
 
     class << self
       attr_accessor :baseline
 
-      def method_names(owner) = owner.instance_methods(false) + owner.private_instance_methods(false)
-
-      # nil for one that is still to be loaded.
-      def constant(name) = Object.autoload?(name) ? nil : Object.const_get(name)
+      def same?(one, other) = EQUAL.bind_call(one, other)
 
       def settings
         { verbose: $VERBOSE, external: Encoding.default_external, internal: Encoding.default_internal,
           deprecated: Warning[:deprecated], experimental: Warning[:experimental], line_number: $.,
-          abort: Thread.abort_on_exception, report: Thread.report_on_exception, gc_disabled: false }
+          abort: Thread.abort_on_exception, report: Thread.report_on_exception, gc_disabled: false,
+          compile: COMPILER.compile_option }
       end
 
       # Only what differs: some of these keep memory each time.
@@ -80,6 +94,7 @@ module ActiveScript
         Warning[:deprecated] = settings[:deprecated]
         Warning[:experimental] = settings[:experimental]
         $. = settings[:line_number]
+        COMPILER.compile_option = settings[:compile] unless present[:compile] == settings[:compile]
         Thread.abort_on_exception = settings[:abort]
         Thread.report_on_exception = settings[:report]
         settings[:gc_disabled] ? GC.disable : GC.enable
@@ -91,9 +106,6 @@ module ActiveScript
     def initialize(globals)
       @main = MAIN.clone
       @globals = globals
-      @constants = {}
-      @autoloads = {}
-      @methods = []
       @settings = baseline.settings
       @lists = baseline.lists
       @features = []
@@ -104,32 +116,14 @@ module ActiveScript
     attr_reader :main # the top-level object
 
     def put_aside
-      GC.stress = false
-      set_trace_func(nil)
-      @settings = GlobalsSnapshot.settings.merge(gc_disabled: GC.enable)
-      $VERBOSE = nil # redefining is what follows
-      take_constants
-      take_methods
-      take_globals
-      take_lists
-      take_locals
+      take(:stop_tracing, :take_settings, :take_globals, :take_lists, :take_features, :take_locals)
       GlobalsSnapshot.apply(baseline.settings)
       ActiveScript.top_self = MAIN
     end
 
     def put_back
       ActiveScript.top_self = @main
-      $VERBOSE = nil
-      @constants.each { |name, value| Object.const_set(name, value) }
-      @constants = {}
-      @autoloads.each { |name, path| Object.autoload(name, path) }
-      @autoloads = {}
-      give_methods
-      @globals.each { |name, value| ActiveScript.set_global(name, value) }
-      LISTS.zip(@lists) { |list, content| list.replace(content) unless list == content }
-      FEATURES.concat(@features)
-      @locals.each { |name, value| Thread.current[name] = value }
-      @thread_variables.each { |name, value| Thread.current.thread_variable_set(name, value) }
+      take(:give_globals, :give_lists, :give_locals)
       GlobalsSnapshot.apply(@settings)
     end
 
@@ -137,52 +131,39 @@ module ActiveScript
 
     def baseline = GlobalsSnapshot.baseline
 
-    def take_constants
-      known = baseline.constants
-      Object.constants(false).each do |name|
-        value = GlobalsSnapshot.constant(name)
-        next restore_constant(name, value, known) if known.key?(name)
-        path = Object.autoload?(name)
-        next @autoloads[name] = path.tap { Object.__send__(:remove_const, name) } if path
-        next known[name] = value if baseline.library_constant?(Object.const_source_location(name), value)
-        @constants[name] = Object.__send__(:remove_const, name)
+    def take(*steps)
+      steps.each do |step|
+        __send__(step)
+      rescue Exception # of an object of the macro
+        nil
       end
     end
 
-    # One that everybody has may have been loaded by now, or been given another value by the macro.
-    def restore_constant(name, value, known)
-      original = known[name]
-      return known[name] = value if original.nil?
-      return if value.equal?(original)
-      Object.__send__(:remove_const, name)
-      Object.const_set(name, original)
+    def stop_tracing
+      GC.stress = false
+      set_trace_func(nil)
+      Thread.current.set_trace_func(nil)
+      TracePointList.clear
     end
 
-    def take_methods
-      @methods = GlobalsSnapshot.method_names(Object).filter_map do |name|
-        next if baseline.methods.key?(name)
-        method = Object.instance_method(name)
-        location = method.source_location # an alias of a method in C has none
-        if location && baseline.library?(location)
-          baseline.methods[name] = true
-          next
-        end
-        entry = [method, visibility(name)]
-        Object.__send__(:remove_method, name)
-        entry
-      end
+    def take_settings
+      @settings = GlobalsSnapshot.settings.merge(gc_disabled: GC.enable)
+      $VERBOSE = nil
     end
 
-    def visibility(name)
-      return :private if Object.private_method_defined?(name)
-      Object.protected_method_defined?(name) ? :protected : :public
+    def give_globals
+      $VERBOSE = nil
+      @globals.each { |name, value| ActiveScript.set_global(name, value) }
     end
 
-    def give_methods
-      @methods.each do |method, visibility|
-        Object.define_method(method.name, method)
-        Object.__send__(visibility, method.name)
-      end
+    def give_lists
+      LISTS.zip(@lists) { |list, content| replace(list, content) }
+      FEATURES.concat(@features)
+    end
+
+    def give_locals
+      @locals.each { |name, value| Thread.current[name] = value }
+      @thread_variables.each { |name, value| Thread.current.thread_variable_set(name, value) }
     end
 
     # A name that is new may be an alias, as those of the library English are, and what is set by it
@@ -190,11 +171,11 @@ module ActiveScript
     def take_globals
       names = global_variables.reject { |name| baseline.fixed?(name) }
       values = names.to_h { |name| [name, ActiveScript.global(name)] }
-      @globals = values.reject { |name, value| value.equal?(baseline.globals[name]) }
+      @globals = values.reject { |name, value| GlobalsSnapshot.same?(value, baseline.globals[name]) }
       @globals.keys.each { |name| clear_global(name) unless baseline.globals.key?(name) }
       baseline.globals.each do |name, original|
-        next if ActiveScript.global(name).equal?(original)
         untrace_var(name)
+        next if GlobalsSnapshot.same?(ActiveScript.global(name), original)
         ActiveScript.set_global(name, original)
       end
     end
@@ -207,15 +188,26 @@ module ActiveScript
       @globals.delete(name)
     end
 
-    # Files of the macro's own are loaded anew by the next one.
     def take_lists
       @lists = LISTS.map(&:dup)
-      LISTS.zip(baseline.lists) { |list, content| list.replace(content) unless list == content }
-      @features = FEATURES.reject { |path| baseline.features.key?(path) || library_file?(path) }
-      FEATURES.replace(FEATURES - @features) unless @features.empty?
+      LISTS.zip(baseline.lists) { |list, content| replace(list, content) }
     end
 
-    def library_file?(path) = path.include?("/") && baseline.library?([path])
+    # A new content makes CRuby resolve $LOAD_PATH again.
+    def replace(list, content)
+      same = list.size == content.size && list.each_index.all? { |i| GlobalsSnapshot.same?(list[i], content[i]) }
+      list.replace(content) unless same
+    end
+
+    # The macro's own files are loaded again by the next one, those of the library stay.
+    def take_features
+      known = baseline.features
+      return @features = [] if FEATURES.size == known.size && FEATURES.last.equal?(known.last)
+      added = FEATURES.reject { |path| known.any? { |each| GlobalsSnapshot.same?(each, path) } }
+      library, @features = added.partition { |path| String === path && path.start_with?(LIBRARY) }
+      known.concat(library - known)
+      FEATURES.replace(known)
+    end
 
     def take_locals
       @locals = (Thread.current.keys - baseline.locals).to_h { |name| [name, Thread.current[name]] }
