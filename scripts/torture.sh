@@ -2,7 +2,8 @@
 # SPDX-License-Identifier: MIT
 # Runs the long form of the tests that ctest runs for seconds, and prints their figures:
 #
-#   scripts/torture.sh [memory | values | profile | hosts | recordings | fuzz | undefined | tidy]...
+#   scripts/torture.sh [memory | values | profile | hosts | engines | recordings | fuzz | undefined |
+#                       tidy]...
 #
 # Without arguments, runs all of them, which takes one to two hours on an idle machine. The figures
 # are also written to Docs/reliability.md, each below the command that produced it. To repeat a
@@ -15,7 +16,7 @@ set -euo pipefail
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 REPORT=$ROOT/Docs/reliability.md
-ALL=(memory values profile hosts recordings fuzz undefined tidy)
+ALL=(memory values profile hosts engines recordings fuzz undefined tidy)
 failed=0
 
 # Replaces the section's block of figures by the standard input.
@@ -94,6 +95,7 @@ run() {
   values) long_test values 'RandomCall*' ;;
   profile) long_test profile '*ProfileFunctionsDo' core_tests ;;
   hosts) long_test hosts 'RandomHost*' ;;
+  engines) long_test engines 'Isolation.SurvivesManyMixedMacros' engine_tests ;;
   recordings)
     record recordings "SCRIPTRUBY_TEST_RECORDINGS=10000 wine build/release/bin/recording_tests.exe" \
       env SCRIPTRUBY_TEST_RECORDINGS=10000 timeout 3600 wine build/release/bin/recording_tests.exe
@@ -108,6 +110,6 @@ run() {
 for section; do
   [[ " ${ALL[*]} " == *" $section "* ]] || STATUS=2 die "no such section: $section (there are: ${ALL[*]})"
 done
-prepare torture_tests recording_tests module_tests scriptruby_trapping core_tests core_native
+prepare torture_tests recording_tests module_tests scriptruby_trapping core_tests core_native engine_tests
 for section; do run "$section"; done
 exit $failed

@@ -4,7 +4,7 @@
 #include <stdlib.h>
 #include <string.h>
 
-#include "CRubyInternals.h"
+#include "RubyInternals.h"
 #include "RubyCall.h"
 
 namespace {

@@ -254,7 +254,8 @@ void MacroTask::SetError(VALUE exception, BSTR hostText) {
   VALUE message;
   Outcome outcome = Protect(MessageBody, exception, message);
   if (outcome == Outcome::kRaised) message = rb_utf8_str_new_cstr("");
-  Description description = {engineState.context, exception, message, hostText, engineState.form, {}};
+  Description description = {engineState.context, exception, message, hostText,
+                             engineState.form,    {}};
   ScriptError::Details& details = description.details;
   if (outcome != Outcome::kLeft) {
     VALUE ignored;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "Interpreter.h"
 // Last: it renames what the header above uses.
-#include "CRubyInternals.h"
+#include "RubyInternals.h"
 #include "RubyCall.h"
 
 namespace {

@@ -7,13 +7,13 @@
 #include "ProcessGuards.h"
 #include "ProcessStateSnapshot.h"
 // Last: they rename what the headers above use.
+#include <ruby/encoding.h>
 #include "ClassSnapshot.h"
 #include "ComObject.h"
 #include "OleEmbedder.h"
 #include "RubyCall.h"
 #include "RubyInternals.h"
 #include "VariantConversion.h"
-#include <ruby/encoding.h>
 
 namespace {
 

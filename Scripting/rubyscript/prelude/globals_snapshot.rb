@@ -83,7 +83,7 @@ module ActiveScript
         { verbose: $VERBOSE, external: Encoding.default_external, internal: Encoding.default_internal,
           deprecated: Warning[:deprecated], experimental: Warning[:experimental], line_number: $.,
           abort: Thread.abort_on_exception, report: Thread.report_on_exception, gc_disabled: false,
-          compile: COMPILER.compile_option }
+          compile: COMPILER.compile_option, priority: Thread.current.priority }
       end
 
       # Only what differs: some of these keep memory each time.
@@ -95,6 +95,7 @@ module ActiveScript
         Warning[:experimental] = settings[:experimental]
         $. = settings[:line_number]
         COMPILER.compile_option = settings[:compile] unless present[:compile] == settings[:compile]
+        Thread.current.priority = settings[:priority]
         Thread.abort_on_exception = settings[:abort]
         Thread.report_on_exception = settings[:report]
         settings[:gc_disabled] ? GC.disable : GC.enable
