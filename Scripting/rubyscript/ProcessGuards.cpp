@@ -25,6 +25,11 @@ VALUE Exec(int, const VALUE*, VALUE) {
   rb_raise(rb_eNotImpError, "exec would replace the host's process; use system or spawn");
 }
 
+VALUE Reopen(int, const VALUE*, VALUE) {
+  rb_raise(rb_eNotImpError,
+           "the stream belongs to the host; assign to $stdin, $stdout or $stderr instead");
+}
+
 VALUE ExitAtOnce(int count, const VALUE* arguments, VALUE) {
   rb_check_arity(count, 0, 1);
   const VALUE status = count == 0 ? Qfalse : arguments[0];
@@ -112,4 +117,7 @@ void DefineProcessGuards() {
   rb_define_singleton_method(rb_mProcess, "kill", Kill, -1);
   rb_define_singleton_method(rb_path2class("Fiber"), "yield", FiberYield, -1);
   rb_ext_ractor_safe(false);
+  const VALUE streams[] = {rb_stdin, rb_stdout, rb_stderr};
+  for (const VALUE stream : streams)
+    rb_define_singleton_method(stream, "reopen", Reopen, -1);
 }

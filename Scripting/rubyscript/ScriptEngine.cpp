@@ -425,8 +425,8 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
 static void DescribeFailedStart(HRESULT started, wchar_t (&text)[256]) {
   if (started == E_ABORT) {
     swprintf(text, 256,
-             L"Ruby was lost to a fault (exception 0x%08lX) in an earlier macro. Start the program "
-             L"anew to run Ruby macros again.",
+             L"Ruby was lost to a fault (exception 0x%08lX) in an earlier macro. Restart the "
+             L"program to run Ruby macros again.",
              Interpreter::FatalExceptionCode());
     return;
   }

@@ -86,7 +86,7 @@ TEST(Life, EndsWithAFaultInsideOfRuby) {
             outer.Run("begin; @item.nest; rescue Exception; end; @item.nest"));
   const std::string lost =
       "error: Ruby was lost to a fault (exception 0xC0000005) in an earlier macro. "
-      "Start the program anew to run Ruby macros again.";
+      "Restart the program to run Ruby macros again.";
   EXPECT_EQ(kReported, early.Parse("f"));
   early.Close();
   EXPECT_EQ(lost + "; " + left, TakeLog());

@@ -45,7 +45,7 @@ module ActiveScript
 
     def write(*texts)
       return @redirected.write(*texts) if @redirected
-      texts.map!(&:to_s)
+      texts.map! { |text| "#{text}" } # `to_s` may return anything
       texts.each { |text| @pending << as_utf8(text).b }
       # A stopped macro's last words have nowhere to go; a thread's wait for the main thread.
       pass_on if ActiveScript.can_call? && !@context.compiling

@@ -15,15 +15,8 @@ module ActiveScript
   end
   Thread.singleton_class.prepend(ThreadList)
 
-  # The process's own streams stay open and where they are.
-  [STDIN, STDOUT, STDERR].each do |stream|
-    def stream.close = nil
-
-    def stream.reopen(*)
-      raise NotImplementedError,
-            "the stream belongs to the host; assign to $stdin, $stdout or $stderr instead"
-    end
-  end
+  # The process's own streams stay open.
+  [STDIN, STDOUT, STDERR].each { |stream| def stream.close = nil }
 
   FINALIZERS = { define: ObjectSpace.method(:define_finalizer),
                  undefine: ObjectSpace.method(:undefine_finalizer) }.freeze
