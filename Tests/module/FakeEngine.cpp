@@ -95,7 +95,7 @@ IDispatch* Item() {
   return static_cast<IDispatch*>(item);
 }
 
-void Call(const wchar_t* name, std::vector<VARIANT> arguments) {
+HRESULT Call(const wchar_t* name, std::vector<VARIANT> arguments) {
   IDispatch* item = Item();
   LPOLESTR names[] = {const_cast<LPOLESTR>(name)};
   std::reverse(arguments.begin(), arguments.end());
@@ -112,4 +112,5 @@ void Call(const wchar_t* name, std::vector<VARIANT> arguments) {
       Utf8(text && result.bstrVal ? result.bstrVal : L""));
   for (VARIANT& argument : arguments) VariantClear(&argument);
   VariantClear(&result), item->Release();
+  return outcome;
 }

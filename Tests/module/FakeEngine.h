@@ -25,7 +25,7 @@ HRESULT __stdcall CreateFakeEngine(void*, IUnknown*, REFIID riid, void** object)
 // The `tarn` object as an engine gets it from the site.
 IDispatch* Item();
 // The script's call `tarn.name(arguments)`, with its outcome and result logged.
-void Call(const wchar_t* name, std::vector<VARIANT> arguments = {});
+HRESULT Call(const wchar_t* name, std::vector<VARIANT> arguments = {});
 
 std::string Hex(HRESULT result);
 // A value of any type by its bits. Call frees it.
