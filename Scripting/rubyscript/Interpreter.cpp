@@ -192,7 +192,8 @@ void PinLibrary() {
 HRESULT ClaimThread() {
   const LONG caller = static_cast<LONG>(GetCurrentThreadId());
   const LONG owner = InterlockedCompareExchange(&state.thread, caller, 0);
-  if (owner == 0) state.threadHandle = OpenThread(SYNCHRONIZE, FALSE, GetCurrentThreadId());
+  if (owner == 0)
+    state.threadHandle = OpenThread(SYNCHRONIZE | THREAD_TERMINATE, FALSE, GetCurrentThreadId());
   const HANDLE handle = state.threadHandle;
   if (handle && WaitForSingleObject(handle, 0) == WAIT_OBJECT_0) return RPC_E_SERVER_DIED;
   return owner == 0 || owner == caller ? S_OK : RPC_E_WRONG_THREAD;
@@ -318,6 +319,8 @@ Interpreter::Urgency Interpreter::InterruptDue() {
 void Interpreter::SetInterruptible(bool value) { state.innermost->interruptible = value; }
 
 void Interpreter::SetLeaving() { state.innermost->leaving = true; }
+
+HANDLE Interpreter::ThreadHandle() { return state.threadHandle; }
 
 bool Interpreter::IsMainThread() { return static_cast<LONG>(GetCurrentThreadId()) == state.thread; }
 

@@ -90,4 +90,7 @@ class Interpreter {
   static bool IsRubySide();
   // Ruby side, any thread of Ruby's. Whether this is the thread that may call the host.
   static bool IsMainThread();
+  // Any thread. Of the thread that may call the host, to wait for its end or cancel what it reads;
+  // null before the first use.
+  static HANDLE ThreadHandle();
 };

@@ -15,7 +15,6 @@ namespace {
 constexpr DWORD kUnstoppable = 0xE0525542;
 
 HANDLE wakeEvent = nullptr;   // made once, before the first macro
-HANDLE mainHandle = nullptr;  // of the interpreter's thread
 VALUE mainThread = Qnil;
 bool waiting = false;  // the thread has come to its first wait
 
@@ -72,7 +71,7 @@ VALUE Deliver(VALUE) {
   if (++deliveries == 2)
     rb_add_event_hook(OnEvent, RUBY_EVENT_LINE | RUBY_EVENT_CALL | RUBY_EVENT_B_CALL, Qnil);
   RaiseOnMainThread(Qnil);
-  CancelSynchronousIo(mainHandle);
+  CancelSynchronousIo(Interpreter::ThreadHandle());
   return Qnil;
 }
 
@@ -116,7 +115,6 @@ void Interrupter::EnsureStarted() {
   if (waiting) return;
   wakeEvent = CreateEventW(nullptr, FALSE, FALSE, nullptr);
   if (!wakeEvent) return;  // tried again by the next macro
-  mainHandle = OpenThread(THREAD_TERMINATE, FALSE, GetCurrentThreadId());
   mainThread = rb_thread_current();
   rb_gc_register_mark_object(mainThread);
   // The thread inherits the mask: a macro that finds it can neither end it nor raise anything in it.
