@@ -74,14 +74,14 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
       // A null argument is an empty text or changes nothing.
       {"abc", [](String& s) { s.Assign(kNull); }, ""},
       {"abc", [](String& s) { s = kNull; }, ""},
-      {"abc", [](String& s) { s.Append(kNull), s.Append(kNull, 0), s.Insert(kNull, 0); }, "abc"},
-      {"abc", [](String& s) { EXPECT_FALSE(s.Equals(kNull, true) || s.EndsWith(kNull, true)); },
-       "abc"},
-      {"abc", [](String& s) { EXPECT_EQ(s.FindReverse(kNull, 0, true), -1); }, "abc"},
-      {"abc", [](String& s) { EXPECT_FALSE(s.ReplaceFirstWithChar(kNull, 'x', 0)); }, "abc"},
-      {"abc", [](String& s) { EXPECT_FALSE(s.Substitute(kNull, "x") || s.Substitute("a", kNull)); },
-       "abc"},
-      {"abc", [](String& s) { EXPECT_EQ(s.ReplaceAll(kNull, "x") + s.ReplaceAll("a", kNull), 0u); },
+      {"abc",
+       [](String& s) {
+         s.Append(kNull), s.Append(kNull, 0), s.Insert(kNull, 0);
+         EXPECT_FALSE(s.Equals(kNull, true) || s.EndsWith(kNull, true));
+         EXPECT_FALSE(s.ReplaceFirstWithChar(kNull, 'x', 0) || s.Substitute(kNull, "x"));
+         EXPECT_FALSE(s.Substitute("a", kNull) || s.ReplaceAll(kNull, "x"));
+         EXPECT_TRUE(s.ReplaceAll("a", kNull) == 0 && s.FindReverse(kNull, 0, true) == -1);
+       },
        "abc"},
       {"abc", [](String& s) { s.FromLatin1ToUtf8(kNull), s.Append("x"); }, "x"},
       {"abc", [](String& s) { s.FromLatin1ToUtf8(kNull, 7), s.Append("x"); }, "x"},
@@ -103,10 +103,10 @@ TEST_F(StringTest, ChangesAndGrowsByItsPolicy) {
   EXPECT_TRUE(all.ReplaceAll("b", "x") == 40000 && all.Capacity() == (80001 + 5) * 13 / 10);
   memset(&string.At(0), '#', 8);
   string = "a", string.Append("b");
-  EXPECT_EQ(Text(string.Text(), 6), "ab\0\0\0#"s) << "zero bytes behind an appended text";
+  EXPECT_EQ(Text(string.Text(), 6), "ab\0\0\0#"s) << "zero bytes after an appended text";
   memset(&large.At(0), '#', 8);
   large.FromLatin1ToUtf8("a");
-  EXPECT_EQ(Text(large.Text(), 4), "a\0\0#"s) << "likewise behind a converted one";
+  EXPECT_EQ(Text(large.Text(), 4), "a\0\0#"s) << "zero bytes after a converted text";
   EXPECT_TRUE(AddSizes(UINT_MAX - 1, 1) == UINT_MAX && AddSizes(UINT_MAX, 2) == UINT_MAX);
   EXPECT_TRUE(MultiplySizes(INT_MAX, 2) == UINT_MAX - 1 && MultiplySizes(3, 1u << 31) == UINT_MAX);
   EXPECT_EQ(MultiplySizes(3, 0), 0u);

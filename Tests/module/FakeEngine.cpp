@@ -8,12 +8,6 @@
 
 #include "RawHost.h"
 
-std::string Hex(HRESULT result) {
-  char text[16];
-  std::snprintf(text, sizeof text, "%08lX", static_cast<unsigned long>(result));
-  return text;
-}
-
 static std::string Utf8(const wchar_t* text) { return std::filesystem::path(text).string(); }
 
 static HRESULT Note(const std::string& step) {

@@ -14,6 +14,8 @@
 #include <string>
 #include <vector>
 
+#include "../support/Values.h"
+
 inline std::map<std::string, HRESULT> results;  // by step as it is logged; S_OK for others
 inline std::wstring source;                     // what ParseScriptText got
 inline IActiveScriptSite* site = nullptr;       // of the engine whose script is running
@@ -24,14 +26,5 @@ HRESULT __stdcall CreateFakeEngine(void*, IUnknown*, REFIID riid, void** object)
 
 // The `tarn` object as an engine gets it from the site.
 IDispatch* Item();
-// The script's call `tarn.name(arguments)`, with its outcome and result logged.
+// The script's call `tarn.name(arguments)`: logs its outcome and result, frees the arguments.
 HRESULT Call(const wchar_t* name, std::vector<VARIANT> arguments = {});
-
-std::string Hex(HRESULT result);
-// A value of any type by its bits. Call frees it.
-template <class T>
-VARIANT Value(VARTYPE type, T bits) {
-  VARIANT value = {{{type, 0, 0, 0, {0}}}};
-  memcpy(&value.llVal, &bits, sizeof bits);
-  return value;
-}

@@ -52,6 +52,13 @@ HMODULE LoadModule(const std::string& folder) {
   return module;
 }
 
+ULONG_PTR ActivateRuby() {
+  ACTCTXA manifest = {sizeof manifest, 0, RUBY_MANIFEST, 0, 0, nullptr, nullptr, nullptr, nullptr};
+  ULONG_PTR cookie = 0;
+  EXPECT_TRUE(ActivateActCtx(CreateActCtxA(&manifest), &cookie)) << GetLastError();
+  return cookie;
+}
+
 ModuleTest::ModuleTest() {
   on = {{"engine: SetScriptState 2", [] { Call(L"f", {Value(VT_I4, 1)}); }}};
   results.clear();
@@ -70,7 +77,7 @@ static void Shorten(const std::string& first, const std::string& last, const std
     transcript.replace(at, block.size(), name);
 }
 
-// Whatever a test did, the module must have left nothing behind.
+// Checks that the module has left nothing, whatever the test did.
 void ModuleTest::TearDown() {
   EXPECT_TRUE(host.IsClean());
   EXPECT_FALSE(Kill(1)) << "a host is still current";
@@ -90,7 +97,7 @@ void ModuleTest::TearDown() {
     logged.insert("logged: " + std::regex_replace(match->str(), line, "$1 $2$3 $4"));
   muted = false;
   for (const std::string& each : logged) Log(each);
-  // What differs between machines has a name of its own.
+  // Parts that differ between machines are replaced by names.
   for (size_t at; (at = transcript.find(testFolder)) != std::string::npos;)
     transcript.replace(at, testFolder.size(), "FOLDER");
   Shorten("report: Tarn has", "TIA.\\n\n    \\n\n    ", "report: the fault text, ");

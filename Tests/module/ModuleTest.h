@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
-// What every test of the module shares: the DLL that ships, loaded from a folder of the test's own,
-// one host, one fake engine whose script calls f(1), and a transcript. Whatever the host, the engine
-// and the user's screen see is logged in order, and at the end what the module has reported. The end
-// of each test compares it with golden/<suite>.<test>.txt, so an unexpected call fails by itself.
-// With SCRIPTRUBY_PROMOTE=1 the files are rewritten instead.
+// The base of the module's tests: the DLL that ships, loaded from a temporary folder, one host, one
+// fake engine whose script calls f(1), and a transcript. The transcript logs in order what the host,
+// the engine and the user's screen receive, and at the end what the module has reported. Each test
+// ends by comparing it with golden/<suite>.<test>.txt, so an unexpected call fails by itself. With
+// SCRIPTRUBY_PROMOTE=1 the files are rewritten instead.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -17,9 +17,11 @@
 
 using namespace std::string_literals;
 
-// A copy of the DLL in a folder of its own, loaded from there: the one that ships, or the one that the
-// environment variable SCRIPTRUBY_TEST_DLL names.
+// Copies the DLL to the folder and loads it from there. The environment variable SCRIPTRUBY_TEST_DLL
+// can name another DLL than the one that ships.
 HMODULE LoadModule(const std::string& folder);
+// Lets COM find the Ruby engine that ships. Returns the cookie for DeactivateActCtx.
+ULONG_PTR ActivateRuby();
 inline HMODULE dll;  // loaded from testFolder
 
 template <class Result, class... Arguments>

@@ -5,22 +5,15 @@
 
 class RubyTest : public ModuleTest {
  protected:
-  static void SetUpTestSuite() {
-    ACTCTXA manifest = {sizeof manifest, 0,       RUBY_MANIFEST, 0,      0,
-                        nullptr,         nullptr, nullptr,       nullptr};
-    const HANDLE context = CreateActCtxA(&manifest);
-    ASSERT_NE(context, INVALID_HANDLE_VALUE) << GetLastError();
-    ActivateActCtx(context, &cookie);
-  }
-  static void TearDownTestSuite() { DeactivateActCtx(0, cookie); }
   RubyTest() { Describe(""); }
+  ~RubyTest() override { DeactivateActCtx(0, cookie); }
 
   int RunMacro(const std::string& text) {
     WriteBytes(macroPath, text);
     return Run();
   }
 
-  static inline ULONG_PTR cookie;
+  const ULONG_PTR cookie = ActivateRuby();
 };
 
 // As the editor composes it from the templates of `version`.
@@ -65,7 +58,7 @@ TEST_F(RubyTest, KeyboardMacrosAndText) {
   RunMacro("abort\n");
 }
 
-// Each macro would show what an earlier one has left behind.
+// Fails when an earlier macro has left something.
 static const std::string kClean =
     "raise 'not clean' if defined?(Leak) || respond_to?(:leak, true) || @leak || $leak\n"
     "@leak = $leak = Leak = 1\n"

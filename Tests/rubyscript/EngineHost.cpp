@@ -37,7 +37,7 @@ void CheckTranscript(const std::string& file,
     macro.clear();
   }
   EXPECT_NE("", written) << path;
-  EXPECT_EQ("", macro) << path << ": no outcome behind the last macro";
+  EXPECT_EQ("", macro) << path << ": no outcome after the last macro";
   if (std::getenv("SCRIPTRUBY_PROMOTE")) std::ofstream(path, std::ios::binary) << written;
 }
 
@@ -60,12 +60,6 @@ unsigned long Guarded(const std::function<void()>& body) {
 }
 
 // --- Values --------------------------------------------------------------------------------------
-
-std::string Hex(HRESULT result) {
-  char text[16];
-  snprintf(text, sizeof text, "%08lX", static_cast<unsigned long>(result));
-  return text;
-}
 
 static std::string Escaped(const wchar_t* text, UINT units) {
   std::string shown;

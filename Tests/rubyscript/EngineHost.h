@@ -17,6 +17,8 @@
 #include <string>
 #include <vector>
 
+#include "../support/Values.h"
+
 using namespace std::string_literals;
 
 inline constexpr CLSID kEngineClass = {
@@ -24,13 +26,13 @@ inline constexpr CLSID kEngineClass = {
 inline constexpr IID kParseId = {
     0xBB1A2AE2, 0xA4F9, 0x11CF, {0x8F, 0x20, 0x00, 0x80, 0x5F, 0x2C, 0xD0, 0x64}};
 
-inline constexpr HRESULT kReported = 0x80020101;  // the site has been told of the error
+inline constexpr HRESULT kReported = 0x80020101;  // the error has been reported to the site
 
 // What was logged since the last time, joined by "; ".
 void Log(const std::string& line);
 std::string TakeLog();
 
-// Runs each macro of a file in `transcripts` and compares the outcome with the line "> " behind it.
+// Runs each macro of a file in `transcripts` and compares the outcome with the line "> " below it.
 // With SCRIPTRUBY_PROMOTE=1 the file is rewritten instead.
 void CheckTranscript(const std::string& file,
                      const std::function<std::string(const std::string& macro)>& run);
@@ -42,28 +44,18 @@ inline HRESULT WINAPI GetClassObject(REFCLSID id, REFIID riid, void** object) {
                                                                                            object);
 }
 
-std::string Hex(HRESULT result);
 // Type and value, such as "I4 1" or "'text'"; units beyond ASCII as \xE4 or \u20AC, and 20 equal ones
 // or more as x{20}.
 std::string Show(const VARIANT& value);
 std::wstring Wide(const std::string& utf8);
 
-// A value by its bits.
-template <class T>
-VARIANT Value(VARTYPE type, T bits) {
-  VARIANT value = {};
-  static_assert(sizeof bits <= 8);
-  memcpy(&value.llVal, &bits, sizeof bits);
-  value.vt = type;
-  return value;
-}
 inline VARIANT Text(const std::wstring& text) {
   return Value(VT_BSTR, SysAllocStringLen(text.data(), static_cast<UINT>(text.size())));
 }
 
 // An object with the functions that a test gives it. Calls are logged as "name.f(I4 1)", those of
-// the default property as "name.[](I4 1)", settings with "=" behind the name, and each question for
-// a name that it does not have as "name.f?".
+// the default property as "name.[](I4 1)", settings with "=" after the name, and each query for an
+// unknown name as "name.f?".
 class Item final : public IDispatch {
  public:
   struct Call {
@@ -121,7 +113,7 @@ class Host final : public IActiveScriptSite {
   HRESULT Start() { return script->SetScriptState(SCRIPTSTATE_CONNECTED); }
   // Ends the engine; logs the references that it has left over.
   void Close();
-  // A whole run; TakeLog() behind it. A failure that the site does not know of is logged.
+  // Runs a macro from start to end and returns TakeLog(). Logs a failure that the site does not know.
   std::string Run(const std::string& macro);
   // The value of an expression as Ruby's `inspect` shows it, or the error.
   std::string Inspect(const std::string& expression);

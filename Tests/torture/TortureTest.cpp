@@ -13,13 +13,6 @@ void Figure(const char* format, ...) {
   va_end(arguments);
 }
 
-void ActivateRuby() {
-  ACTCTXA manifest = {sizeof manifest, 0, RUBY_MANIFEST, 0, 0, nullptr, nullptr, nullptr, nullptr};
-  ULONG_PTR cookie;
-  static const bool active = ActivateActCtx(CreateActCtxA(&manifest), &cookie);
-  ASSERT_TRUE(active) << GetLastError();
-}
-
 TortureTest::TortureTest(const std::string& description, const std::string& macro)
     : rightDescription(description), rightMacro(macro) {
   const char* given = std::getenv("SCRIPTRUBY_TORTURE_SEED");

@@ -17,9 +17,6 @@ constexpr unsigned kOwnHandles = 4;
 // The figures of a long test: one line each, collected by scripts/torture.sh.
 void Figure(const char* format, ...) __attribute__((format(printf, 1, 2)));
 
-// Lets COM find the Ruby engine that ships; from then on.
-void ActivateRuby();
-
 class TortureTest : public ModuleTest {
  protected:
   // Plans that each fault fails the test. A right run is one of `macro` in the language that is described.

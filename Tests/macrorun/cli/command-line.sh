@@ -13,35 +13,13 @@ expect 0 '--in-place' --help
 [ "$(wc -l < out)" -le 50 ] && ! grep -q '.\{81\}' out || fail '--help does not fit a screen'
 expect 0 'RubyScript' --version
 expect 0 'VBScript' --version --description "$(dirname "$macrorun")/languages/vbs.qwsh"
-expect 2 'MACRO is required'
-expect 2 '--bogus' --bogus macro.js
-expect 2 'usage: macrorun' --bogus macro.js
-expect 2 'expected NAME=VALUE' --arg name macro.js
-expect 2 '--repeat: expected a whole number of at least 1, got "0"' --repeat 0 macro.js
 for time in 2s -1 0 nan; do
   expect 2 "--timeout: expected a number of seconds above 0, such as 2 or 0.5, got \"$time\"" \
     --timeout "$time" macro.js
 done
-expect 2 '--errors' --errors xml macro.js
-expect 2 'needs a FILE' --in-place macro.js
-expect 2 'standard input' --in-place macro.js -
-expect 2 '--output' -o out.txt --in-place macro.js input.txt
-expect 2 '--output' -o out.txt macro.js --each input.txt
-expect 2 'unexpected arguments: third (use --each for several files)' macro.js input.txt third
-expect 2 'unknown option --timout' --timout 1 macro.js input.txt
-expect 2 'FILE: expected a file name, got an empty text' macro.js ''
-expect 2 '--output: expected a file name, got an empty text' macro.js input.txt -o ''
-expect 2 '--stubs and --check cannot be combined' --check macro.js --stubs
-expect 2 '--check: takes no text and no -o' --check macro.js -o out.txt
-expect 2 'name all macros after --check' macro.js --check macro.js
-expect 2 '18 characters' --engine A.Name.Of.Nineteen. macro.js
-expect 2 'macro missing.js' missing.js
-expect 2 'missing.txt' macro.js missing.txt
-expect 2 'missing.dll' --module missing.dll macro.js
-expect 2 'input.txt' --module input.txt macro.js
-expect 2 'missing.qwsh' --description missing.qwsh macro.js
-expect 2 'xyz.qwsh' macro.xyz
-expect 2 'macro.rb: the name of a Ruby macro ends in .rbs' macro.rb
+while IFS='|' read -r arguments text; do
+  eval "expect 2 '$text' $arguments" < /dev/null
+done < "$root/Tests/macrorun/cli/wrong-command-lines.txt"
 
 # Exit codes and errors
 expect_js 0 'text' 'tarn.message("done");'
