@@ -82,7 +82,7 @@ struct Invocation final : HostCall {
       exception.pfnDeferredFillIn(&exception);
     if (SUCCEEDED(outcome) && result.vt == VT_UNKNOWN && result.punkVal) TakeDispatch();
     if (!Interpreter::MustEnd()) return;
-    VariantClear(&result);  // nobody takes it any more
+    VariantClear(&result);  // no caller takes it now
     FreeException();
   }
 
@@ -200,8 +200,8 @@ VALUE TakeResult(Invocation& call, TextForm form) {
   return holdsObjects ? rb_ensure(ConvertResult, data, ClearOnHost, data) : ConvertResult(data);
 }
 
-// Of a call that came back just before the macro was interrupted. The host's objects are released
-// where others are that nobody needs any more.
+// Drops the result of a call that returned just before the macro was interrupted. Objects of the
+// host are released together with other unused ones.
 void DropResult(Invocation& call, TextForm form) {
   call.FreeException();
   if (call.result.vt == VT_DISPATCH)
@@ -283,7 +283,7 @@ VALUE MethodMissing(int count, VALUE* arguments, VALUE self) {
   bool isSetter = false;
   const long length = NameLength(name, isSetter);
   if (length == 0) return rb_call_super(count, arguments);
-  if (isSetter) rb_check_arity(count, 2, UNLIMITED_ARGUMENTS);  // the value, behind any indexes
+  if (isSetter) rb_check_arity(count, 2, UNLIMITED_ARGUMENTS);  // the value, after any indexes
   CheckCallable(wrapped);
   VALUE id = rb_hash_lookup(wrapped.ids, symbol);
   if (NIL_P(id)) {
@@ -369,7 +369,8 @@ void ReleaseCollectedObjects() {
   RunDeferredCalls();
 }
 
-// A release may run the host's code, and that change the list: each search begins anew.
+// A release may run the host's code, which may change the list: each search starts from the
+// beginning.
 void ReleaseObjectsOf(const void* owner) {
   for (Wrapped* each = live; each;) {
     if (each->owner != owner || !each->dispatch) {

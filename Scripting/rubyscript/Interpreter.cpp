@@ -24,7 +24,7 @@ struct Entry {
   ProcessStateSnapshot process = {};
 };
 
-// What the side that switches tells the other one.
+// What the switching side reports to the other side.
 enum class Message { kStart, kBegin, kResume, kFinished, kCall };
 
 // Of x87 and of SSE: rounding, precision and exception masks belong to each side alone.
@@ -210,7 +210,7 @@ HRESULT CreateRubyFiber() {
   return S_OK;
 }
 
-// Nobody else puts the host's state back: what ran is never run again.
+// Puts the host's state back here, because the code that ran does not run again.
 void RestoreHost() {
   Entry* entry = state.innermost;
   while (entry && entry->outer) entry = entry->outer;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
-// The one Ruby interpreter of the process. It lives on a fiber of the first thread that needs it: the
-// same thread as the host's code, but a stack of its own, so a host that leaves its frames by a jump
-// or a fault discards none of Ruby's.
+// The one Ruby interpreter of the process. It lives on a fiber of the first thread that needs it:
+// the same thread as the host's code, but a separate stack. A host that leaves its frames by a jump
+// or a fault therefore discards none of Ruby's.
 //
 //   host's stack                                interpreter's stack
 //   Enter(task)  ------------------------------>  task.Run()
@@ -82,7 +82,7 @@ class Interpreter {
   // Ruby side, any thread of Ruby's: whether what runs now is to be interrupted.
   enum class Urgency { kNone, kNow, kAfterGrace };
   static Urgency InterruptDue();
-  // Ruby side, any thread of Ruby's. A number that each task gets anew; 0 while none runs.
+  // Ruby side, any thread of Ruby's. A number that differs for each task; 0 while none runs.
   static unsigned TaskNumber();
   // Ruby side. Of the innermost task.
   static const void* Owner();

@@ -9,5 +9,5 @@ void* operator new(size_t bytes, const std::nothrow_t&) noexcept { return malloc
 void operator delete(void* block) noexcept { free(block); }
 void operator delete(void* block, size_t) noexcept { free(block); }
 
-// What stands in the table of an abstract class; nothing can call it.
+// Entry in the virtual table of an abstract class; nothing can call it.
 extern "C" void __cxa_pure_virtual() { __builtin_trap(); }

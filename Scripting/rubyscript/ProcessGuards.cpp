@@ -36,7 +36,7 @@ VALUE ExitAtOnce(int count, const VALUE* arguments, VALUE) {
   rb_exit(status == Qtrue ? 0 : status == Qfalse ? 1 : NUM2INT(status));
 }
 
-// The error brings its text to the host, so it is not printed as well.
+// The host gets the text with the error, so it is not printed.
 VALUE Abort(int count, const VALUE* arguments, VALUE) {
   const VALUE output = rb_gv_get("$stderr");
   if (count != 1 || !RTEST(rb_obj_is_kind_of(output, ActiveScriptConst("HostOutput"))))

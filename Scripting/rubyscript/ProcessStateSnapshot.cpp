@@ -11,15 +11,15 @@
 
 // --- Signals, streams, directory -----------------------------------------------------------------
 
-// msvcrt tells a handler only in exchange for another. Ignored for that moment, a Ctrl+C is lost
-// rather than fatal.
+// msvcrt returns a handler only when another one replaces it. SIG_IGN in between means that a
+// Ctrl+C at that moment is lost rather than fatal.
 static __p_sig_fn_t SignalHandler(int number) {
   const __p_sig_fn_t handler = signal(number, SIG_IGN);
   if (handler != SIG_ERR) signal(number, handler);
   return handler;
 }
 
-// The mode is told in the same way; of a closed descriptor, msvcrt may tell one, too.
+// msvcrt returns the mode in the same way, possibly even for a closed descriptor.
 static int StreamMode(int descriptor) {
   if (_get_osfhandle(descriptor) == -1) return -1;
   const int mode = _setmode(descriptor, _O_BINARY);
@@ -72,8 +72,8 @@ static wchar_t* FindName(wchar_t* block, const wchar_t* line) {
   return *block ? block : nullptr;
 }
 
-// The same for the lines of a block like this one, one after the other: each is most likely found
-// behind the one before, where `place` is.
+// The same for the lines of such a block, one after the other. Each line most likely follows the
+// previous one, at `place`.
 static wchar_t* FindName(wchar_t* block, const wchar_t* line, wchar_t*& place) {
   const bool isThere = wcsncmp(place, line, NameLength(line) + 1) == 0;
   wchar_t* const found = isThere ? place : FindName(block, line);
@@ -94,8 +94,8 @@ class Cut {
   const wchar_t unit;
 };
 
-// msvcrt passes a variable on to the process, but not one whose name begins with '='; and it removes
-// one that has no value. So the process gets each directly, too.
+// msvcrt does not pass on a variable whose name begins with '=', and removes one that has no value.
+// So each variable is also set for the process directly.
 static void SetVariable(wchar_t* line) {
   if (*line != '=') _wputenv(line);
   wchar_t* const sign = line + NameLength(line);
@@ -160,7 +160,7 @@ void ProcessStateSnapshot::ApplyAdditions() const {
     if (!IsSet(line)) SetVariable(line);
 }
 
-// The system opens the directory anew, which takes longer than all the rest of a restoration.
+// The system reopens the directory, which takes longer than the rest of a restoration.
 void ProcessStateSnapshot::RestoreDirectory() const {
   wchar_t* const current = CurrentDirectory();
   if (!current || wcscmp(current, directory) != 0) SetCurrentDirectoryW(directory);

@@ -12,9 +12,8 @@
 // where ApplyAdditions goes to the object that has kept them and the others to any.
 //
 // Ownership: the object owns its copies. It is plain memory, free to live on any stack or fiber.
-// Errors: none are reported. What cannot be saved, for want of memory or because it does not exist (a
-// closed stream), is left alone by Restore; what cannot be put back (a directory that has been
-// deleted) stays as it is.
+// Errors: none are reported. Restore skips what could not be saved, because memory or the thing
+// itself was missing (a closed stream), and what cannot be put back (a deleted directory).
 // Threading: the thread of the run; Save and Restore on the same fiber, as msvcrt may keep the
 // handlers of hardware faults by fiber. Other threads may see the intermediate states.
 #pragma once
@@ -33,9 +32,9 @@ class ProcessStateSnapshot {
 
   // Puts the state back as the snapshot has it. The snapshot stays. Nothing without one.
   //
-  // Of the environment, the block of the process is compared and, where it differs, written through
-  // to msvcrt's copy. Two differences cannot be seen or mended so: one in msvcrt's copy alone, and
-  // a variable with an empty value, which msvcrt regards as missing once it has been put back.
+  // The environment block of the process is compared; differences are also written to msvcrt's
+  // copy. Two differences cannot be found or fixed this way: one in msvcrt's copy alone, and a
+  // variable with an empty value, which msvcrt regards as missing afterwards.
   void Restore() const;
 
   // Remembers the environment's variables that the snapshot does not have, instead of those

@@ -32,9 +32,9 @@ struct Entries {
 };
 }  // namespace
 
-static constexpr wchar_t kModulePath[] = L"";  // stands for the path of the module
+static constexpr wchar_t kModulePath[] = L"";  // placeholder for the path of the module
 
-// The system's, not ours: left behind.
+// Belongs to the system: not removed.
 static constexpr Entry kSharedEntries[] = {{L"CLSID", nullptr, nullptr}};
 
 static constexpr Entry kClassEntries[] = {
@@ -109,7 +109,8 @@ static bool HasServer(HKEY classes, const CLSID& classId) {
   return false;
 }
 
-// The merged view hides what is of the machine behind what is of the user, so both are asked, too.
+// In the merged view, an entry of the user hides one of the machine, so both are also read
+// separately.
 static bool IsHeldByAnother(const wchar_t* subkey) {
   HKEY roots[] = {HKEY_CLASSES_ROOT, nullptr, nullptr};
   RegOpenKeyExW(HKEY_CURRENT_USER, kClassesKey, 0, KEY_READ, &roots[1]);

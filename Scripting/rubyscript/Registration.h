@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
-// The engine's entries in the registry: its class, its two ProgIDs of its own, and the ProgID
-// "RubyScript" when no other engine holds that name. They are written for the present user only,
-// below HKEY_CURRENT_USER\Software\Classes.
+// The engine's entries in the registry: its class, its two ProgIDs, and the ProgID "RubyScript" if
+// no other engine holds that name. They are written for the current user only, below
+// HKEY_CURRENT_USER\Software\Classes.
 //
 // Wine 8 knows no classes of a user: there the entries have to be copied to
 // HKEY_LOCAL_MACHINE\Software\Classes, which belongs to the prefix. Windows ignores a user's classes

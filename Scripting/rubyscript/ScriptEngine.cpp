@@ -72,8 +72,8 @@ ULONG ScriptEngine::AddRef() { return static_cast<ULONG>(InterlockedIncrement(&r
 ULONG ScriptEngine::Release() {
   const LONG left = InterlockedDecrement(&references);
   if (left == 0) {
-    references = 1;  // closing takes and gives references of its own
-    // From another thread it cannot be closed: it stays behind, deliberately, with all it holds.
+    references = 1;  // closing adds and releases references
+    // Another thread cannot close it: it is leaked deliberately, with everything it holds.
     if (Close() != E_UNEXPECTED) delete this;
   }
   return static_cast<ULONG>(left);
@@ -421,7 +421,7 @@ HRESULT ScriptEngine::Perform(MacroTask* task, VARIANT* result, EXCEPINFO* excep
   return outcome;
 }
 
-// Why Ruby cannot be entered, for the site.
+// Text for the site: why Ruby cannot be entered.
 static void DescribeFailedStart(HRESULT started, wchar_t (&text)[256]) {
   if (started == E_ABORT) {
     swprintf(text, 256,
@@ -445,7 +445,8 @@ static void DescribeFailedStart(HRESULT started, wchar_t (&text)[256]) {
   swprintf(text, 256, L"%ls", reason);
 }
 
-// S_OK: the task has run. Otherwise it is gone; that Ruby is not to be had, the site is told.
+// S_OK: the task has run. On failure the task is deleted. A failure to start Ruby is reported to
+// the site.
 HRESULT ScriptEngine::Enter(MacroTask* task, EXCEPINFO* exception) {
   const HRESULT started = Interpreter::Start();
   if (started == S_OK) {

@@ -3,10 +3,9 @@
 // depends on the host:
 //
 //   kUtf16   characters, as COM means it.
-//   kBytes   an 8-bit host behind a narrow bridge. It widens its macro files byte by byte, keeps the
-//            low byte of each unit that it is given, and widens what it answers in the ANSI code
-//            page. So a unit given to it is one byte of the UTF-8 text; what it answers becomes the
-//            bytes that the code page made the units from.
+//   kBytes   an 8-bit host. It widens its macro files byte by byte and keeps the low byte of each
+//            unit that it gets, so each unit is one byte of UTF-8 text. It widens its answers by
+//            the ANSI code page; they are converted back to the original bytes.
 //
 // Errors: no memory gives null or an empty text. Threading: the interpreter's thread.
 #pragma once

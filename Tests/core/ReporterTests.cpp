@@ -45,7 +45,7 @@ TEST_F(Reporter, WritesTheLogLineAndTheHookLine) {
   EXPECT_TRUE(TakeLog().size() == 8192 && reports.back().size() == 8191);
 }
 
-TEST_F(Reporter, WritesLinesWhereItIsToldAndNeverCallsTheHookFromWithin) {
+TEST_F(Reporter, WritesToTheLogFileAndNeverCallsTheHookFromWithin) {
   SetDebugHook([](const char*) { EXPECT_EQ(Report("x", 2, "inner", kReportAssert), 1); });
   EXPECT_EQ(Report("x", 1, "outer", kReportAssert), 0);
   EXPECT_NE(TakeLog().find("inner"), Text::npos);
@@ -66,7 +66,7 @@ TEST_F(Reporter, WritesLinesWhereItIsToldAndNeverCallsTheHookFromWithin) {
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "a\n%s");
 }
 
-TEST_F(Reporter, TellsOfAStopWithoutARunAndJumpsWithItsValue) {
+TEST_F(Reporter, ReportsAStopWithoutARunAndJumpsWithItsValue) {
   StopMacro();
   EXPECT_EQ(TakeReports("Stop without a run to stop"), 1);
   const int value = setjmp(CurrentStopPoint().buffer);

@@ -2,7 +2,7 @@
 // run_ruby [--times=N] [OPTION...] [FILE|-] [ARGUMENT...]: ruby.exe's command line for the script
 // engine in ruby\bin beside this program. Knows the options -e, -I, -r, -w, -W and -C and ignores
 // --disable and --enable; any other option starts ruby.exe with the same command line. With --times
-// the program runs N times in one process, each time in an engine object of its own.
+// the program runs N times in one process, each time in a new engine object.
 //
 // The host publishes no object, so the program prints to the process's own streams. The host
 // reports errors as `NAME:LINE: DESCRIPTION`, and its exit code is then 1. It shares no code with

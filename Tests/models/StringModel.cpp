@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// String beside std::string. A text argument may stand in the string's own buffer, the string may
-// hold zero bytes, and memory may be missing: the string is then as before, or as it should be.
+// Compares String with std::string. A text argument may point into the string's own buffer, the
+// string may hold zero bytes, and an allocation may fail: the string is then unchanged or correct.
 #include <string.h>
 
 #include <algorithm>
@@ -36,7 +36,7 @@ class Pair {
   void Step() {
     // A new one now and then: the old one's block has grown so large that all fits in.
     if (model.size() > kLongest || Below(input, 64) == 0) Renew();
-    // The argument as a text of its own, or as a part of the string.
+    // The argument is a separate text or a part of the string.
     const size_t from = Below(input, 1024) % (model.size() + 1);
     const bool own = input.ConsumeBool();
     const std::string given = own ? Cut(model.substr(from)) : AnyText(input), before = model;
@@ -157,7 +157,7 @@ class Pair {
     }
   }
 
-  // What an edit makes of zero bytes inside of the text, nobody asks.
+  // The result of an edit of a text with zero bytes is not specified.
   template <class Real, class Model>
   bool Edit(Real editReal, Model editModel) {
     const bool plain = IsPlain();

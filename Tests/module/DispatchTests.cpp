@@ -85,7 +85,7 @@ TEST_F(DispatchTest, EachCallHasItsArgumentsAlone) {
       Call(L"f", {real});
     }
 
-    // What the host takes out of the list, or does not let the list own, stays as it is.
+    // Elements that the host removes from the list, or that the list does not own, stay unchanged.
     std::vector<void*> kept;
     for (unsigned owns : {1u, 0u}) {
       on["call 7"] = [&] {

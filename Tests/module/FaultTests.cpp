@@ -20,7 +20,7 @@ static bool HasGuardPage() {
   return false;
 }
 
-// A stop is among them: it leaves as much behind, and must stay possible as often.
+// Includes a stop: it leaves as many objects as a fault does, and must work as often.
 TEST_F(FaultTest, EveryKindInTheHostAndInTheEngine) {
   std::vector<std::pair<const char*, std::function<void()>>> faults(kFaults.begin(), kFaults.end());
   faults.emplace_back("stop", [&] { Stop(host.Engine()); });

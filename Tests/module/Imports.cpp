@@ -8,7 +8,7 @@
 #include <cstring>
 
 namespace {
-// The Ruby engine has threads of its own.
+// The Ruby engine also runs threads.
 std::atomic<int> requestsLeft = 0;
 std::atomic<bool> requestFailed = false;
 std::atomic<int> live = 0;

@@ -5,15 +5,16 @@
 
 class RubyTest : public ModuleTest {
  protected:
+  static void SetUpTestSuite() { cookie = ActivateRuby(); }
+  static void TearDownTestSuite() { DeactivateActCtx(0, cookie); }
   RubyTest() { Describe(""); }
-  ~RubyTest() override { DeactivateActCtx(0, cookie); }
 
   int RunMacro(const std::string& text) {
     WriteBytes(macroPath, text);
     return Run();
   }
 
-  const ULONG_PTR cookie = ActivateRuby();
+  static inline ULONG_PTR cookie;
 };
 
 // As the editor composes it from the templates of `version`.

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// `version`: the record's checks, its content, the description file behind it, and the folders.
+// `version`: the record's checks, its content, its description file, and the folders.
 
 #include "ModuleTest.h"
 // sddl.h must come after windows.h.
@@ -39,7 +39,7 @@ static void FillByFileOf(size_t length) {
 }
 
 TEST_F(VersionTest, HeadersAndHostFolders) {
-  // The record ends right behind its header and a name without terminator.
+  // The record ends right after its header and a name without terminator.
   for (unsigned size = 0; size <= 1024; size += size < 390 || size > 394 ? 13 : 1) {
     muted = size % 391 != 0;
     if (size != 392) EXPECT_FALSE(Fill(size, 77, 12)) << size;

@@ -5,8 +5,8 @@
 
 #include "EngineHost.h"
 
-// The last line shows what the lines before it have made; nobody else may see it.
-TEST(World, EachEngineHasItsOwn) {
+// The last line shows the effects of the lines before it; no other engine may see them.
+TEST(GlobalsSnapshot, EachEngineHasItsOwn) {
   Host host, inner;
   host.item.Add("f");
   inner.item.Add("f");
@@ -30,7 +30,7 @@ TEST(World, EachEngineHasItsOwn) {
   });
 }
 
-TEST(World, DataOfNestedMacros) {
+TEST(GlobalsSnapshot, DataOfNestedMacros) {
   Host outer, inner;
   for (Host* host : {&outer, &inner}) host->item.Add("f");
   outer.item.Does("nest", [&] { Log(inner.Run("@item.f DATA.read\n__END__")); });
@@ -38,8 +38,8 @@ TEST(World, DataOfNestedMacros) {
             outer.Run("@item.nest; @item.f DATA.read\n__END__\nown\n"));
 }
 
-// A macro is entered anew while it waits for the host.
-TEST(World, ReentersTheSameEngine) {
+// The engine is entered again while its macro waits for the host.
+TEST(GlobalsSnapshot, ReentersTheSameEngine) {
   Host host;
   host.item.Add("f");
   host.item.Does("parse",
@@ -63,7 +63,7 @@ TEST(World, ReentersTheSameEngine) {
                "@item.parse; @item.fails; @item.f([@item.call(2), @x])"));
 }
 
-TEST(World, Output) {
+TEST(GlobalsSnapshot, Output) {
   Host host, mute;
   host.item.Add("message");
   CheckTranscript("output.txt", [&](const std::string& macro) { return host.Run(macro); });
@@ -85,7 +85,7 @@ static std::string ProcessState() {
 }
 
 // What else belongs to the process, ProcessStateSnapshot is tested for by itself.
-TEST(World, LeavesTheProcessAlone) {
+TEST(GlobalsSnapshot, LeavesTheProcessAlone) {
   constexpr unsigned short kX87 = 0x0A3F;  // 53 bits, upwards, all masked
   constexpr unsigned int kSse = 0x5F80;    // upwards
   Host host;

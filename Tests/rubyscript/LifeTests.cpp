@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The interpreter's life in a process, in a program of its own: what is before its start and, at the
+// The interpreter's life in a process, in a separate program: the time before its start and, at the
 // end, its loss.
 #include "EngineHost.h"
 
@@ -46,7 +46,7 @@ TEST(Life, KeepsTheLibraryFromItsStartOn) {
   DeleteFileA(copy);
 }
 
-// In a process of its own. The id of an ended thread may be given to the next one.
+// Runs in a separate process. The id of an ended thread may be given to the next one.
 TEST(Thread, HasEnded) {
   const char* const ended =
       "error: The thread that ran the first Ruby macro has ended. Restart the program to run Ruby "
@@ -57,8 +57,8 @@ TEST(Thread, HasEnded) {
   EXPECT_EQ(ended, late.Run("1"));
 }
 
-// The fault goes to the guard of the host that called last; nobody else waits for ever. Where in Ruby
-// it happens, this program's environment says.
+// The guard of the host that called last catches the fault; no other host waits forever. The
+// environment sets the place in Ruby where it happens.
 TEST(Life, EndsWithAFaultInsideOfRuby) {
   const char* const place = std::getenv("SCRIPTRUBY_TEST_PLACE");
   const std::string loses =

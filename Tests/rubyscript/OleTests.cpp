@@ -131,8 +131,8 @@ struct Peer {
 
 }  // namespace
 
-// The outcome is the log; behind it what the Ruby object answers between the run and the end of the
-// engine, and after it.
+// The outcome is the log, then the Ruby object's answers between the run and the end of the engine,
+// and after that end.
 TEST(Ole, CallsInAllDirections) {
   Peer peer;
   CheckTranscript("win32ole.txt", [&](const std::string& macro) {

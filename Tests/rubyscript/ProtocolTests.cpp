@@ -107,7 +107,7 @@ TEST(Protocol, StatesInOrder) {
   EXPECT_EQ("state 2 -> 2", set(kConnected));
   EXPECT_EQ(S_OK, host.Parse("@item.f(3, @kept)"));
   EXPECT_EQ("enter; item.f(I4 3, I4 1); leave", TakeLog());
-  // Only what is persistent runs again, in a fresh world.
+  // Only persistent code runs again, with an empty top level.
   EXPECT_EQ("state 3; state 5 -> 5", set(kInitialized));
   EXPECT_EQ(1u, host.item.references);
   EXPECT_EQ("state 2; enter; item.f(I4 1, EMPTY, EMPTY); leave -> 2", set(kConnected));
@@ -115,7 +115,7 @@ TEST(Protocol, StatesInOrder) {
   EXPECT_EQ(" 8000FFFF -> 4", set(kConnected));
   host.Close();
 
-  // Back to the beginning, which lets go of the site as well.
+  // Back to the first state, which also releases the site.
   host.Open();
   host.Parse("@item.f");
   EXPECT_EQ("state 5; state 2; enter; item.f(); leave -> 2", set(kConnected));
@@ -244,14 +244,14 @@ TEST(Protocol, CodeAndItsValue) {
   EXPECT_EQ("enter; leave I4 42", value("6 * 7"));
   EXPECT_EQ("enter; leave EMPTY", value("def twice(x) = [2 * x, 'a']", 0));
   EXPECT_EQ("enter; leave [I4 8, 'a']", value("twice 4"));
-  EXPECT_EQ("enter; leave EMPTY", value("{}", 0));  // cannot be passed, and nobody wants it
+  EXPECT_EQ("enter; leave EMPTY", value("{}", 0));  // cannot be passed, and is not asked for
   EXPECT_EQ(S_OK, host.Parse("Hash.new", SCRIPTTEXT_ISEXPRESSION));
   EXPECT_EQ(kReported, host.Parse("Hash.new", SCRIPTTEXT_ISEXPRESSION, &result));
   EXPECT_EQ(
       "enter; leave; enter; error: no Hash can be passed to a COM object; convert it first "
       "(TypeError); leave",
       TakeLog());
-  // A site that takes no errors: the caller gets them, with strings of its own.
+  // A site that takes no errors: the caller gets them, with new strings.
   host.errorAnswer = E_FAIL;
   EXCEPINFO exception = {};
   EXPECT_EQ(DISP_E_EXCEPTION, host.Parse("raise 'oops'", 0, &result, &exception));

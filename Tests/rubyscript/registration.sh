@@ -1,6 +1,6 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# registration.sh RUBYSCRIPT_DLL: what regsvr32 writes for the user, and that it takes only that back.
+# registration.sh RUBYSCRIPT_DLL: regsvr32 writes entries for the user, and removes only these.
 # shellcheck source=Tests/wine.sh
 . "$(dirname "$0")/../wine.sh"
 dll=Z:$(echo "$1" | tr / '\\')
@@ -9,7 +9,7 @@ class='{5C0B6E2C-4F0D-4B6B-9E0F-7B1C3A9D52E4}'
 foreign='{11111111-2222-3333-4444-555555555555}'
 failures=0
 
-# expect KEY TEXT: the key's own listing holds the text; "-" stands for a key that is not there.
+# expect KEY TEXT: the key's own listing holds the text; "-" means that the key is missing.
 expect() {
   found=$(wine reg query "$classes\\$1" 2> /dev/null) || found=
   if [ "$2" = - ]; then
@@ -43,7 +43,7 @@ wine regsvr32 /s /u "$dll" || failures=1
 expect_nothing
 expect RubyScript -
 
-# Another engine's name stays its own.
+# A name that another engine holds is left to it.
 wine reg add "$classes\\RubyScript\\CLSID" /ve /d "$foreign" /f > /dev/null
 wine reg add "$classes\\CLSID\\$foreign\\InprocServer32" /ve /d other.dll /f > /dev/null
 wine regsvr32 /s "$dll" || failures=1

@@ -1,5 +1,5 @@
 # SPDX-License-Identifier: MIT
-# includes.py SOURCE_FOLDER: a file includes only files of its own folder and of the layers below it.
+# includes.py SOURCE_FOLDER: a file includes only files of its folder and of lower layers.
 # Prints each include that breaks this, with its file and line.
 import re
 import sys

@@ -114,8 +114,8 @@ TEST_F(RubyAllocationTest, OfARunInTheEngine) {
     });
 }
 
-// The first run of a process starts the interpreter, so each request takes a process of its own: this
-// test again.
+// The first run of a process starts the interpreter, so each request needs a new process: this test
+// starts itself again.
 class FirstRunAllocationTest : public TortureTest {
  protected:
   // Names, in the environment of such a process, a file with the number of the request. The process

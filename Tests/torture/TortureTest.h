@@ -22,7 +22,7 @@ class TortureTest : public ModuleTest {
   // Plans that each fault fails the test. A right run is one of `macro` in the language that is described.
   explicit TortureTest(const std::string& description = "Language=JScript\r\n",
                        const std::string& macro = "\n");
-  // Nothing was left behind; there is no transcript to compare.
+  // Checks that nothing is left; there is no transcript to compare.
   void TearDown() override;
 
   // How often to do something: `whole`, or `part` of it under ctest.

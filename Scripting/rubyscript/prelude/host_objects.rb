@@ -80,7 +80,7 @@ module ActiveScript
 
   # The rest of this class is native: calls, [] and []=.
   class ComObject
-    # Names that an object of the host's may well have, and that nobody needs of Object.
+    # Names that a host object may well have, and that are not needed from Object.
     %i[clone display dup enum_for extend freeze itself method public_method singleton_method tap then
        to_enum yield_self !~ =~].each { |name| undef_method name }
 

@@ -7,8 +7,8 @@ module ActiveScript
   # $stdout and $stderr of a macro: whole lines go to the host's function `message`, or straight to
   # the process's own stream when the host has none.
   class HostOutput < StringIO
-    # Bytes of a text that an 8-bit host surely takes whole: one of 512 it cannot tell from one that
-    # was cut.
+    # Longest text in bytes that surely reaches an 8-bit host complete: it cannot distinguish 512
+    # bytes from a text that was cut.
     LIMIT = 511
 
     def initialize(context, stream)

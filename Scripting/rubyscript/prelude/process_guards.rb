@@ -5,8 +5,8 @@ module ActiveScript
   ALL_THREADS = Thread.method(:list)
   private_constant :ALL_THREADS
 
-  # Without the engine's own thread and those of a macro that waits for this one. A Ractor has only
-  # threads of its own.
+  # Hides the engine's thread and those of a macro that waits for this one. A Ractor has only its
+  # own threads anyway.
   module ThreadList
     def list
       return super unless ::Ractor.current.equal?(::Ractor.main)

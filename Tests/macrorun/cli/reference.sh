@@ -50,7 +50,7 @@ guide=$root/Docs/macrorun.md
 expect 0 '' --help
 for option in $(sed -n 's/^  \(-.,\)\?\(--[a-z-]*\).*/\2/p' out); do
   grep -q -- "^| \(\`-.\`, \)\?\`${option}[\` ]" "$guide" || fail "$option is not in the table"
-  cat "$root"/Tests/macrorun/cli/*.sh | grep -q -- "$option\b" || fail "no test uses $option"
+  cat "$root"/Tests/macrorun/cli/*.sh "$root"/Tests/macrorun/cli/*.txt | grep -q -- "$option\b" || fail "no test uses $option"
 done
 [ "$(grep -c '^| `-' "$guide")" -eq "$(grep -c '^  -' out)" ] || fail 'the table has options that do not exist'
 

@@ -131,7 +131,7 @@ std::string MarkdownOf(const MacroFunction& function) {
          "\nResult: " + std::string(ResultName(function.result)) + ".\n";
 }
 
-// "(line, count = nil)": the engine does not pass nil to the editor, so nil stands for the default.
+// "(line, count = nil)": the engine does not pass nil to the editor, so nil means the default.
 std::string RubyParameters(const MacroFunction& function) {
   std::string list;
   for (const MacroParameter& parameter : function.parameters) {

@@ -37,7 +37,7 @@ class DiagnosticCollector {
   void AddStop(Diagnostic place);
   // The place of the stop; empty when it is unknown.
   Diagnostic Stop() const { return stop; }
-  // Reports a failure that had no error of its own, unless the run was stopped.
+  // Reports a failure without a reported error, unless the run was stopped.
   void EndRun(bool stopped);
   bool ErrorSeen() const { return runs.back().errorSeen; }
   // The macro of the current run, for the user.
