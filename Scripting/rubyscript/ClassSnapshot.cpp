@@ -4,8 +4,8 @@
 #include <stdlib.h>
 #include <string.h>
 
-#include "RubyInternals.h"
 #include "RubyCall.h"
+#include "RubyInternals.h"
 
 namespace {
 
@@ -13,7 +13,7 @@ using cruby::ClassOf;
 using cruby::ConstantEntry;
 using cruby::MethodEntry;
 
-// Grows by C's allocator, so that the collector does not run in between.
+// Grows by CRuby's allocator, which raises NoMemoryError when a collection does not help.
 template <class T>
 struct List {
   T* items;
@@ -24,9 +24,7 @@ struct List {
   T& Add(const T& item) {
     if (count == room) {
       const int wanted = room ? 2 * room : 4;
-      void* const block = realloc(items, static_cast<size_t>(wanted) * sizeof(T));
-      if (!block) rb_raise(rb_eNoMemError, "failed to allocate memory");
-      items = static_cast<T*>(block);
+      items = static_cast<T*>(xrealloc2(items, static_cast<size_t>(wanted), sizeof(T)));
       room = wanted;
     }
     return items[count++] = item;
@@ -108,9 +106,7 @@ void MarkBaselines(void*) {
 }
 
 const rb_data_type_t kKeeperType = {
-    "baselines", {MarkBaselines, nullptr, nullptr, nullptr, {}},
-    nullptr,     nullptr,
-    RUBY_TYPED_WB_PROTECTED};
+    "baselines", {MarkBaselines, nullptr, nullptr, nullptr, {}}, nullptr, nullptr, 0};
 
 using Changes = List<Change>;
 
@@ -123,14 +119,15 @@ void MarkChanges(void* data) {
 }
 
 void FreeChanges(void* data) {
-  free(static_cast<Changes*>(data)->items);
+  xfree(static_cast<Changes*>(data)->items);
   free(data);
 }
 
-const rb_data_type_t kChangesType = {
-    "changes", {MarkChanges, FreeChanges, nullptr, nullptr, {}},
-    nullptr,   nullptr,
-    RUBY_TYPED_FREE_IMMEDIATELY};
+const rb_data_type_t kChangesType = {"changes",
+                                     {MarkChanges, FreeChanges, nullptr, nullptr, {}},
+                                     nullptr,
+                                     nullptr,
+                                     RUBY_TYPED_FREE_IMMEDIATELY};
 
 VALUE NewChanges() {
   void* const list = calloc(1, sizeof(Changes));
@@ -206,7 +203,7 @@ bool HasLibraryMethods(VALUE module) {
   bool found = false;
   for (const VALUE entry : entries)
     found = found || IsLibraryPath(PathOf(reinterpret_cast<MethodEntry*>(entry)));
-  free(entries.items);
+  xfree(entries.items);
   return found;
 }
 
@@ -285,7 +282,7 @@ void Discover(VALUE module) {
     const bool known = IsModule(each) && BaselineOf(each);
     if (!known) Discover(each);
   }
-  free(inner.items);
+  xfree(inner.items);
   Baseline& baseline = *BaselineOf(module);
   baseline.keepsVariables = true;
   for (int i = baseline.constants.count; i-- > 0;) {
@@ -461,7 +458,7 @@ void SearchAll(Changes& changes) {
   for (Baseline& baseline : baselines)
     SearchBaseline({&baseline, &changes, &loaded}, withConstants);
   for (const VALUE each : loaded) Discover(each);
-  free(loaded.items);
+  xfree(loaded.items);
 }
 
 // --- Making changes ------------------------------------------------------------------------------
@@ -517,7 +514,7 @@ void AddOrigins(Baseline& baseline) {
     chain.Add(each);
     add_origin(each);
   }
-  free(baseline.chain.items);
+  xfree(baseline.chain.items);
   baseline.chain = chain;
 }
 
@@ -593,12 +590,11 @@ void Redo(const Change& change) {
       break;
     case Change::Kind::kChain: {
       List<VALUE> chain = {};
-      for (long i = 0; i < RARRAY_LEN(change.value); ++i)
-        chain.Add(RARRAY_AREF(change.value, i));
+      for (long i = 0; i < RARRAY_LEN(change.value); ++i) chain.Add(RARRAY_AREF(change.value, i));
       for (const VALUE each : BaselineOf(change.module)->chain)  // of libraries loaded since then
         if (!Contains(chain, each)) chain.Add(each);
       SetChain(change.module, chain);
-      free(chain.items);
+      xfree(chain.items);
       break;
     }
     case Change::Kind::kVariable:
@@ -609,6 +605,10 @@ void Redo(const Change& change) {
       break;
   }
 }
+
+// Each step by itself: one that fails does not keep the others.
+VALUE UndoBody(VALUE change) { return Undo(*reinterpret_cast<Change*>(change)), Qnil; }
+VALUE RedoBody(VALUE change) { return Redo(*reinterpret_cast<Change*>(change)), Qnil; }
 
 void ClearCaches(const Changes& changes) {
   for (const Change& change : changes) {
@@ -626,6 +626,13 @@ bool IsLibrarys(const Change& change) {
   if (change.kind == Change::Kind::kMethod)
     return IsLibraryPath(PathOf(reinterpret_cast<MethodEntry*>(change.value)));
   return change.kind == Change::Kind::kConstant && IsLibraryPath(change.constant.file);
+}
+
+// By identity: the elements have no methods.
+bool Holds(VALUE chain, VALUE element) {
+  for (long i = 0; i < RARRAY_LEN(chain); ++i)
+    if (RARRAY_AREF(chain, i) == element) return true;
+  return false;
 }
 
 // Makes the change a part of the baseline. Of a chain, what was there `before` is a macro's.
@@ -652,10 +659,10 @@ void Adopt(const Change& change, const Changes* before) {
       bool macros = false;
       for (const Change& other : *before)
         if (other.kind == change.kind && other.module == change.module)
-          macros = macros || RTEST(rb_ary_includes(other.value, each));
+          macros = macros || Holds(other.value, each);
       if (!macros || Contains(baseline.chain, each)) chain.Add(each);
     }
-    free(baseline.chain.items);
+    xfree(baseline.chain.items);
     baseline.chain = chain;
   } else if (change.kind == Change::Kind::kVariable) {
     baseline.variables.Add(change.name);
@@ -703,7 +710,6 @@ void AdoptSince(const Changes& before) {
   for (const Change& change : before)
     if (IsOpenModule(change) && !change.visibility && HasLibraryMethods(change.value))
       Adopt(change, &before);
-  rb_gc_writebarrier_remember(keeper);
 }
 
 // What changes while a file of the library is loaded is the library's.
@@ -745,13 +751,13 @@ void UndoAll(Changes& changes) {
       change.kind = Change::Kind::kAutoload;
       change.value = rb_autoload_p(change.module, change.name);
     }
-    Undo(change);
+    VALUE ignored;
+    Protect(UndoBody, reinterpret_cast<VALUE>(&change), ignored);
   }
   ClearCaches(changes);
   for (Baseline& baseline : baselines)
     if (baseline.outdated) Take(baseline);
   constantState = ruby_vm_global_constant_state;
-  rb_gc_writebarrier_remember(keeper);
 }
 
 ID ChangesName() {
@@ -789,12 +795,15 @@ void ClassSnapshot::Start() {
   places = st_init_numtable();
   keeper = TypedData_Wrap_Struct(0, &kKeeperType, &baselines);
   rb_gc_register_mark_object(keeper);
+  rb_gc_register_address(&inPlace);
+  const bool collects = !RTEST(rb_gc_disable());  // the list keeps no module alive
   List<VALUE> modules = {};
   rb_objspace_each_objects(CollectModule, &modules);
   for (const VALUE module : modules) Take(Track(module));
   for (const VALUE module : modules)
     if (!SingletonOf(module)) singles.Add({module, IsFrozen(module)});
-  free(modules.items);
+  xfree(modules.items);
+  if (collects) rb_gc_enable();
   for (long i = 0; i < RARRAY_LEN(objects); ++i) {
     const VALUE object = RARRAY_AREF(objects, i);
     if (!RB_SPECIAL_CONST_P(object) && !IsModule(object)) singles.Add({object, IsFrozen(object)});
@@ -804,7 +813,6 @@ void ClassSnapshot::Start() {
   for (const Constant& constant : BaselineOf(own)->constants)
     if (IsModule(constant.entry.value)) BaselineOf(constant.entry.value)->keepsVariables = true;
   constantState = ruby_vm_global_constant_state;
-  rb_gc_writebarrier_remember(keeper);
 }
 
 static VALUE SuspendBody(VALUE context) {
@@ -818,7 +826,9 @@ static VALUE ResumeBody(VALUE context) {
   const VALUE changes = rb_attr_get(context, ChangesName());
   if (NIL_P(changes)) return Qnil;
   constantState = 0;
-  for (const Change& change : ListOf(changes)) Redo(change);
+  VALUE ignored;
+  for (Change& change : ListOf(changes))
+    Protect(RedoBody, reinterpret_cast<VALUE>(&change), ignored);
   ClearCaches(ListOf(changes));
   return Qnil;
 }

@@ -77,7 +77,6 @@ void rb_class_remove_from_super_subclasses(VALUE klass);
 cruby::ConstantEntry* rb_const_lookup(VALUE module, ID name);
 void rb_autoload_str(VALUE module, ID name, VALUE file);
 void rb_objspace_each_objects(int (*visit)(void*, void*, size_t, void*), void* data);
-void rb_gc_writebarrier_remember(VALUE object);
 VALUE rb_suppress_tracing(VALUE (*body)(VALUE), VALUE argument);
 // Of the process; each change of a constant, and each of a class variable's place.
 extern __declspec(dllimport) unsigned long long ruby_vm_global_constant_state;

@@ -310,3 +310,9 @@ Array.undef_method(:first)
 [String, Array, Hash, Symbol, Integer].each { |each| each.instance_methods(false).each { |m| each.send(:undef_method, m) } }
 # ---
 Enumerable.instance_methods.each { |m| Enumerable.send(:define_method, m) { |*| ::Kernel.raise("no #{m}") } }
+# --- > item.f('[1]')
+module Mine; end
+class String; include Mine; end
+class Hash; include Mine; end
+require "json"
+@item.f(JSON.generate([1]))
