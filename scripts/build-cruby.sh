@@ -5,7 +5,7 @@
 #   include/   headers for embedding (ruby.h, ruby/config.h)
 #   lib/       libmsvcrt-ruby310.dll.a
 #   ruby/      what a Windows machine needs: bin, lib/ruby/3.1.0, licenses. It works wherever it is copied.
-#   tests/     CRuby's own tests (test, spec, bootstraptest) and what they load (tool/lib)
+#   tests/     CRuby's own test suites, and what they load (tool/lib)
 set -euo pipefail
 # shellcheck source=scripts/cross-build.sh
 source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/cross-build.sh"

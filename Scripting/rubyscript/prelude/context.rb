@@ -240,11 +240,11 @@ module ActiveScript
     # As in Ruby, the last error decides over success, and each one is shown. Those that are not
     # reported go to the error output.
     def choose_error(errors)
-      telling = errors.reject { |error| SystemExit === error && !aborted?(error, message_of(error)) }
+      shown = errors.reject { |error| SystemExit === error && !aborted?(error, message_of(error)) }
       last = errors.last
       success = !last || (SystemExit === last && last.success?)
-      reported = telling.first || last unless success
-      telling.each do |error|
+      reported = shown.first || last unless success
+      shown.each do |error|
         @error_output.write(description(error, nil), "\n") unless error.equal?(reported)
       end
       reported
@@ -309,8 +309,8 @@ module ActiveScript
     LINES = 131_072
     private_constant :LINES
 
-    # The line, and the column in bytes. The library's part that is loaded changes no message. CRuby can
-    # tell where the node of a frame begins.
+    # The line, and the column in bytes. The library's part that is loaded changes no message. CRuby
+    # knows where the node of a frame begins.
     def place_of(error, location)
       node = RubyVM::AbstractSyntaxTree.of(location, keep_script_lines: true)
       before = @sources[location.path].first_line - 1
