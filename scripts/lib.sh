@@ -103,8 +103,8 @@ lock() {
   flock 9
 }
 
-# set_up: everything a fresh machine needs before a build, each part only when it is missing.
-set_up() {
+# install_missing: the packages in PACKAGES that the machine lacks.
+install_missing() {
   command -v dpkg >/dev/null || die "this is not a Debian system: install by hand ${PACKAGES[*]}"
   local missing
   mapfile -t missing < <(missing_packages)
@@ -112,6 +112,11 @@ set_up() {
     say "installing packages: ${missing[*]}"
     step "installing packages" install_packages "${missing[@]}"
   fi
+}
+
+# set_up: everything a fresh machine needs before a build, each part only when it is missing.
+set_up() {
+  install_missing
   if [ ! -e "$WINEPREFIX/.complete" ]; then
     rm -rf "$WINEPREFIX"
     mkdir -p "$BUILD"

@@ -8,7 +8,7 @@ source "$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")/lib.sh"
 
 PACKAGES=(graphviz plantuml)
 mkdir -p "$BUILD"
-set_up
+install_missing
 cd "$ROOT/Docs/pictures"
 for source in *.dot *.puml; do
   picture=${source%.*}.svg
